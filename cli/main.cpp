@@ -1,0 +1,246 @@
+// varduna-cli: the program's own operations without a window.
+#include "cli/VDRCliPrompt.h"
+#include "document/VDRAllEntryTableModel.h"
+#include "document/VDRDiaryCheck.h"
+#include "document/VDRDocument.h"
+
+#include <QCoreApplication>
+#include <QDate>
+#include <QFileInfo>
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+#include <QTextStream>
+
+#include <algorithm>
+#include <numeric>
+#include <cstdio>
+
+namespace {
+
+enum ExitCode {
+    ExitOk = 0,
+    ExitUsage = 1,
+    ExitRefused = 2,
+};
+
+// Exit codes of 'check'.
+enum CheckExit {
+    CheckOpenable = 0,
+    CheckMissing = 2,
+    CheckDamaged = 3,
+    CheckHeld = 4,
+    CheckNewer = 5,
+};
+
+const char* const kHelp =
+    "Usage: varduna-cli COMMAND FILE [options]\n"
+    "\n"
+    "Runs Varduna's own operations on a diary (.vd2) without a window, with the same\n"
+    "locking as the application: a diary held by a running instance is refused.\n"
+    "Messages go to stderr as \"Title: text\", results to stdout.\n"
+    "\n"
+    "Commands:\n"
+    "  new FILE            Create a new diary and write it to FILE (an existing FILE is refused).\n"
+    "  info FILE [--json]  Open FILE as the application does (working copy, lock, upgrades),\n"
+    "                      print the project name, the structure version it was opened with and\n"
+    "                      one line per report (number with author, date, locked), then close\n"
+    "                      without saving.\n"
+    "  check FILE          Read-only: integrity, structure version, working copy and its holder,\n"
+    "                      backups. Touches nothing.\n"
+    "\n"
+    "Options:\n"
+    "  --yes               Answer questions with their affirmative default (without it every\n"
+    "                      question takes its cancelling choice).\n"
+    "  --json              Machine-readable output (info, check).\n"
+    "  -h, --help          This text.\n"
+    "\n"
+    "Exit codes of new and info:\n"
+    "  0  done\n"
+    "  1  usage error\n"
+    "  2  refused or failed (the message on stderr says why)\n"
+    "\n"
+    "Exit codes of check:\n"
+    "  0  can be opened\n"
+    "  1  usage error\n"
+    "  2  missing (no such file, or not a file)\n"
+    "  3  damaged (failed integrity check, or not a diary)\n"
+    "  4  held by a running instance\n"
+    "  5  made by a newer program version\n";
+
+QTextStream& out()
+{
+    static QTextStream stream(stdout);
+    stream.setCodec("UTF-8");
+    return stream;
+}
+
+void err(const QString& text)
+{
+    std::fprintf(stderr, "%s\n", text.toLocal8Bit().constData());
+}
+
+int cmdNew(const QString& file)
+{
+    if (QFileInfo::exists(file)) {
+        VDRPrompt::critical(QObject::tr("Dateifehler"),
+                            QObject::tr("Die Datei\n%1\nexistiert bereits.").arg(QFileInfo(file).absoluteFilePath()));
+        return ExitRefused;
+    }
+    VDRDocument doc;
+    if (!doc.createDocument(true))
+        return ExitRefused;
+    const bool written = doc.writeWorkingCopyTo(QFileInfo(file).absoluteFilePath());
+    doc.closeDocument();
+    if (!written) {
+        VDRPrompt::critical(QObject::tr("Dateifehler"),
+                            QObject::tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(file));
+        return ExitRefused;
+    }
+    out() << QFileInfo(file).absoluteFilePath() << "\n";
+    return ExitOk;
+}
+
+int cmdInfo(const QString& file, bool json)
+{
+    VDRDocument doc;
+    bool showError = true;
+    if (!doc.openDocument(file, showError)) {
+        if (showError)
+            VDRPrompt::critical(QObject::tr("Fehler"),
+                                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+        return ExitRefused;
+    }
+    VDRAllEntryTableModel* entries = doc.modelEntryAll();
+    entries->fetch_all();
+    QVector<int> rows(entries->rowCount());
+    std::iota(rows.begin(), rows.end(), 0);
+    std::stable_sort(rows.begin(), rows.end(), [&](int a, int b) {
+        const int na = doc.entryNumberInt(a), nb = doc.entryNumberInt(b);
+        return na != nb ? na < nb : doc.entryNumberLetter(a) < doc.entryNumberLetter(b);
+    });
+
+    if (json) {
+        QJsonArray reports;
+        for (int row : rows) {
+            QJsonObject r;
+            r.insert(QStringLiteral("number"), doc.entryNumberWithUserId(row));
+            r.insert(QStringLiteral("date"),
+                     entries->data(row, QStringLiteral("inspection_date"), Qt::EditRole).toDate().toString(Qt::ISODate));
+            r.insert(QStringLiteral("locked"), entries->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0);
+            reports.append(r);
+        }
+        QJsonObject o;
+        o.insert(QStringLiteral("project"), doc.projectName());
+        o.insert(QStringLiteral("fileVersion"), doc.fileVersion());
+        o.insert(QStringLiteral("structureExtended"), doc.isStructureExtended());
+        o.insert(QStringLiteral("demo"), doc.isDemoProject());
+        o.insert(QStringLiteral("reports"), reports);
+        out() << QJsonDocument(o).toJson(QJsonDocument::Indented);
+    } else {
+        out() << "Projekt: " << doc.projectName() << "\n";
+        out() << "Dateiversion: " << doc.fileVersion() << "\n";
+        out() << "Bauberichte: " << rows.size() << "\n";
+        for (int row : rows) {
+            const bool locked = entries->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0;
+            out() << doc.entryNumberWithUserId(row) << "\t"
+                  << entries->data(row, QStringLiteral("inspection_date"), Qt::EditRole)
+                         .toDate()
+                         .toString(QStringLiteral("dd.MM.yyyy"))
+                  << "\t" << (locked ? "gesperrt" : "offen") << "\n";
+        }
+    }
+    out().flush();
+    doc.closeDocument();
+    return ExitOk;
+}
+
+int cmdCheck(const QString& file, bool json)
+{
+    const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
+    static const char* const statusNames[] = {"can be opened", "missing", "damaged", "held by a running instance",
+                                              "made by a newer version"};
+    static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged, CheckHeld, CheckNewer};
+    if (json) {
+        QJsonObject o;
+        o.insert(QStringLiteral("status"), QLatin1String(statusNames[r.status]));
+        o.insert(QStringLiteral("integrity"), r.integrity);
+        o.insert(QStringLiteral("fileVersion"), r.version);
+        o.insert(QStringLiteral("workingCopy"), r.workingCopyExists);
+        o.insert(QStringLiteral("held"), r.workingCopyHeld);
+        if (r.lockInfo.size() >= 4) {
+            QJsonObject holder;
+            holder.insert(QStringLiteral("user"), r.lockInfo[0]);
+            holder.insert(QStringLiteral("computer"), r.lockInfo[1]);
+            holder.insert(QStringLiteral("date"), r.lockInfo[2]);
+            holder.insert(QStringLiteral("time"), r.lockInfo[3]);
+            o.insert(QStringLiteral("lockInfo"), holder);
+        }
+        o.insert(QStringLiteral("backups"), QJsonArray::fromStringList(r.backups));
+        out() << QJsonDocument(o).toJson(QJsonDocument::Indented);
+        out().flush();
+        return exitCodes[r.status];
+    }
+    out() << "Status: " << statusNames[r.status] << "\n";
+    if (r.status == VDRDiaryCheck::Missing) {
+        out().flush();
+        return exitCodes[r.status];
+    }
+    out() << "Integrity: " << r.integrity << "\n";
+    out() << "Dateiversion: " << (r.version.isEmpty() ? QStringLiteral("-") : r.version) << "\n";
+    out() << "Working copy: " << (r.workingCopyExists ? (r.workingCopyHeld ? "held" : "present, not held") : "none")
+          << "\n";
+    if (r.workingCopyExists) {
+        if (r.lockInfo.size() >= 4)
+            out() << "Lock: User: " << r.lockInfo[0] << ", Computer: " << r.lockInfo[1] << ", seit dem "
+                  << r.lockInfo[2] << " " << r.lockInfo[3] << " Uhr\n";
+        else
+            out() << "Lock: no lock information\n";
+    }
+    out() << "Backups: " << r.backups.size() << "\n";
+    for (const QString& b : r.backups)
+        out() << "  " << b << "\n";
+    out().flush();
+    return exitCodes[r.status];
+}
+
+} // namespace
+
+int main(int argc, char* argv[])
+{
+    QCoreApplication app(argc, argv);
+    QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
+    QCoreApplication::setOrganizationDomain(QStringLiteral("korvant-software.de"));
+    QCoreApplication::setApplicationName(QStringLiteral("Varduna"));
+
+    QStringList args = QCoreApplication::arguments().mid(1);
+    const bool yes = args.removeAll(QStringLiteral("--yes")) > 0;
+    const bool json = args.removeAll(QStringLiteral("--json")) > 0;
+    if (args.contains(QStringLiteral("-h")) || args.contains(QStringLiteral("--help"))) {
+        std::fputs(kHelp, stdout);
+        return ExitOk;
+    }
+    if (args.size() != 2 || args[1].startsWith(QLatin1String("--"))) {
+        err(QStringLiteral("varduna-cli: expected COMMAND FILE; see varduna-cli --help"));
+        return ExitUsage;
+    }
+
+    VDRCliPrompt prompt(yes);
+    VDRPrompt::setInstance(&prompt);
+
+    const QString command = args[0];
+    const QString file = args[1];
+    int result;
+    if (command == QLatin1String("new"))
+        result = cmdNew(file);
+    else if (command == QLatin1String("info"))
+        result = cmdInfo(file, json);
+    else if (command == QLatin1String("check"))
+        result = cmdCheck(file, json);
+    else {
+        err(QStringLiteral("varduna-cli: unknown command '%1'; see varduna-cli --help").arg(command));
+        result = ExitUsage;
+    }
+    VDRPrompt::setInstance(nullptr);
+    return result;
+}

@@ -1,0 +1,213 @@
+#include "document/VDRDataWidgetMapper.h"
+
+#include "document/VDRSqlTableModel.h"
+
+#include <QEvent>
+#include <QTextDocument>
+#include <QVariant>
+
+namespace {
+const QByteArray kRichText = QByteArrayLiteral("richtext");
+const QByteArray kHtml = QByteArrayLiteral("html");
+
+QString plainTextOf(const QString& html)
+{
+    QTextDocument doc;
+    doc.setHtml(html);
+    return doc.toPlainText();
+}
+} // namespace
+
+VDRDataWidgetMapper::VDRDataWidgetMapper(QObject* parent) : QObject(parent)
+{
+}
+
+void VDRDataWidgetMapper::setModel(VDRSqlTableModel* model)
+{
+    if (m_model)
+        disconnect(m_model, nullptr, this, nullptr);
+    clearMapping();
+    m_model = model;
+    m_row = -1;
+    if (m_model)
+        connect(m_model, &QAbstractItemModel::dataChanged, this, &VDRDataWidgetMapper::slotDataChanged);
+}
+
+void VDRDataWidgetMapper::addMapping(QObject* widget, int column, const QByteArray& propertyName)
+{
+    if (!widget)
+        return;
+    m_mappings.append({widget, column, propertyName});
+    widget->installEventFilter(this);
+    if (QObject* t = target(m_mappings.last()); t && t != widget)
+        t->installEventFilter(this);
+}
+
+void VDRDataWidgetMapper::addMapping(QObject* widget, const QString& field, const QByteArray& propertyName)
+{
+    if (m_model)
+        addMapping(widget, m_model->fieldIndex(field), propertyName);
+}
+
+void VDRDataWidgetMapper::clearMapping()
+{
+    for (const Mapping& m : qAsConst(m_mappings)) {
+        if (m.widget)
+            m.widget->removeEventFilter(this);
+    }
+    m_mappings.clear();
+}
+
+QObject* VDRDataWidgetMapper::target(const Mapping& m) const
+{
+    if (!m.widget || m.property != kRichText)
+        return m.widget;
+    // The rich-text editor sits inside the mapped widget; it is the child with an "html" property.
+    if (m.widget->property(kHtml.constData()).isValid())
+        return m.widget;
+    const QList<QObject*> children = m.widget->findChildren<QObject*>();
+    for (QObject* child : children) {
+        if (child->metaObject()->indexOfProperty(kHtml.constData()) >= 0)
+            return child;
+    }
+    return nullptr;
+}
+
+QByteArray VDRDataWidgetMapper::targetProperty(const Mapping& m) const
+{
+    return m.property == kRichText ? kHtml : m.property;
+}
+
+void VDRDataWidgetMapper::setCurrentRow(int row)
+{
+    if (!m_model)
+        return;
+    m_model->fetch_all();
+    if (row < 0 || row >= m_model->rowCount()) {
+        m_row = -1;
+        populateEmpty();
+        emit currentRowChanged(m_row);
+        return;
+    }
+    m_row = row;
+    populate();
+    emit currentRowChanged(m_row);
+}
+
+void VDRDataWidgetMapper::toFirst()
+{
+    setCurrentRow(0);
+}
+
+void VDRDataWidgetMapper::toLast()
+{
+    if (m_model) {
+        m_model->fetch_all();
+        setCurrentRow(m_model->rowCount() - 1);
+    }
+}
+
+void VDRDataWidgetMapper::toNext()
+{
+    if (m_model && m_row + 1 < m_model->rowCount())
+        setCurrentRow(m_row + 1);
+}
+
+void VDRDataWidgetMapper::toPrevious()
+{
+    if (m_row > 0)
+        setCurrentRow(m_row - 1);
+}
+
+void VDRDataWidgetMapper::populate(const Mapping& m)
+{
+    QObject* t = target(m);
+    if (!t || !m_model || m_row < 0)
+        return;
+    const QVariant value = m_model->data(m_model->index(m_row, m.column), Qt::EditRole);
+    const QByteArray prop = targetProperty(m);
+    if (t->property(prop.constData()) != value)
+        t->setProperty(prop.constData(), value);
+}
+
+void VDRDataWidgetMapper::populate()
+{
+    for (const Mapping& m : qAsConst(m_mappings))
+        populate(m);
+}
+
+void VDRDataWidgetMapper::populateEmpty()
+{
+    for (const Mapping& m : qAsConst(m_mappings)) {
+        QObject* t = target(m);
+        if (!t)
+            continue;
+        const QByteArray prop = targetProperty(m);
+        const QVariant current = t->property(prop.constData());
+        t->setProperty(prop.constData(), QVariant(current.userType(), nullptr));
+    }
+}
+
+bool VDRDataWidgetMapper::commit(int column)
+{
+    if (!m_model || m_row < 0)
+        return false;
+    bool ok = true;
+    for (const Mapping& m : qAsConst(m_mappings)) {
+        if (m.column != column)
+            continue;
+        QObject* t = target(m);
+        if (!t)
+            continue;
+        const QModelIndex idx = m_model->index(m_row, m.column);
+        const QVariant widgetValue = t->property(targetProperty(m).constData());
+        const QVariant modelValue = m_model->data(idx, Qt::EditRole);
+        bool differs;
+        if (m.property == kRichText)
+            differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString());
+        else
+            differs = widgetValue != modelValue;
+        if (!differs)
+            continue;
+        // Writing back fires dataChanged, which would repopulate the editor and lose its cursor.
+        QSignalBlocker blocker(this);
+        disconnect(m_model, &QAbstractItemModel::dataChanged, this, &VDRDataWidgetMapper::slotDataChanged);
+        ok &= m_model->setData(idx, widgetValue, Qt::EditRole);
+        connect(m_model, &QAbstractItemModel::dataChanged, this, &VDRDataWidgetMapper::slotDataChanged);
+    }
+    return ok;
+}
+
+bool VDRDataWidgetMapper::submit()
+{
+    bool ok = true;
+    for (const Mapping& m : qAsConst(m_mappings))
+        ok &= commit(m.column);
+    return ok;
+}
+
+void VDRDataWidgetMapper::revert()
+{
+    populate();
+}
+
+bool VDRDataWidgetMapper::eventFilter(QObject* watched, QEvent* event)
+{
+    if (event->type() == QEvent::FocusOut && m_policy == AutoSubmit) {
+        for (const Mapping& m : qAsConst(m_mappings)) {
+            if (m.widget == watched || target(m) == watched)
+                commit(m.column);
+        }
+    }
+    return QObject::eventFilter(watched, event);
+}
+
+void VDRDataWidgetMapper::slotDataChanged(const QModelIndex& topLeft, const QModelIndex& bottomRight)
+{
+    if (m_row < topLeft.row() || m_row > bottomRight.row())
+        return;
+    for (const Mapping& m : qAsConst(m_mappings)) {
+        if (m.column >= topLeft.column() && m.column <= bottomRight.column())
+            populate(m);
+    }
+}

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <QString>
+#include <QStringList>
+
+// A read-only look at a diary file, its working copy and backups, for integrity checks from the
+// command line: nothing is written, not even the lock probe's dummy row.
+class VDRDiaryCheck
+{
+public:
+    enum Status { CanBeOpened = 0, Missing, Damaged, Held, Newer };
+
+    struct Result
+    {
+        Status status = Missing;
+        QString integrity;      // "ok" or the first problem SQLite reports
+        QString version;        // "fileversion", empty when unreadable
+        bool workingCopyExists = false;
+        bool workingCopyHeld = false;
+        QStringList lockInfo;   // user, computer, date, time
+        QStringList backups;    // newest first
+    };
+
+    static Result inspect(const QString& path);
+    static QStringList existingBackups(const QString& path);
+};

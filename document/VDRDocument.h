@@ -1,0 +1,249 @@
+#pragma once
+
+#include "document/VDRSqlTableModel.h"
+
+#include <QDateTime>
+#include <QMap>
+#include <QObject>
+#include <QSqlDatabase>
+#include <QStringList>
+
+#include <functional>
+
+class VDRAllEntryTableModel;
+
+// The one open diary. It never edits the diary file itself: it works on a locked working copy
+// beside it and writes that back only on save.
+class VDRDocument : public QObject
+{
+    Q_OBJECT
+public:
+    explicit VDRDocument(QObject* parent = nullptr);
+    ~VDRDocument() override;
+
+    static QString connectionName() { return QStringLiteral("VDNDOC"); }
+
+    bool createDocument(bool hideSyncButton);
+    bool openDocument(const QString& path, bool& showError);
+    bool closeDocument();
+
+    bool isStateValid() const { return m_valid; }
+    bool isStateNew() const { return m_new; }
+    bool isStateModified() const { return m_modified || globalModified(); }
+    bool isStateSaved() const { return m_saved; }
+    bool isStructureExtended() const { return m_structureExtended; }
+    bool isDemoProject() const { return m_demo; }
+    QString getFilepath() const { return m_filePath; }
+    QString getFilepathWorkingCopy() const { return m_workingCopyPath; }
+    QString fileVersion() const { return m_fileVersion; }
+    QString temporaryFolder() const { return m_tempFolder; }
+    QSqlDatabase database() const;
+    void setModified(bool modified) { m_modified = modified; }
+
+    // The process-wide modified flag, set by edits and every key press.
+    static void setGlobalModified(bool modified);
+    static bool globalModified();
+
+    // Names beside a diary X.vd2.
+    static QString workingCopyPathFor(const QString& diaryPath);
+    static QString lockInfoPathFor(const QString& diaryPath);
+    static QString documentsDbPathFor(const QString& diaryPath);
+    static QString currentUserName();
+    static QString currentComputerName();
+
+    // Lock information: user, computer, date, time. Empty list when the file cannot be read.
+    static QStringList readLockInfo(const QString& lockInfoPath);
+    static bool writeLockInfo(const QString& lockInfoPath);
+
+    static QString findFreeTempFile(const QString& suffix);
+    // Like findFreeTempFile, and the file is deleted when the document closes.
+    QString getFreeTempFile(const QString& suffix);
+
+    // "ok" for an intact database, "NoResult" when the check yields nothing, else the first problem.
+    static QString checkDbIntegrity(QSqlDatabase db);
+    bool reopenWorkingCopyAfterError();
+    // Writes the committed working copy to 'target' (closing and reopening the connection around
+    // the copy so the lock is never dropped by a stray file handle).
+    bool writeWorkingCopyTo(const QString& target);
+
+    // Nesting transactions; only the outermost pair reaches the database.
+    void beginTransaction();
+    void endTransaction();
+    int transactionDepth() const { return m_transactionDepth; }
+
+    // Models of the diary as a whole.
+    void initModels();
+    void destroyModels();
+    VDRSqlTableModel* modelMeta() const { return m_modelMeta; }
+    VDRSqlTableModel* modelVdr() const { return m_modelVdr; }
+    VDRSqlTableModel* modelAddresslist() const { return m_modelAddresslist; }
+    VDRSqlTableModel* modelCompany1() const { return m_modelCompany1; }
+    VDRSqlTableModel* modelCompany2() const { return m_modelCompany2; }
+    VDRAllEntryTableModel* modelEntryAll() const { return m_modelEntryAll; }
+    VDRSqlTableModel* modelExternalEntryNumber() const { return m_modelExternalEntryNumber; }
+
+    // Models of one report, built on first access.
+    void initEntryModels(int entryId);
+    bool hasEntryModels(int entryId) const { return m_entryModels.contains(entryId); }
+    VDRSqlTableModel* modelEntry(int entryId, VDRSqlTableModel::TABLE_NAMES table);
+    QList<VDRSqlTableModel*> entryModels(int entryId);
+    VDRSqlTableModel* modelEntryAttendee(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_ATTENDEE); }
+    VDRSqlTableModel* modelEntryWorkforce(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_WORKFORCE); }
+    VDRSqlTableModel* modelEntryTimeRecording(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_TIME_RECORDING);
+    }
+    VDRSqlTableModel* modelEntryDelay(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DELAY); }
+    VDRSqlTableModel* modelEntryObstruction(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_OBSTRUCTION); }
+    VDRSqlTableModel* modelEntryDfcy(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DEFICIENCY); }
+    VDRSqlTableModel* modelEntryAcceptance(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_ACCEPTANCE); }
+    VDRSqlTableModel* modelEntryPhoto1(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_PROGRESS); }
+    VDRSqlTableModel* modelEntryPhoto2(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_DEFICIENCY);
+    }
+    VDRSqlTableModel* modelEntryPhoto3(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_OBSTRUCTION);
+    }
+    VDRSqlTableModel* modelEntryPhoto4(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MEASURE); }
+    VDRSqlTableModel* modelEntryPhoto5(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MATERIAL); }
+    VDRSqlTableModel* modelEntryDirective(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DIRECTIVE); }
+    VDRSqlTableModel* modelEntryAuxiliaryservice(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_AUXILIARY_SERVICE);
+    }
+    VDRSqlTableModel* modelEntryConstructionmeasure(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_CONSTRUCTION_MEASURE);
+    }
+    VDRSqlTableModel* modelEntryConstructionmaterial(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_CONSTRUCTION_MATERIAL);
+    }
+    VDRSqlTableModel* modelEntryScheduleddelivery(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_SCHEDULED_DELIVERY);
+    }
+    VDRSqlTableModel* modelEntryTelephoneNotice(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_TELEPHONE_NOTICE);
+    }
+    VDRSqlTableModel* modelEntryConcern(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_CONCERN); }
+    VDRSqlTableModel* modelEntryEquipment(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_EQUIPMENT); }
+
+    void initAddresslistModels(int listId);
+    VDRSqlTableModel* modelAddresslistItem(int listId);
+
+    // Meta keys.
+    QString metaValue(const QString& key) const;
+    bool hasMetaKey(const QString& key) const;
+    bool setMetaValue(const QString& key, const QString& value);
+    int metaFlag(const QString& key) const;
+    bool setMetaFlag(const QString& key);
+    bool noFileSizeWarning() const { return metaFlag(QStringLiteral("NoFileSizeWarning")) != 0; }
+    bool setNoFileSizeWarning() { return setMetaFlag(QStringLiteral("NoFileSizeWarning")); }
+    bool isExportedTo() const { return hasMetaKey(QStringLiteral("exportedTo")); }
+    bool setExportedTo() { return setMetaFlag(QStringLiteral("exportedTo")); }
+    bool isExportedFrom() const { return hasMetaKey(QStringLiteral("exportedFrom")); }
+    bool setExportedFrom() { return setMetaFlag(QStringLiteral("exportedFrom")); }
+    bool imageUploadAdvertisingMessage1Shown() const
+    {
+        return metaFlag(QStringLiteral("ImageUploadAdvertisingMessage1Shown")) != 0;
+    }
+    bool setImageUploadAdvertisingMessage1Shown()
+    {
+        return setMetaFlag(QStringLiteral("ImageUploadAdvertisingMessage1Shown"));
+    }
+    bool imageUploadAdvertisingMessage2Shown() const
+    {
+        return metaFlag(QStringLiteral("ImageUploadAdvertisingMessage2Shown")) != 0;
+    }
+    bool setImageUploadAdvertisingMessage2Shown()
+    {
+        return setMetaFlag(QStringLiteral("ImageUploadAdvertisingMessage2Shown"));
+    }
+    QDateTime masterDataImportVersion() const;
+    bool setMasterDataImportVersion(const QDateTime& version);
+    QString projectName() const;
+
+    // Report numbers (rows of modelEntryAll()).
+    int appendEntry();
+    static int entryNumberDigits(const QString& number);
+    int entryNumberDigits(int row) const;
+    QString entryNumberString(int row) const;
+    QChar entryNumberLetter(int row) const;
+    int entryNumberInt(int row) const;
+    QString entryNumberWithUserId(int row) const;
+    QString externalEntryNumberString(int row) const;
+    int maxEntryNumber() const;
+    int maxEntryNumber(int& number, QChar& letter) const;
+    int maxEntryID() const;
+    void entrySetNumberText(int row);
+    void entryNumbersAddDigit(int digits);
+    static QString cutNumber(const QString& number);
+    static QString numberWithUserId(const QString& number, const QString& userId);
+
+    bool appendCompany1(const QString& type);
+    bool appendCompany2();
+
+    // Restoring a damaged diary from its backups.
+    static QString getBackupFile4Restore(const QString& path, int& count);
+    static bool restoreBackupFile(const QString& path, const QString& backup, QString& newName, QString& error);
+
+    // Asked whether a diary is on the cloud synchronisation list; installed by the synchronisation.
+    static void setSyncListQuery(std::function<bool(const QString&)> query);
+    static bool isOnSyncList(const QString& path);
+
+public slots:
+    void sqlTableIdGenerator(int row, QSqlRecord& record);
+
+signals:
+    void documentOpened(VDRDocument* document);
+    void documentClosed(VDRDocument* document);
+    void syncButtonVisibilityChanged(bool visible);
+    // Opening found no file under this path; the recent-files list should forget it.
+    void recentFileMissing(const QString& path);
+
+private:
+    enum LockState { WorkingCopyAbsent, WorkingCopyLocked, WorkingCopyCorrupt, WorkingCopyFree };
+    LockState probeWorkingCopy(const QString& workingCopy, bool& failed);
+    bool discardWorkingCopy(const QString& workingCopy, const QString& lockInfo, const QString& diaryPath);
+    bool openWorkingCopyConnection(bool showErrors);
+    void closeConnection();
+    void abandonOpening(bool removeWorkingCopy);
+    VDRSqlTableModel* createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter);
+    void connectIdGenerator(VDRSqlTableModel* model);
+    bool importExternalDocuments();
+    void repairOldVersion();
+    void freezeCompaniesOfLockedEntries();
+    void renumberPositions();
+    void clearState();
+    void removeTemporaryFiles();
+
+    bool m_valid = false;
+    bool m_new = false;
+    bool m_modified = false;
+    bool m_saved = false;
+    bool m_structureExtended = false;
+    bool m_demo = false;
+    QString m_filePath;
+    QString m_workingCopyPath;
+    QString m_lockInfoPath;
+    QString m_tempFolder;
+    QStringList m_filesToRemove;
+    QString m_fileVersion;
+    int m_transactionDepth = 0;
+
+    VDRSqlTableModel* m_modelMeta = nullptr;
+    VDRSqlTableModel* m_modelVdr = nullptr;
+    VDRSqlTableModel* m_modelAddresslist = nullptr;
+    VDRSqlTableModel* m_modelCompany1 = nullptr;
+    VDRSqlTableModel* m_modelCompany2 = nullptr;
+    VDRAllEntryTableModel* m_modelEntryAll = nullptr;
+    VDRSqlTableModel* m_modelExternalEntryNumber = nullptr;
+    QMap<int, QMap<int, VDRSqlTableModel*>> m_entryModels;
+    QMap<int, VDRSqlTableModel*> m_addresslistModels;
+    // Declared column types per table, read once per opening for the models' value types.
+    QHash<QString, QHash<QString, QString>> m_declaredTypes;
+};

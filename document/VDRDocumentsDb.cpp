@@ -1,0 +1,60 @@
+#include "document/VDRDocumentsDb.h"
+
+#include "document/VDRDocument.h"
+#include "document/VDRPrompt.h"
+
+#include <QCoreApplication>
+#include <QDebug>
+#include <QFileInfo>
+#include <QSqlDatabase>
+#include <QSqlError>
+#include <QSqlQuery>
+
+bool VDRDocumentsDb::resetChangesOnDocumentsDb(const QString& diaryPath)
+{
+    const QString path = VDRDocument::documentsDbPathFor(diaryPath);
+    if (!QFileInfo::exists(path))
+        return true;
+    bool ok = true;
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), connectionName());
+        db.setDatabaseName(path);
+        if (!db.open()) {
+            VDRPrompt::critical(QCoreApplication::translate("VDRDocumentsDb", "Datenbankfehler Dokumente-Datenbank"),
+                                db.lastError().driverText());
+            ok = false;
+        } else {
+            QSqlQuery q(db);
+            q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
+            const QStringList statements = {
+                QStringLiteral("UPDATE documents SET status = 0 WHERE status = 2"),
+                QStringLiteral("DELETE FROM documents WHERE status = 1 OR status = 3"),
+                QStringLiteral("UPDATE documents SET record_id = orig_record_id, entry_id = orig_entry_id WHERE "
+                               "orig_record_id > -1 AND orig_entry_id > -1"),
+                QStringLiteral("UPDATE documents SET orig_record_id = -1, orig_entry_id = -1 WHERE orig_record_id > -1"),
+            };
+            q.exec(QStringLiteral("BEGIN EXCLUSIVE TRANSACTION"));
+            for (const QString& sql : statements) {
+                if (!q.exec(sql)) {
+                    qDebug().noquote() << "SQL Error: " << q.lastError().text();
+                    ok = false;
+                }
+            }
+            q.exec(QStringLiteral("COMMIT TRANSACTION"));
+        }
+        db.close();
+    }
+    QSqlDatabase::removeDatabase(connectionName());
+    return ok;
+}
+
+void VDRDocumentsDb::checkDocumentDBsFreeSpace(const QString& diaryPath)
+{
+    Q_UNUSED(diaryPath)
+}
+
+bool VDRDocumentsDb::importExternalDocuments(VDRDocument* document)
+{
+    Q_UNUSED(document)
+    return true;
+}

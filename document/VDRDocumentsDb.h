@@ -1,0 +1,21 @@
+#pragma once
+
+#include <QString>
+
+class VDRDocument;
+
+// The documents database beside a diary (X.vdd): attached plans and delivery papers with their
+// pending changes, committed on save and rolled back on close.
+class VDRDocumentsDb
+{
+public:
+    static QString connectionName() { return QStringLiteral("DOCUMENTS"); }
+
+    // Rolls back the pending changes of the diary's documents database, if it has one.
+    static bool resetChangesOnDocumentsDb(const QString& diaryPath);
+    // After closing: offers compaction when much space could be freed.
+    static void checkDocumentDBsFreeSpace(const QString& diaryPath);
+    // One-time move of external document files into the database; leaves "documentImport" alone
+    // while nothing was moved.
+    static bool importExternalDocuments(VDRDocument* document);
+};

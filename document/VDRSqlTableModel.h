@@ -1,0 +1,133 @@
+#pragma once
+
+#include <QHash>
+#include <QMap>
+#include <QSqlTableModel>
+#include <QStringList>
+#include <QVariant>
+
+class VDRDocument;
+
+// A table of the open diary: manual submission, addressed by field names and record ids.
+class VDRSqlTableModel : public QSqlTableModel
+{
+    Q_OBJECT
+public:
+    enum TABLE_NAMES {
+        TN_WORKFORCE = 0,
+        TN_DELAY,
+        TN_OBSTRUCTION,
+        TN_DEFICIENCY,
+        TN_ACCEPTANCE,
+        TN_PHOTO_PROGRESS,
+        TN_PHOTO_DEFICIENCY,
+        TN_PHOTO_OBSTRUCTION,
+        TN_DIRECTIVE,
+        TN_AUXILIARY_SERVICE,
+        TN_CONSTRUCTION_MEASURE,
+        TN_CONSTRUCTION_MATERIAL,
+        TN_SCHEDULED_DELIVERY,
+        TN_META,
+        TN_VDR,
+        TN_ADDRESSLIST,
+        TN_COMPANY1,
+        TN_COMPANY2,
+        TN_ADDRESSLIST_ITEM,
+        TN_ATTENDEE,
+        TN_TELEPHONE_NOTICE,
+        TN_CONCERN,
+        TN_ENTRY,
+        TN_TIME_RECORDING,
+        TN_EQUIPMENT,
+        TN_PHOTO_MEASURE,
+        TN_PHOTO_MATERIAL,
+        TN_COUNT
+    };
+    Q_ENUM(TABLE_NAMES)
+
+    // How the display role of a column is formatted; check-box columns also become user-checkable.
+    enum DISPLAYROLE_TYPE {
+        DRT_DEFAULT = 0,
+        DRT_DATE,      // dd.MM.yyyy
+        DRT_TIME,      // hh:mm
+        DRT_HOURS,     // decimal hours, two places
+        DRT_CHECKBOX,  // 0/1 shown as a check box
+        DRT_IMAGE,     // image id shown as thumbnail by the views
+        DRT_COMPANY,   // company id shown in an output format by the views
+    };
+    Q_ENUM(DISPLAYROLE_TYPE)
+
+    VDRSqlTableModel(TABLE_NAMES tableName, VDRDocument* document, QSqlDatabase db);
+
+    static QString displayName(TABLE_NAMES tableName);
+    static QString sqlTableName(TABLE_NAMES tableName);
+    // The type condition of tables shared by several kinds of rows (0 = none).
+    static int typeCondition(TABLE_NAMES tableName);
+    TABLE_NAMES tableNameId() const { return m_tableName; }
+    VDRDocument* getDocument() const { return m_document; }
+
+    void fetch_all();
+
+    bool appendRow(const QHash<QString, QVariant>& values);
+    bool insertRow(int row, const QHash<QString, QVariant>& values);
+    using QSqlTableModel::insertRow;
+
+    using QSqlTableModel::data;
+    using QSqlTableModel::index;
+    using QSqlTableModel::setData;
+    using QSqlTableModel::setHeaderData;
+    bool setData(int row, const QString& field, const QVariant& value, int role = Qt::EditRole);
+    QVariant data(int row, const QString& field, int role = Qt::DisplayRole) const;
+    QModelIndex index(int row, const QString& field) const;
+
+    int rowById(int id);
+    QModelIndex indexById(int id, const QString& field);
+    bool setDataById(int id, const QString& field, const QVariant& value, int role = Qt::EditRole);
+    QVariant dataById(int id, const QString& field, int role = Qt::DisplayRole);
+
+    int last_id();
+    int maxPos();
+    // Row of the first record whose field holds the value, -1 when none.
+    int record_position(const QString& field, const QVariant& value);
+
+    bool submitAll();
+
+    bool setHeaderData(const QString& field, Qt::Orientation orientation, const QVariant& value,
+                       int role = Qt::EditRole);
+
+    void setType(const QString& field, QVariant::Type type);
+    void setType(int column, QVariant::Type type);
+    QVariant::Type type(int column) const { return m_types.value(column, QVariant::Invalid); }
+    void setDisplayroleType(const QString& field, DISPLAYROLE_TYPE type);
+    void setDisplayroleType(int column, DISPLAYROLE_TYPE type);
+    DISPLAYROLE_TYPE displayroleType(int column) const { return m_displayTypes.value(column, DRT_DEFAULT); }
+
+    // Company ids used by the rows (as map keys) / replaced through a map old id -> new id.
+    void getCompanyIds(QMap<int, int>* ids);
+    void updateCompanyIds(QMap<int, int>* ids);
+    // Photo rows assigned to a deficiency follow its company; removing a deficiency frees its photos.
+    void updateCompany4PhotoModel(int relationId, const QVariant& companyId);
+    void removeRelationsFromPhotoModel(int relationId);
+
+    QStringList construction_measure_locations();
+    QStringList construction_measure_kks();
+
+    void block_on() { blockSignals(true); }
+    void block_off() { blockSignals(false); }
+
+    QVariant data(const QModelIndex& index, int role = Qt::DisplayRole) const override;
+    bool setData(const QModelIndex& index, const QVariant& value, int role = Qt::EditRole) override;
+    Qt::ItemFlags flags(const QModelIndex& index) const override;
+
+protected:
+    // Sub-table and company rows can be dragged between views.
+    bool isDragEnabledTable() const;
+
+private:
+    QStringList distinctTexts(const QString& field);
+
+    TABLE_NAMES m_tableName;
+    VDRDocument* m_document;
+    QHash<int, QVariant::Type> m_types;
+    QHash<int, DISPLAYROLE_TYPE> m_displayTypes;
+};

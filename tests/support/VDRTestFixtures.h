@@ -1,0 +1,33 @@
+#pragma once
+
+#include <QSqlDatabase>
+#include <QString>
+#include <QStringList>
+#include <QVariant>
+
+// Fixtures built in code: diaries in the current and older layouts, damaged files, isolated settings.
+namespace VDRTestFixtures {
+
+// Settings go to a folder of the test's own; call before anything reads QSettings.
+void isolateSettings(const QString& folder);
+
+// A new diary written to 'path' exactly as the application creates and saves one.
+bool createDiary(const QString& path);
+
+// The oldest layout the upgrades know: every upgrade step has work to do. Holds one report with
+// workforce rows in the three-pair layout, materials with OK flags, progress rows with NOT NULL dates.
+bool createOldestLayoutDiary(const QString& path, const QString& fileVersion = QStringLiteral("0.1"));
+
+// Runs statements on a closed file; returns false on the first failure.
+bool execSql(const QString& path, const QStringList& statements);
+QVariant queryValue(const QString& path, const QString& sql);
+QList<QVariantList> queryRows(const QString& path, const QString& sql);
+
+// "name type notnull default pk" per column, in order, for comparing structures.
+QStringList tableLayout(const QString& path, const QString& table);
+QStringList tableNames(const QString& path);
+
+// Overwrites bytes in the middle of the file so that SQLite sees a damaged b-tree.
+bool damageFile(const QString& path);
+
+} // namespace VDRTestFixtures
