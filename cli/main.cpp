@@ -55,6 +55,8 @@ const char* const kHelp =
     "  --json              Machine-readable output (info, check).\n"
     "  -h, --help          This text.\n"
     "\n"
+    "Set VARDUNA_DEBUG=1 to see the program's debug log on stderr.\n"
+    "\n"
     "Exit codes of new and info:\n"
     "  0  done\n"
     "  1  usage error\n"
@@ -204,11 +206,19 @@ int cmdCheck(const QString& file, bool json)
     return exitCodes[r.status];
 }
 
+// The user hears from the program through the prompt; Qt's own log lines are for developers.
+void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QString& message)
+{
+    if (type == QtFatalMsg || type == QtCriticalMsg || qEnvironmentVariableIsSet("VARDUNA_DEBUG"))
+        std::fprintf(stderr, "%s\n", message.toLocal8Bit().constData());
+}
+
 } // namespace
 
 int main(int argc, char* argv[])
 {
     QCoreApplication app(argc, argv);
+    qInstallMessageHandler(quietMessageHandler);
     QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
     QCoreApplication::setOrganizationDomain(QStringLiteral("korvant-software.de"));
     QCoreApplication::setApplicationName(QStringLiteral("Varduna"));

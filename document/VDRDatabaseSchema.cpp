@@ -1,5 +1,6 @@
 #include "document/VDRDatabaseSchema.h"
 
+#include "document/CVdShared.h"
 #include "document/VDRPrompt.h"
 
 #include <QCoreApplication>
@@ -80,7 +81,7 @@ public:
         if (!q.exec(sql)) {
             m_failed = true;
             qWarning().noquote() << "upgrade failed:" << sql << q.lastError().text();
-            VDRPrompt::warning(QStringLiteral("SQL Error"), q.lastError().driverText());
+            VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(q.lastError()));
             return false;
         }
         m_extended = true;
@@ -91,7 +92,7 @@ public:
     {
         m_failed = true;
         qWarning().noquote() << "upgrade failed:" << error.text();
-        VDRPrompt::warning(QStringLiteral("SQL Error"), error.driverText());
+        VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(error));
     }
 
     bool hasColumn(const QString& table, const QString& column)

@@ -4,6 +4,7 @@
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
+#include "document/CVdShared.h"
 #include "document/VDRPrompt.h"
 
 #include <QCoreApplication>
@@ -251,7 +252,7 @@ bool VDRDocument::openWorkingCopyConnection(bool showErrors)
     db.setDatabaseName(m_workingCopyPath);
     if (!db.open()) {
         if (showErrors)
-            VDRPrompt::critical(tr("Datenbankfehler"), db.lastError().driverText());
+            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(db.lastError()));
         return false;
     }
     QSqlQuery q(db);
@@ -362,7 +363,7 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     // A short wait covers another instance's momentary read; a held lock is held for good.
     ScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy, QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"));
     if (!lock.isOpen()) {
-        VDRPrompt::critical(tr("Datenbankfehler"), lock.lastError().driverText());
+        VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(lock.lastError()));
         failed = true;
         return WorkingCopyAbsent;
     }
@@ -370,16 +371,15 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     if (!insert.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');"))) {
         const QSqlError error = insert.lastError();
         insert.finish();
-        // Only a busy database means a running instance; anything else is a broken copy.
-        if (error.nativeErrorCode() == QLatin1String("5") || error.nativeErrorCode() == QLatin1String("6") ||
-            error.driverText().contains(QLatin1String("lock"), Qt::CaseInsensitive) ||
-            error.databaseText().contains(QLatin1String("locked"), Qt::CaseInsensitive))
+        // Only a busy database (SQLITE_BUSY, SQLITE_LOCKED) means a running instance holds it;
+        // any other failure means the copy itself is broken.
+        if (error.nativeErrorCode() == QLatin1String("5") || error.nativeErrorCode() == QLatin1String("6"))
             return WorkingCopyLocked;
         return WorkingCopyCorrupt;
     }
     QSqlQuery remove(lock.db());
     if (!remove.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"))) {
-        VDRPrompt::critical(tr("Datenbankfehler"), remove.lastError().driverText());
+        VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(remove.lastError()));
         failed = true;
         return WorkingCopyAbsent;
     }
@@ -486,7 +486,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     {
         ScopedConnection demo(QString::fromLatin1(kDemoConnection), diaryPath);
         if (!demo.isOpen()) {
-            VDRPrompt::critical(tr("Datenbankfehler"), demo.lastError().driverText());
+            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(demo.lastError()));
             return false;
         }
         QSqlQuery q(demo.db());
@@ -503,7 +503,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     } else {
         ScopedConnection version(QString::fromLatin1(kVersionConnection), diaryPath);
         if (!version.isOpen()) {
-            VDRPrompt::critical(tr("Datenbankfehler"), version.lastError().driverText());
+            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(version.lastError()));
             return false;
         }
         QSqlQuery q(version.db());
@@ -615,7 +615,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         QSqlQuery q(database());
         if (!q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) ||
             !q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"))) {
-            VDRPrompt::warning(QStringLiteral("SQL Error"), q.lastError().driverText());
+            VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(q.lastError()));
             q.finish();
             abandonOpening(madeWorkingCopy);
             return false;

@@ -223,7 +223,7 @@ int VDRDocument::appendEntry()
         {"print_notice", 1},
         {"print_telephone_notice", 1},
         {"progress_audio_id", 0},
-        {"user_id", QSettings().value(QStringLiteral("entry/UID"), QString()).toString()},
+        {"user_id", QSettings().value(QStringLiteral("entry/UID"), QStringLiteral("")).toString() + QStringLiteral("")},
         {"creation_date", QVariant(QVariant::DateTime)},
         {"exported_by_app", 0},
         {"import_version", QVariant(QVariant::DateTime)},

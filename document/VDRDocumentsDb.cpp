@@ -1,6 +1,7 @@
 #include "document/VDRDocumentsDb.h"
 
 #include "document/VDRDocument.h"
+#include "document/CVdShared.h"
 #include "document/VDRPrompt.h"
 
 #include <QCoreApplication>
@@ -21,7 +22,7 @@ bool VDRDocumentsDb::resetChangesOnDocumentsDb(const QString& diaryPath)
         db.setDatabaseName(path);
         if (!db.open()) {
             VDRPrompt::critical(QCoreApplication::translate("VDRDocumentsDb", "Datenbankfehler Dokumente-Datenbank"),
-                                db.lastError().driverText());
+                                CVdShared::sqlErrorText(db.lastError()));
             ok = false;
         } else {
             QSqlQuery q(db);

@@ -1,4 +1,290 @@
+#include "VDRTestFixtures.h"
+#include "VDRTestPrompt.h"
+#include "document/VDRDocument.h"
+
+#include <QCryptographicHash>
+#include <QJsonArray>
+#include <QJsonDocument>
+#include <QJsonObject>
+#include <QProcess>
+#include <QTemporaryDir>
 #include <QtTest>
-class T : public QObject { Q_OBJECT private slots: void nothing() {} };
-QTEST_MAIN(T)
+
+using namespace VDRTestFixtures;
+
+namespace {
+struct Run
+{
+    int exitCode = -1;
+    QString out;
+    QString err;
+};
+
+QByteArray fileHash(const QString& path)
+{
+    QFile f(path);
+    if (!f.open(QIODevice::ReadOnly))
+        return QByteArray();
+    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
+}
+} // namespace
+
+// Drives varduna-cli as a separate process, as people who automate use it.
+class TestCli : public QObject
+{
+    Q_OBJECT
+
+private slots:
+    void initTestCase();
+    void init();
+    void cleanup();
+
+    void helpListsCommandsAndExitCodes();
+    void usageErrors_data();
+    void usageErrors();
+    void newWritesAFreshDiary();
+    void newRefusesExistingFile();
+    void infoListsReports_data();
+    void infoListsReports();
+    void infoUpgradesOnlyTheWorkingCopy();
+    void checkExitCodes_data();
+    void checkExitCodes();
+    void heldDiaryIsReportedByInfoAndCheck();
+
+private:
+    Run cli(const QStringList& args);
+    QTemporaryDir m_dir;
+    VDRTestPrompt m_prompt;
+};
+
+void TestCli::initTestCase()
+{
+    QVERIFY(m_dir.isValid());
+    isolateSettings(m_dir.filePath(QStringLiteral("settings")));
+}
+
+void TestCli::init()
+{
+    m_prompt.reset();
+}
+
+void TestCli::cleanup()
+{
+    VDR_VERIFY_PROMPT(m_prompt);
+}
+
+Run TestCli::cli(const QStringList& args)
+{
+    QProcess p;
+    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+    env.insert(QStringLiteral("XDG_CONFIG_HOME"), m_dir.filePath(QStringLiteral("settings")));
+    p.setProcessEnvironment(env);
+    p.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"), args);
+    Run r;
+    if (!p.waitForFinished(60000))
+        return r;
+    r.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
+    r.out = QString::fromUtf8(p.readAllStandardOutput());
+    r.err = QString::fromUtf8(p.readAllStandardError());
+    return r;
+}
+
+void TestCli::helpListsCommandsAndExitCodes()
+{
+    const Run r = cli({QStringLiteral("--help")});
+    QCOMPARE(r.exitCode, 0);
+    for (const char* word : {"new FILE", "info FILE", "check FILE", "--yes", "held by a running instance"})
+        QVERIFY2(r.out.contains(QLatin1String(word)), word);
+}
+
+void TestCli::usageErrors_data()
+{
+    QTest::addColumn<QStringList>("args");
+    QTest::newRow("nothing") << QStringList();
+    QTest::newRow("no file") << QStringList{"info"};
+    QTest::newRow("unknown command") << QStringList{"frobnicate", "x.vd2"};
+}
+
+void TestCli::usageErrors()
+{
+    QFETCH(QStringList, args);
+    const Run r = cli(args);
+    QCOMPARE(r.exitCode, 1);
+    QVERIFY(r.err.contains(QLatin1String("--help")));
+}
+
+void TestCli::newWritesAFreshDiary()
+{
+    const QString path = m_dir.filePath(QStringLiteral("Neubau Müllerstraße.vd2"));
+    const Run r = cli({QStringLiteral("new"), path});
+    QCOMPARE(r.exitCode, 0);
+    QVERIFY(QFile::exists(path));
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+    QVERIFY(!QFile::exists(VDRDocument::lockInfoPathFor(path)));
+    QCOMPARE(queryTexts(path, "SELECT number FROM entry"), QStringList{"001 (Entwurf)"});
+    QCOMPARE(queryValue(path, "SELECT count(*) FROM company WHERE category = 1").toInt(), 3);
+    QCOMPARE(queryValue(path, "PRAGMA quick_check").toString(), QStringLiteral("ok"));
+
+    // The same structure as a diary the application creates.
+    const QString reference = m_dir.filePath(QStringLiteral("referenz.vd2"));
+    QVERIFY(createDiary(reference));
+    QCOMPARE(tableNames(path), tableNames(reference));
+    for (const QString& table : tableNames(reference))
+        QCOMPARE(tableLayout(path, table), tableLayout(reference, table));
+}
+
+void TestCli::newRefusesExistingFile()
+{
+    const QString path = m_dir.filePath(QStringLiteral("vorhanden.vd2"));
+    {
+        QFile f(path);
+        QVERIFY(f.open(QIODevice::WriteOnly));
+        f.write("wichtig");
+    }
+    const Run r = cli({QStringLiteral("new"), path});
+    QCOMPARE(r.exitCode, 2);
+    QVERIFY(r.err.startsWith(QLatin1String("Dateifehler: Die Datei\n")));
+    QFile f(path);
+    QVERIFY(f.open(QIODevice::ReadOnly));
+    QCOMPARE(f.readAll(), QByteArray("wichtig"));
+}
+
+void TestCli::infoListsReports_data()
+{
+    QTest::addColumn<bool>("json");
+    QTest::newRow("text") << false;
+    QTest::newRow("json") << true;
+}
+
+void TestCli::infoListsReports()
+{
+    QFETCH(bool, json);
+    const QString path = m_dir.filePath(QStringLiteral("info.vd2"));
+    if (!QFile::exists(path)) {
+        QVERIFY(createDiary(path));
+        QVERIFY(execSql(path, {"UPDATE vdr SET name = 'Kita Sonnenschein'",
+                               "UPDATE entry SET user_id = 'AB', inspection_date = '2026-11-30'",
+                               "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+                               "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, "
+                               "env_temperature, env_humidity, progress, deficiencies, construction_material_sample, "
+                               "print_notice, print_telephone_notice, user_id) VALUES (2, 1, '002', '2026-12-01', "
+                               "'08:00', '12:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, '')"}));
+    }
+    QStringList args{QStringLiteral("info"), path};
+    if (json)
+        args << QStringLiteral("--json");
+    const Run r = cli(args);
+    QCOMPARE(r.exitCode, 0);
+    QVERIFY2(r.err.isEmpty(), qPrintable(r.err));
+    if (json) {
+        const QJsonObject o = QJsonDocument::fromJson(r.out.toUtf8()).object();
+        QCOMPARE(o.value("project").toString(), QStringLiteral("Kita Sonnenschein"));
+        QCOMPARE(o.value("fileVersion").toString(), QStringLiteral("0.4"));
+        const QJsonArray reports = o.value("reports").toArray();
+        QCOMPARE(reports.size(), 2);
+        QCOMPARE(reports[0].toObject().value("number").toString(), QStringLiteral("001-AB (Entwurf)"));
+        QCOMPARE(reports[0].toObject().value("date").toString(), QStringLiteral("2026-11-30"));
+        QCOMPARE(reports[1].toObject().value("locked").toBool(), true);
+    } else {
+        QCOMPARE(r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts),
+                 QStringList({"Projekt: Kita Sonnenschein", "Dateiversion: 0.4", "Bauberichte: 2",
+                              "001-AB (Entwurf)\t30.11.2026\toffen", "002\t01.12.2026\tgesperrt"}));
+    }
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+}
+
+void TestCli::infoUpgradesOnlyTheWorkingCopy()
+{
+    const QString path = m_dir.filePath(QStringLiteral("altbau.vd2"));
+    QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
+    const QByteArray before = fileHash(path);
+    const Run r = cli({QStringLiteral("info"), path});
+    QCOMPARE(r.exitCode, 0);
+    QVERIFY(r.err.startsWith(QStringLiteral("Datei-Warnung: Sie öffnen ein Dokument, das mit einer früheren "
+                                           "Programmversion erstellt wurde.")));
+    QVERIFY(r.out.contains(QLatin1String("Dateiversion: 0.3\n")));
+    QVERIFY(r.out.contains(QLatin1String("001\t02.03.2009\tgesperrt\n")));
+    QCOMPARE(fileHash(path), before);
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+}
+
+void TestCli::checkExitCodes_data()
+{
+    QTest::addColumn<QString>("kind");
+    QTest::addColumn<int>("exitCode");
+    QTest::addColumn<QString>("status");
+    QTest::newRow("intact") << "intact" << 0 << "can be opened";
+    QTest::newRow("missing") << "missing" << 2 << "missing";
+    QTest::newRow("folder") << "folder" << 2 << "missing";
+    QTest::newRow("damaged") << "damaged" << 3 << "damaged";
+    QTest::newRow("not a diary") << "text" << 3 << "damaged";
+    QTest::newRow("newer") << "newer" << 5 << "made by a newer version";
+}
+
+void TestCli::checkExitCodes()
+{
+    QFETCH(QString, kind);
+    QFETCH(int, exitCode);
+    QFETCH(QString, status);
+    const QString path = m_dir.filePath(QStringLiteral("check-%1.vd2").arg(kind));
+    if (kind == QLatin1String("folder")) {
+        QDir().mkpath(path);
+    } else if (kind == QLatin1String("text")) {
+        QFile f(path);
+        QVERIFY(f.open(QIODevice::WriteOnly));
+        f.write("kein Tagebuch");
+    } else if (kind != QLatin1String("missing")) {
+        QVERIFY(createDiary(path));
+        if (kind == QLatin1String("damaged"))
+            QVERIFY(damageFile(path));
+        if (kind == QLatin1String("newer"))
+            QVERIFY(execSql(path, {"UPDATE meta SET value = '0.10' WHERE key = 'fileversion'"}));
+        QVERIFY(QFile::copy(path, path + QStringLiteral(".bak")));
+    }
+    const QByteArray before = fileHash(path);
+    const Run r = cli({QStringLiteral("check"), path});
+    QCOMPARE(r.exitCode, exitCode);
+    QVERIFY2(r.out.startsWith(QStringLiteral("Status: ") + status + QLatin1Char('\n')), qPrintable(r.out));
+    QCOMPARE(fileHash(path), before);
+    if (kind == QLatin1String("intact"))
+        QVERIFY(r.out.contains(QLatin1String("Working copy: none\nBackups: 1\n")));
+
+    const Run j = cli({QStringLiteral("check"), path, QStringLiteral("--json")});
+    QCOMPARE(j.exitCode, exitCode);
+    QCOMPARE(QJsonDocument::fromJson(j.out.toUtf8()).object().value("status").toString(), status);
+}
+
+void TestCli::heldDiaryIsReportedByInfoAndCheck()
+{
+    const QString path = m_dir.filePath(QStringLiteral("in Bearbeitung.vd2"));
+    QVERIFY(createDiary(path));
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+
+    const QString holder = QStringLiteral("User: %1\nComputer: %2\nseit dem %3 ")
+                               .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName(),
+                                    QDate::currentDate().toString());
+    const Run info = cli({QStringLiteral("info"), path, QStringLiteral("--yes")});
+    QCOMPARE(info.exitCode, 2);
+    QVERIFY2(info.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: Die Datei konnte nicht geöffnet werden, da "
+                                                "sie in Bearbeitung ist von\n") +
+                                 holder),
+             qPrintable(info.err));
+    QVERIFY(!info.err.contains(QLatin1String("Fehler:"))); // no second, general message
+
+    const Run check = cli({QStringLiteral("check"), path});
+    QCOMPARE(check.exitCode, 4);
+    QVERIFY(check.out.contains(QStringLiteral("Working copy: held\n")));
+    QVERIFY(check.out.contains(QStringLiteral("Lock: User: %1, Computer: %2")
+                                   .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName())));
+
+    // The holder is undisturbed: it can still write and close cleanly.
+    QVERIFY(doc.modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("weiter bearbeitet")));
+    QVERIFY(doc.modelVdr()->submitAll());
+    QVERIFY(doc.closeDocument());
+    QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
+}
+
+QTEST_GUILESS_MAIN(TestCli)
 #include "tst_cli.moc"

@@ -1,4 +1,474 @@
+#include "VDRTestFixtures.h"
+#include "VDRTestPrompt.h"
+#include "document/VDRDocument.h"
+#include "document/VDRFileOps.h"
+
+#include <QCryptographicHash>
+#include <QDir>
+#include <QProcess>
+#include <QSignalSpy>
+#include <QTemporaryDir>
 #include <QtTest>
-class T : public QObject { Q_OBJECT private slots: void nothing() {} };
-QTEST_MAIN(T)
+
+#include <signal.h>
+#include <unistd.h>
+
+using namespace VDRTestFixtures;
+
+namespace {
+QByteArray fileHash(const QString& path)
+{
+    QFile f(path);
+    if (!f.open(QIODevice::ReadOnly))
+        return QByteArray();
+    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
+}
+
+QString helperPath(const char* name)
+{
+    return QCoreApplication::applicationDirPath() + QLatin1Char('/') + QLatin1String(name);
+}
+
+// A second process holding a diary open, like another running instance.
+class Holder
+{
+public:
+    explicit Holder(const QString& diary, const QString& user = QString())
+    {
+        QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
+        if (!user.isEmpty())
+            env.insert(QStringLiteral("USER"), user);
+        m_process.setProcessEnvironment(env);
+        m_process.start(helperPath("tst_holder"), {diary});
+    }
+    ~Holder()
+    {
+        if (m_process.state() != QProcess::NotRunning) {
+            m_process.kill();
+            m_process.waitForFinished();
+        }
+    }
+    bool waitFor(const QByteArray& word)
+    {
+        while (!m_buffer.contains(word)) {
+            if (!m_process.waitForReadyRead(20000))
+                return false;
+            m_buffer += m_process.readAllStandardOutput();
+        }
+        return true;
+    }
+    void send(const QByteArray& line) { m_process.write(line + '\n'); }
+    void quit()
+    {
+        send("quit");
+        m_process.closeWriteChannel();
+        m_process.waitForFinished();
+    }
+    void crash()
+    {
+        ::kill(static_cast<pid_t>(m_process.processId()), SIGKILL);
+        m_process.waitForFinished();
+    }
+
+private:
+    QProcess m_process;
+    QByteArray m_buffer;
+};
+} // namespace
+
+class TestVDRDocument : public QObject
+{
+    Q_OBJECT
+
+private slots:
+    void initTestCase();
+    void init();
+    void cleanup();
+
+    void createDocument();
+    void openAndCloseLeaveNothingBehind();
+    void refusedFilesStayUntouched_data();
+    void refusedFilesStayUntouched();
+    void damagedFileCanBeOpenedAnyway();
+    void leftoverWorkingCopy_data();
+    void leftoverWorkingCopy();
+    void fileHeldByAnotherProcess_data();
+    void fileHeldByAnotherProcess();
+    void crashedInstanceIsResumedOnlyBySameUser_data();
+    void crashedInstanceIsResumedOnlyBySameUser();
+    void readOnlyDiaryWarns();
+    void demoProjectFromReadOnlyFolder();
+    void temporaryFilesAreRemovedOnClose();
+    void checkDbIntegrity_data();
+    void checkDbIntegrity();
+
+private:
+    QString newDiary(const QString& name);
+
+    QTemporaryDir m_dir;
+    VDRTestPrompt m_prompt;
+};
+
+void TestVDRDocument::initTestCase()
+{
+    QVERIFY(m_dir.isValid());
+    isolateSettings(m_dir.filePath(QStringLiteral("settings")));
+}
+
+void TestVDRDocument::init()
+{
+    m_prompt.reset();
+    VDRFileOps::setFailurePredicate(nullptr);
+}
+
+void TestVDRDocument::cleanup()
+{
+    VDRFileOps::setFailurePredicate(nullptr);
+    VDR_VERIFY_PROMPT(m_prompt);
+}
+
+QString TestVDRDocument::newDiary(const QString& name)
+{
+    const QString path = m_dir.filePath(name);
+    QDir().mkpath(QFileInfo(path).path());
+    QFile::remove(path);
+    return createDiary(path) ? path : QString();
+}
+
+void TestVDRDocument::createDocument()
+{
+    VDRDocument doc;
+    QSignalSpy opened(&doc, &VDRDocument::documentOpened);
+    QSignalSpy closed(&doc, &VDRDocument::documentClosed);
+    VDRDocument::setGlobalModified(true);
+    QVERIFY(doc.createDocument(true));
+    QVERIFY(doc.isStateValid());
+    QVERIFY(doc.isStateNew());
+    QVERIFY(!doc.isStateModified());
+    QVERIFY(doc.getFilepath().isEmpty());
+    QCOMPARE(opened.count(), 1);
+    QVERIFY(!doc.createDocument(true)); // one document at a time
+    const QString workingCopy = doc.getFilepathWorkingCopy();
+    QVERIFY(QFile::exists(workingCopy));
+    QVERIFY(QFileInfo(doc.temporaryFolder()).isDir());
+    QVERIFY(doc.closeDocument());
+    QCOMPARE(closed.count(), 1);
+    QVERIFY(!QFile::exists(workingCopy));
+    QVERIFY(!doc.isStateValid());
+}
+
+void TestVDRDocument::openAndCloseLeaveNothingBehind()
+{
+    // Blanks and umlauts in folder and file name.
+    const QString path = newDiary(QStringLiteral("Bau Ölweg/Tagebuch März 2026.vd2"));
+    QVERIFY(!path.isEmpty());
+    const QByteArray before = fileHash(path);
+
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    QCOMPARE(doc.getFilepathWorkingCopy(), path + QStringLiteral(".workingcopy"));
+    const QString lockInfo = QFileInfo(path).path() + QStringLiteral("/Tagebuch März 2026.udf");
+    const QStringList holder = VDRDocument::readLockInfo(lockInfo);
+    QCOMPARE(holder.size(), 4);
+    QCOMPARE(holder[0], VDRDocument::currentUserName());
+    QCOMPARE(holder[1], VDRDocument::currentComputerName());
+    QCOMPARE(holder[2], QDate::currentDate().toString());
+    QVERIFY(QTime::fromString(holder[3], QStringLiteral("hh:mm")).isValid());
+    QCOMPARE(doc.projectName(), QStringLiteral("Neues Varduna"));
+    QVERIFY(!doc.isStateModified());
+
+    QVERIFY(doc.closeDocument());
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+    QVERIFY(!QFile::exists(lockInfo));
+    QCOMPARE(fileHash(path), before);
+}
+
+void TestVDRDocument::refusedFilesStayUntouched_data()
+{
+    QTest::addColumn<QString>("kind");
+    QTest::addColumn<QString>("title");
+    QTest::addColumn<QString>("text");
+    QTest::addColumn<bool>("showError");
+
+    QTest::newRow("missing") << "missing" << "Dateifehler" << "existiert nicht." << false;
+    QTest::newRow("folder") << "folder" << "Dateifehler" << "ist keine Datei." << false;
+    QTest::newRow("empty file") << "empty" << "Dateifehler" << "ist keine Varduna-Datei." << false;
+    QTest::newRow("text file") << "text" << "Dateifehler" << "ist keine Varduna-Datei." << false;
+    QTest::newRow("version 0.5") << "0.5" << "Datei öffnen" << "mit einer neueren Programmversion erstellt" << false;
+    QTest::newRow("version 0.10") << "0.10" << "Datei öffnen" << "mit einer neueren Programmversion erstellt"
+                                  << false;
+    QTest::newRow("other database") << "foreign" << "Datenbankfehler" << "Tabelle vdr fehlt" << true;
+    QTest::newRow("damaged, cancelled") << "damaged" << "Beschädigte Datenbank-Datei"
+                                        << "Es existieren keine Backup-Dateien." << false;
+}
+
+void TestVDRDocument::refusedFilesStayUntouched()
+{
+    QFETCH(QString, kind);
+    QFETCH(QString, title);
+    QFETCH(QString, text);
+    QFETCH(bool, showError);
+
+    const QString path = m_dir.filePath(QStringLiteral("refused/%1.vd2").arg(kind));
+    QDir().mkpath(m_dir.filePath(QStringLiteral("refused")));
+    if (kind == QLatin1String("folder")) {
+        QDir().mkpath(path);
+    } else if (kind == QLatin1String("empty") || kind == QLatin1String("text")) {
+        QFile f(path);
+        QVERIFY(f.open(QIODevice::WriteOnly));
+        if (kind == QLatin1String("text"))
+            f.write("Dies ist kein Bautagebuch, sondern ein Einkaufszettel.\n");
+    } else if (kind.startsWith(QLatin1String("0."))) {
+        QVERIFY(createDiary(path));
+        QVERIFY(execSql(path, {QStringLiteral("UPDATE meta SET value = '%1' WHERE key = 'fileversion'").arg(kind)}));
+    } else if (kind == QLatin1String("foreign")) {
+        QVERIFY(execSql(path, {"CREATE TABLE meta (key TEXT PRIMARY KEY, value TEXT NOT NULL)",
+                               "CREATE TABLE kunden (id INTEGER, name TEXT)"}));
+    } else if (kind == QLatin1String("damaged")) {
+        QVERIFY(createDiary(path));
+        QVERIFY(damageFile(path));
+    }
+    const QByteArray before = fileHash(path);
+
+    VDRDocument doc;
+    bool reportedShowError = true;
+    m_prompt.expect(title, text, kind == QLatin1String("damaged") ? 0 : -1);
+    QVERIFY(!doc.openDocument(path, reportedShowError));
+    QCOMPARE(reportedShowError, showError);
+    QVERIFY(!doc.isStateValid());
+    QCOMPARE(fileHash(path), before);
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+    QVERIFY(!QFile::exists(VDRDocument::lockInfoPathFor(path)));
+    QCOMPARE(m_prompt.busyDepth(), 0);
+}
+
+void TestVDRDocument::damagedFileCanBeOpenedAnyway()
+{
+    const QString path = newDiary(QStringLiteral("beschaedigt.vd2"));
+    QVERIFY(damageFile(path));
+    VDRDocument doc;
+    bool showError = true;
+    m_prompt.expect(QStringLiteral("Beschädigte Datenbank-Datei"), QStringLiteral("drohen Datenverluste"), 1);
+    // What follows depends on how badly SQLite is hurt; it must end in a message, not a crash.
+    const bool opened = doc.openDocument(path, showError);
+    if (!opened) {
+        QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+        // The refusal after the question is explained by a message of its own.
+        QVERIFY(m_prompt.messages.size() >= 2);
+        QCOMPARE(m_prompt.messages.last().title, QStringLiteral("SQL Error"));
+        QCOMPARE(m_prompt.messages.last().text, QStringLiteral("database disk image is malformed"));
+        m_prompt.reset();
+    } else {
+        QVERIFY(doc.closeDocument());
+    }
+}
+
+void TestVDRDocument::leftoverWorkingCopy_data()
+{
+    QTest::addColumn<QString>("user");
+    QTest::addColumn<QString>("computer");
+    QTest::addColumn<bool>("corrupt");
+    QTest::addColumn<bool>("resumed");
+
+    const QString me = VDRDocument::currentUserName();
+    const QString here = VDRDocument::currentComputerName();
+    QTest::newRow("same user, same computer") << me << here << false << true;
+    QTest::newRow("other user") << "fremd" << here << false << false;
+    QTest::newRow("other computer") << me << "anderer-pc" << false << false;
+    QTest::newRow("no lock information") << QString() << QString() << false << false;
+    QTest::newRow("corrupt copy of same user") << me << here << true << false;
+}
+
+void TestVDRDocument::leftoverWorkingCopy()
+{
+    QFETCH(QString, user);
+    QFETCH(QString, computer);
+    QFETCH(bool, corrupt);
+    QFETCH(bool, resumed);
+
+    const QString path = newDiary(QStringLiteral("rest.vd2"));
+    const QString workingCopy = path + QStringLiteral(".workingcopy");
+    const QString lockInfo = VDRDocument::lockInfoPathFor(path);
+    QFile::remove(workingCopy);
+    QFile::remove(lockInfo);
+    QVERIFY(QFile::copy(path, workingCopy));
+    QVERIFY(execSql(workingCopy, {"UPDATE vdr SET name = 'Ungespeicherter Stand'"}));
+    if (corrupt)
+        QVERIFY(damageFile(workingCopy));
+    if (!user.isEmpty()) {
+        QFile f(lockInfo);
+        QVERIFY(f.open(QIODevice::WriteOnly));
+        f.write(QStringLiteral("%1\n%2\nSo. Dez. 6 2026\n09:15\n").arg(user, computer).toUtf8());
+    }
+
+    VDRDocument doc;
+    bool showError = true;
+    if (resumed)
+        m_prompt.expect(QStringLiteral("Datei öffnen"),
+                        QStringLiteral("Die letzte Bearbeitung der Varduna-Datei wurde nicht ordnungsgemäß "
+                                       "abgeschlossen.\nDer letzte Bearbeitungsstand wird geöffnet."));
+    QVERIFY(doc.openDocument(path, showError));
+    QCOMPARE(doc.projectName(), resumed ? QStringLiteral("Ungespeicherter Stand") : QStringLiteral("Neues Varduna"));
+    QCOMPARE(doc.isStateModified(), resumed);
+    QCOMPARE(VDRDocument::readLockInfo(lockInfo).value(0), VDRDocument::currentUserName());
+    QVERIFY(doc.closeDocument());
+    QVERIFY(!QFile::exists(workingCopy));
+}
+
+void TestVDRDocument::fileHeldByAnotherProcess_data()
+{
+    QTest::addColumn<bool>("withLockInfo");
+    QTest::newRow("with lock information") << true;
+    QTest::newRow("lock information lost") << false;
+}
+
+void TestVDRDocument::fileHeldByAnotherProcess()
+{
+    QFETCH(bool, withLockInfo);
+    const QString path = newDiary(QStringLiteral("gehalten.vd2"));
+    Holder holder(path, QStringLiteral("kollegin"));
+    QVERIFY(holder.waitFor("ready"));
+    if (!withLockInfo)
+        QVERIFY(QFile::remove(VDRDocument::lockInfoPathFor(path)));
+
+    VDRDocument doc;
+    bool showError = true;
+    if (withLockInfo)
+        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
+                        QStringLiteral("da sie in Bearbeitung ist von\nUser: kollegin\nComputer: %1\nseit dem %2 ")
+                            .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString()));
+    else
+        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
+                        QStringLiteral("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist."));
+    QVERIFY(!doc.openDocument(path, showError));
+    QVERIFY(!showError);
+    // The holder keeps its working copy.
+    QVERIFY(QFile::exists(path + QStringLiteral(".workingcopy")));
+    holder.quit();
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+}
+
+void TestVDRDocument::crashedInstanceIsResumedOnlyBySameUser_data()
+{
+    QTest::addColumn<QString>("user");
+    QTest::addColumn<bool>("resumed");
+    QTest::newRow("same user") << QString() << true;
+    QTest::newRow("other user") << "kollege" << false;
+}
+
+void TestVDRDocument::crashedInstanceIsResumedOnlyBySameUser()
+{
+    QFETCH(QString, user);
+    QFETCH(bool, resumed);
+    const QString path = newDiary(QStringLiteral("absturz.vd2"));
+    {
+        Holder holder(path, user);
+        QVERIFY(holder.waitFor("ready"));
+        holder.send("modify");
+        QVERIFY(holder.waitFor("modified"));
+        holder.crash();
+    }
+    QVERIFY(QFile::exists(path + QStringLiteral(".workingcopy")));
+
+    VDRDocument doc;
+    bool showError = true;
+    if (resumed)
+        m_prompt.expect(QStringLiteral("Datei öffnen"), QStringLiteral("nicht ordnungsgemäß abgeschlossen"));
+    QVERIFY(doc.openDocument(path, showError));
+    QCOMPARE(doc.projectName(), resumed ? QStringLiteral("Geändert im Holder") : QStringLiteral("Neues Varduna"));
+    QVERIFY(doc.closeDocument());
+}
+
+void TestVDRDocument::readOnlyDiaryWarns()
+{
+    const QString path = newDiary(QStringLiteral("schreibgeschuetzt.vd2"));
+    const QString absolute = QFileInfo(path).absoluteFilePath();
+    // Root may write anything, so the refusal is simulated where the program asks.
+    VDRFileOps::setFailurePredicate(
+        [absolute](VDRFileOps::Op op, const QString& p) { return op == VDRFileOps::CheckWritable && p == absolute; });
+    VDRDocument doc;
+    bool showError = true;
+    m_prompt.expect(QStringLiteral("Datei-Warnung"),
+                    QStringLiteral("Sie haben keine Schreibrechte für die Datei %1.\n").arg(QDir::toNativeSeparators(absolute)));
+    QVERIFY(doc.openDocument(path, showError));
+    QVERIFY(doc.isStateValid());
+    QVERIFY(doc.closeDocument());
+}
+
+void TestVDRDocument::demoProjectFromReadOnlyFolder()
+{
+    const QString folder = m_dir.filePath(QStringLiteral("Projects"));
+    const QString path = newDiary(QStringLiteral("Projects/Ejemplo.vd2"));
+    QVERIFY(execSql(path, {"INSERT INTO meta (key, value) VALUES ('isdp', '42')"}));
+    const QString absoluteFolder = QFileInfo(folder).absoluteFilePath();
+    VDRFileOps::setFailurePredicate([absoluteFolder](VDRFileOps::Op op, const QString& p) {
+        return p.startsWith(absoluteFolder + QLatin1Char('/')) && op != VDRFileOps::Remove;
+    });
+    QVERIFY(QFile::setPermissions(folder, QFile::ReadOwner | QFile::ExeOwner | QFile::ReadUser | QFile::ExeUser));
+
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    QVERIFY(doc.isDemoProject());
+    const QString workingCopy = doc.getFilepathWorkingCopy();
+    QVERIFY(!workingCopy.startsWith(absoluteFolder));
+    QVERIFY(QFile::exists(workingCopy));
+    QVERIFY(doc.closeDocument());
+    QVERIFY(!QFile::exists(workingCopy));
+    QVERIFY(QDir(folder).entryList(QDir::Files) == QStringList{QStringLiteral("Ejemplo.vd2")});
+    QFile::setPermissions(folder, QFile::ReadOwner | QFile::WriteOwner | QFile::ExeOwner);
+}
+
+void TestVDRDocument::temporaryFilesAreRemovedOnClose()
+{
+    VDRDocument doc;
+    QVERIFY(doc.createDocument(false));
+    const QString a = doc.getFreeTempFile(QStringLiteral("jpg"));
+    const QString b = doc.getFreeTempFile(QString());
+    QVERIFY(a.endsWith(QLatin1String(".jpg")));
+    QVERIFY(a.startsWith(QDir::tempPath() + QStringLiteral("/vdn_temp.")));
+    QVERIFY(a != b);
+    for (const QString& name : {a, b}) {
+        QFile f(name);
+        QVERIFY(f.open(QIODevice::WriteOnly));
+    }
+    const QString folder = doc.temporaryFolder();
+    QFile inFolder(folder + QStringLiteral("/bild.jpg"));
+    QVERIFY(inFolder.open(QIODevice::WriteOnly));
+    inFolder.close();
+    QVERIFY(doc.closeDocument());
+    QVERIFY(!QFile::exists(a));
+    QVERIFY(!QFile::exists(b));
+    QVERIFY(!QFileInfo::exists(folder));
+}
+
+void TestVDRDocument::checkDbIntegrity_data()
+{
+    QTest::addColumn<bool>("damaged");
+    QTest::addColumn<bool>("ok");
+    QTest::newRow("intact") << false << true;
+    QTest::newRow("damaged") << true << false;
+}
+
+void TestVDRDocument::checkDbIntegrity()
+{
+    QFETCH(bool, damaged);
+    QFETCH(bool, ok);
+    const QString path = newDiary(QStringLiteral("integritaet.vd2"));
+    if (damaged)
+        QVERIFY(damageFile(path));
+    QString result;
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("INTEGRITY"));
+        db.setDatabaseName(path);
+        QVERIFY(db.open());
+        result = VDRDocument::checkDbIntegrity(db);
+        db.close();
+    }
+    QSqlDatabase::removeDatabase(QStringLiteral("INTEGRITY"));
+    QCOMPARE(result == QLatin1String("ok"), ok);
+}
+
+QTEST_GUILESS_MAIN(TestVDRDocument)
 #include "tst_vdrdocument.moc"

@@ -90,6 +90,18 @@ QList<QVariantList> queryRows(const QString& path, const QString& sql)
     });
 }
 
+QStringList queryTexts(const QString& path, const QString& sql)
+{
+    QStringList result;
+    for (const QVariantList& row : queryRows(path, sql)) {
+        QStringList values;
+        for (const QVariant& v : row)
+            values << (v.isNull() ? QStringLiteral("NULL") : v.toString());
+        result << values.join(QLatin1Char('|'));
+    }
+    return result;
+}
+
 QStringList tableLayout(const QString& path, const QString& table)
 {
     QStringList result;

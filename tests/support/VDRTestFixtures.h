@@ -22,6 +22,8 @@ bool createOldestLayoutDiary(const QString& path, const QString& fileVersion = Q
 bool execSql(const QString& path, const QStringList& statements);
 QVariant queryValue(const QString& path, const QString& sql);
 QList<QVariantList> queryRows(const QString& path, const QString& sql);
+// One text per row, values joined by "|", NULL shown as "NULL": readable when a comparison fails.
+QStringList queryTexts(const QString& path, const QString& sql);
 
 // "name type notnull default pk" per column, in order, for comparing structures.
 QStringList tableLayout(const QString& path, const QString& table);
