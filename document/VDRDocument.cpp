@@ -282,7 +282,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
     m_workingCopyPath = findFreeTempFile(QString());
     if (!openWorkingCopyConnection(true)) {
         closeConnection();
-        QFile::remove(m_workingCopyPath);
+        VDRFileOps::removeDatabase(m_workingCopyPath);
         clearState();
         return false;
     }
@@ -291,7 +291,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
     if (!VDRDatabaseSchema::createStructure(database())) {
         endTransaction();
         closeConnection();
-        QFile::remove(m_workingCopyPath);
+        VDRFileOps::removeDatabase(m_workingCopyPath);
         clearState();
         return false;
     }
@@ -336,7 +336,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
         VDRPrompt::critical(tr("interner Fehler"), tr("Datenbank-Initialisierung fehlgeschlagen."));
         destroyModels();
         closeConnection();
-        QFile::remove(m_workingCopyPath);
+        VDRFileOps::removeDatabase(m_workingCopyPath);
         clearState();
         return false;
     }
@@ -390,7 +390,7 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
 bool VDRDocument::discardWorkingCopy(const QString& workingCopy, const QString& lockInfo, const QString& diaryPath)
 {
     VDRDocumentsDb::resetChangesOnDocumentsDb(diaryPath);
-    if (!VDRFileOps::remove(workingCopy)) {
+    if (!VDRFileOps::removeDatabase(workingCopy)) {
         VDRPrompt::critical(tr("Dateifehler"), tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
         return false;
     }
@@ -406,7 +406,7 @@ void VDRDocument::abandonOpening(bool removeWorkingCopy)
     // A working copy made by this opening holds nothing of the user's; left behind it would be
     // taken for an unfinished edit next time. A resumed one holds unsaved work and stays.
     if (removeWorkingCopy && !m_workingCopyPath.isEmpty()) {
-        QFile::remove(m_workingCopyPath);
+        VDRFileOps::removeDatabase(m_workingCopyPath);
         if (!m_lockInfoPath.isEmpty())
             QFile::remove(m_lockInfoPath);
     }
@@ -703,18 +703,17 @@ bool VDRDocument::closeDocument()
     const QString workingCopy = m_workingCopyPath;
     const QString lockInfo = m_lockInfoPath;
     const QString diaryPath = m_filePath;
-    const bool temporaryWorkingCopy = m_filesToRemove.contains(workingCopy);
 
-    removeTemporaryFiles();
+    // The connection goes first: a temporary working copy is among the files handed out.
     destroyModels();
     closeConnection();
 
     bool ok = true;
-    if (!workingCopy.isEmpty() && !temporaryWorkingCopy && QFileInfo::exists(workingCopy) &&
-        !VDRFileOps::remove(workingCopy)) {
+    if (!workingCopy.isEmpty() && !VDRFileOps::removeDatabase(workingCopy)) {
         VDRPrompt::critical(tr("Dateifehler"), tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
         ok = false;
     }
+    removeTemporaryFiles();
     if (!lockInfo.isEmpty())
         QFile::remove(lockInfo);
     if (!diaryPath.isEmpty()) {

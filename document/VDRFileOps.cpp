@@ -44,6 +44,15 @@ bool VDRFileOps::remove(const QString& path)
     return QFile::remove(path);
 }
 
+bool VDRFileOps::removeDatabase(const QString& path)
+{
+    if (QFileInfo::exists(path) && !remove(path))
+        return false;
+    for (const char* companion : {"-journal", "-wal", "-shm"})
+        QFile::remove(path + QLatin1String(companion));
+    return true;
+}
+
 bool VDRFileOps::writeFileAtomically(const QString& path, const QByteArray& bytes)
 {
     if (shouldFail(Write, path))

@@ -14,6 +14,9 @@ public:
     static bool copy(const QString& source, const QString& target);
     static bool rename(const QString& source, const QString& target);
     static bool remove(const QString& path);
+    // Removes an SQLite file with its journal: a stale journal beside a new file of the same name
+    // would be taken for that file's own and rolled into it.
+    static bool removeDatabase(const QString& path);
     // Writes the bytes to a temporary file beside 'path', flushes it to disk and renames it into place.
     static bool writeFileAtomically(const QString& path, const QByteArray& bytes);
     static bool isWritable(const QString& path);

@@ -179,8 +179,7 @@ void TestVDRDocument::openAndCloseLeaveNothingBehind()
     QVERIFY(!doc.isStateModified());
 
     QVERIFY(doc.closeDocument());
-    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
-    QVERIFY(!QFile::exists(lockInfo));
+    QCOMPARE(QDir(QFileInfo(path).path()).entryList(QDir::Files), QStringList{QFileInfo(path).fileName()});
     QCOMPARE(fileHash(path), before);
 }
 
@@ -296,6 +295,12 @@ void TestVDRDocument::leftoverWorkingCopy()
     QVERIFY(execSql(workingCopy, {"UPDATE vdr SET name = 'Ungespeicherter Stand'"}));
     if (corrupt)
         QVERIFY(damageFile(workingCopy));
+    if (!resumed) {
+        // A journal left by the crash must go with its working copy.
+        QFile journal(workingCopy + QStringLiteral("-journal"));
+        QVERIFY(journal.open(QIODevice::WriteOnly));
+        journal.write(QByteArray(512, '\0'));
+    }
     if (!user.isEmpty()) {
         QFile f(lockInfo);
         QVERIFY(f.open(QIODevice::WriteOnly));
@@ -314,6 +319,7 @@ void TestVDRDocument::leftoverWorkingCopy()
     QCOMPARE(VDRDocument::readLockInfo(lockInfo).value(0), VDRDocument::currentUserName());
     QVERIFY(doc.closeDocument());
     QVERIFY(!QFile::exists(workingCopy));
+    QVERIFY(!QFile::exists(workingCopy + QStringLiteral("-journal")));
 }
 
 void TestVDRDocument::fileHeldByAnotherProcess_data()
