@@ -6,6 +6,7 @@
 
 #include <QCoreApplication>
 #include <QDate>
+#include <QDir>
 #include <QFileInfo>
 #include <QJsonArray>
 #include <QJsonDocument>
@@ -48,6 +49,13 @@ const char* const kHelp =
     "                      without saving.\n"
     "  check FILE          Read-only: integrity, structure version, working copy and its holder,\n"
     "                      backups. Touches nothing.\n"
+    "  save FILE           Open FILE as the application does (upgrading an older structure after\n"
+    "                      its question) and save it over itself, turning the previous file into\n"
+    "                      the newest backup (one backup generation per run).\n"
+    "  restore FILE        Replace a damaged diary by its newest intact backup; the damaged file\n"
+    "                      is kept under its ERROR name, which is printed.\n"
+    "  compact FILE        Remove unreferenced images, rebuild the database and save; prints the\n"
+    "                      size before and after in bytes.\n"
     "\n"
     "Options:\n"
     "  --yes               Answer questions with their affirmative default (without it every\n"
@@ -57,10 +65,19 @@ const char* const kHelp =
     "\n"
     "Set VARDUNA_DEBUG=1 to see the program's debug log on stderr.\n"
     "\n"
-    "Exit codes of new and info:\n"
+    "Exit codes of new, info, save and compact:\n"
     "  0  done\n"
     "  1  usage error\n"
     "  2  refused or failed (the message on stderr says why)\n"
+    "  3  not saved: a question was answered with its cancelling choice (try --yes),\n"
+    "     or the file cannot be saved (demo project, no write permission)\n"
+    "\n"
+    "Exit codes of restore:\n"
+    "  0  restored\n"
+    "  1  usage error\n"
+    "  2  failed or refused (missing file, held by a running instance)\n"
+    "  3  no intact backup found\n"
+    "  4  nothing to do: the diary is intact\n"
     "\n"
     "Exit codes of check:\n"
     "  0  can be opened\n"
@@ -157,6 +174,82 @@ int cmdInfo(const QString& file, bool json)
     return ExitOk;
 }
 
+bool openForCommand(VDRDocument& doc, const QString& file)
+{
+    bool showError = true;
+    if (doc.openDocument(file, showError))
+        return true;
+    if (showError)
+        VDRPrompt::critical(QObject::tr("Fehler"),
+                            QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+    return false;
+}
+
+int cmdSave(const QString& file)
+{
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    const int result = doc.saveDocument(QString());
+    if (result == 2)
+        VDRPrompt::critical(QObject::tr("Fehler"), QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
+    doc.closeDocument();
+    if (result == 0)
+        out() << QFileInfo(file).absoluteFilePath() << "\n";
+    return result == 0 ? ExitOk : result == 1 ? 3 : ExitRefused;
+}
+
+int cmdCompact(const QString& file)
+{
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    const int result = doc.compactDB(true);
+    if (result == 0)
+        out() << "Vorher: " << doc.lastCompactionSizeBefore() << " Bytes\nNachher: " << doc.lastCompactionSizeAfter()
+              << " Bytes\n";
+    doc.closeDocument();
+    return result == 0 ? ExitOk : result == 1 ? 3 : ExitRefused;
+}
+
+int cmdRestore(const QString& file)
+{
+    const QString title = QObject::tr("Backup wiederherstellen");
+    const QFileInfo fi(file);
+    if (!fi.isFile()) {
+        VDRPrompt::critical(QObject::tr("Dateifehler"),
+                            QObject::tr("Die Datei\n%1\nexistiert nicht.").arg(QDir::toNativeSeparators(file)));
+        return ExitRefused;
+    }
+    const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
+    if (r.status == VDRDiaryCheck::Held) {
+        VDRPrompt::warning(QObject::tr("Datenbank in Bearbeitung"),
+                           QObject::tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist."));
+        return ExitRefused;
+    }
+    if (r.status != VDRDiaryCheck::Damaged) {
+        VDRPrompt::information(title, QObject::tr("Die Datei %1 ist nicht beschädigt.").arg(QDir::toNativeSeparators(file)));
+        return 4;
+    }
+    int count = 0;
+    const QString backup = VDRDocument::getBackupFile4Restore(fi.absoluteFilePath(), count);
+    if (backup.isEmpty()) {
+        VDRPrompt::critical(title, QObject::tr("Die Datei konnte nicht wiederhegestellt werden.\n") +
+                                       (count > 0 ? QObject::tr("Die Backup-Dateien sind ebenfalls beschädigt.")
+                                                  : QObject::tr("Es existieren keine Backup-Dateien.")));
+        return 3;
+    }
+    QString newName;
+    QString error;
+    if (!VDRDocument::restoreBackupFile(fi.absoluteFilePath(), backup, newName, error)) {
+        VDRPrompt::critical(title, QObject::tr("Die Datei konnte nicht wiederhegestellt werden.\n") + error);
+        return ExitRefused;
+    }
+    out() << newName << "\n";
+    out().flush();
+    return ExitOk;
+}
+
 int cmdCheck(const QString& file, bool json)
 {
     const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
@@ -247,6 +340,12 @@ int main(int argc, char* argv[])
         result = cmdInfo(file, json);
     else if (command == QLatin1String("check"))
         result = cmdCheck(file, json);
+    else if (command == QLatin1String("save"))
+        result = cmdSave(file);
+    else if (command == QLatin1String("restore"))
+        result = cmdRestore(file);
+    else if (command == QLatin1String("compact"))
+        result = cmdCompact(file);
     else {
         err(QStringLiteral("varduna-cli: unknown command '%1'; see varduna-cli --help").arg(command));
         result = ExitUsage;

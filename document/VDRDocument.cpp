@@ -476,6 +476,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         }
         }
     }
+    // Nobody holds the diary: what an interrupted save left beside it can go.
+    cleanUpInterruptedSave(diaryPath);
     if (resume)
         VDRPrompt::information(tr("Datei öffnen"),
                                tr("Die letzte Bearbeitung der Varduna-Datei wurde nicht ordnungsgemäß abgeschlossen.\n"
@@ -774,7 +776,6 @@ void VDRDocument::renumberPositions()
     m_modelEntryAll->fetch_all();
     for (int row = 0; row < m_modelEntryAll->rowCount(); ++row) {
         const int entryId = m_modelEntryAll->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
-        const bool hadModels = hasEntryModels(entryId);
         for (VDRSqlTableModel* model : entryModels(entryId)) {
             model->fetch_all();
             bool changed = false;
@@ -787,23 +788,6 @@ void VDRDocument::renumberPositions()
             if (changed)
                 model->submitAll();
         }
-        Q_UNUSED(hadModels)
     }
 }
 
-QString VDRDocument::getBackupFile4Restore(const QString& path, int& count)
-{
-    // The backup search arrives with saving; until then a damaged diary has nothing to restore from.
-    Q_UNUSED(path)
-    count = 0;
-    return QString();
-}
-
-bool VDRDocument::restoreBackupFile(const QString& path, const QString& backup, QString& newName, QString& error)
-{
-    Q_UNUSED(path)
-    Q_UNUSED(backup)
-    newName.clear();
-    error = tr("Keine Backup-Datei vorhanden.");
-    return false;
-}

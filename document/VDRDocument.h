@@ -187,9 +187,30 @@ public:
     bool appendCompany1(const QString& type);
     bool appendCompany2();
 
+    // Saving: 0 saved, 1 refused or cancelled before anything was touched, 2 failed. An empty path
+    // saves over the current file.
+    int saveDocument(const QString& path = QString());
+    // Backup generation 1 is X.vd2.bak, 2 to 10 are X.vd2.01.bak to X.vd2.09.bak, then X.vd2.10.bak ...
+    static QString backupName(const QString& path, int generation);
+    static int numberOfBackups();
+    static QString numberOfBackupsSettingsKey() { return QStringLiteral("file/NumberOfBackups"); }
+    static QString dontShowCompactDbMsgSettingsKey() { return QStringLiteral("Messages/dontShowCompactDbMsg"); }
+
     // Restoring a damaged diary from its backups.
     static QString getBackupFile4Restore(const QString& path, int& count);
     static bool restoreBackupFile(const QString& path, const QString& backup, QString& newName, QString& error);
+
+    // Compaction: removes unreferenced images, VACUUMs and saves. 0 done, 1 refused, 2 failed.
+    int compactDB(bool showReport);
+    bool removeObsoleteImages();
+    static QString formatFileSize(qint64 bytes);
+    qint64 lastCompactionSizeBefore() const { return m_compactSizeBefore; }
+    qint64 lastCompactionSizeAfter() const { return m_compactSizeAfter; }
+    // Deleted images and dictations since the last compaction; many of them make saving offer one.
+    void decrementCompactDbImageCnt() { ++m_deletedImages; }
+    void decrementCompactDbAudioCnt() { ++m_deletedAudio; }
+    void resetCompactDbAudioCnt() { m_deletedAudio = 0; }
+    void resetCompactDbImageCnt() { m_deletedImages = 0; }
 
     // Asked whether a diary is on the cloud synchronisation list; installed by the synchronisation.
     static void setSyncListQuery(std::function<bool(const QString&)> query);
@@ -220,6 +241,11 @@ private:
     void renumberPositions();
     void clearState();
     void removeTemporaryFiles();
+    void cleanUpInterruptedSave(const QString& diaryPath);
+    bool compactWorkingCopy();
+    int reopenAfterSave(int result);
+    bool replaceDiaryKeepingBackups(const QString& temporary);
+    bool saveAs(const QString& target);
 
     bool m_valid = false;
     bool m_new = false;
@@ -234,6 +260,10 @@ private:
     QStringList m_filesToRemove;
     QString m_fileVersion;
     int m_transactionDepth = 0;
+    int m_deletedImages = 0;
+    int m_deletedAudio = 0;
+    qint64 m_compactSizeBefore = 0;
+    qint64 m_compactSizeAfter = 0;
 
     VDRSqlTableModel* m_modelMeta = nullptr;
     VDRSqlTableModel* m_modelVdr = nullptr;

@@ -49,6 +49,46 @@ bool VDRDocumentsDb::resetChangesOnDocumentsDb(const QString& diaryPath)
     return ok;
 }
 
+bool VDRDocumentsDb::storeChangesOnDocumentsDb(const QString& diaryPath)
+{
+    const QString path = VDRDocument::documentsDbPathFor(diaryPath);
+    if (diaryPath.isEmpty() || !QFileInfo::exists(path))
+        return true;
+    bool ok = true;
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), connectionName());
+        db.setDatabaseName(path);
+        if (!db.open()) {
+            VDRPrompt::critical(QCoreApplication::translate("VDRDocumentsDb", "Datenbankfehler Dokumente-Datenbank"),
+                                CVdShared::sqlErrorText(db.lastError()));
+            ok = false;
+        } else {
+            QSqlQuery q(db);
+            q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
+            q.exec(QStringLiteral("BEGIN EXCLUSIVE TRANSACTION"));
+            for (const char* sql : {"UPDATE documents SET status = 0 WHERE status = 1",
+                                    "DELETE FROM documents WHERE status = 2 OR status = 3",
+                                    "UPDATE documents SET orig_record_id = -1, orig_entry_id = -1 WHERE orig_record_id > -1"}) {
+                if (!q.exec(QLatin1String(sql))) {
+                    qDebug().noquote() << "SQL Error: " << q.lastError().text();
+                    ok = false;
+                }
+            }
+            q.exec(QStringLiteral("COMMIT TRANSACTION"));
+        }
+        db.close();
+    }
+    QSqlDatabase::removeDatabase(connectionName());
+    return ok;
+}
+
+bool VDRDocumentsDb::compactDocumentDB(const QString& diaryPath)
+{
+    // Filled in with the documents database itself; a diary without one has nothing to compact.
+    Q_UNUSED(diaryPath)
+    return true;
+}
+
 void VDRDocumentsDb::checkDocumentDBsFreeSpace(const QString& diaryPath)
 {
     Q_UNUSED(diaryPath)

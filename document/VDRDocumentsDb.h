@@ -13,6 +13,10 @@ public:
 
     // Rolls back the pending changes of the diary's documents database, if it has one.
     static bool resetChangesOnDocumentsDb(const QString& diaryPath);
+    // On save: pending changes become the saved state.
+    static bool storeChangesOnDocumentsDb(const QString& diaryPath);
+    // Removes records whose rows are gone and VACUUMs; part of the diary's compaction.
+    static bool compactDocumentDB(const QString& diaryPath);
     // After closing: offers compaction when much space could be freed.
     static void checkDocumentDBsFreeSpace(const QString& diaryPath);
     // One-time move of external document files into the database; leaves "documentImport" alone

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QString>
+#include <QStringList>
 
 #include <functional>
 
@@ -9,7 +10,7 @@
 class VDRFileOps
 {
 public:
-    enum Op { Copy, Rename, Remove, Write, CheckWritable };
+    enum Op { Copy, Rename, Remove, Write, CheckWritable, Link };
 
     static bool copy(const QString& source, const QString& target);
     static bool rename(const QString& source, const QString& target);
@@ -17,12 +18,23 @@ public:
     // Removes an SQLite file with its journal: a stale journal beside a new file of the same name
     // would be taken for that file's own and rolled into it.
     static bool removeDatabase(const QString& path);
+    // A second name for an existing file (a hard link); fails where the file system has none.
+    static bool link(const QString& existing, const QString& newName);
+    // Rename, or copy and remove where a rename cannot cross file systems.
+    static bool move(const QString& source, const QString& target);
     // Writes the bytes to a temporary file beside 'path', flushes it to disk and renames it into place.
     static bool writeFileAtomically(const QString& path, const QByteArray& bytes);
     static bool isWritable(const QString& path);
-    // Copies to a temporary name beside 'target', flushes it to disk, then renames it over 'target',
-    // so that 'target' is at every instant either absent/old or the complete copy.
+
+    // Copies 'source' to a new temporary file beside 'target' and flushes it to disk. Returns the
+    // temporary file's name, empty on failure (nothing is left behind then).
+    static QString writeDurableCopy(const QString& source, const QString& target);
+    // Renames 'temporary' over 'target' in one step and makes the rename itself durable.
+    static bool replaceFile(const QString& temporary, const QString& target);
+    // writeDurableCopy and replaceFile: 'target' is at every instant absent/old or the complete copy.
     static bool copyDurably(const QString& source, const QString& target);
+    // Temporary files a durable copy to 'target' left behind when it was interrupted.
+    static QStringList leftoverTemporaries(const QString& target);
 
     // Test hook: return true to make the operation on 'path' fail. Null restores normal behaviour.
     using FailurePredicate = std::function<bool(Op op, const QString& path)>;
