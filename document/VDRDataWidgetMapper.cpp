@@ -52,6 +52,8 @@ void VDRDataWidgetMapper::addMapping(QObject* widget, const QString& field, cons
 void VDRDataWidgetMapper::clearMapping()
 {
     for (const Mapping& m : qAsConst(m_mappings)) {
+        if (QObject* t = target(m))
+            t->removeEventFilter(this);
         if (m.widget)
             m.widget->removeEventFilter(this);
     }
@@ -126,8 +128,11 @@ void VDRDataWidgetMapper::populate(const Mapping& m)
         return;
     const QVariant value = m_model->data(m_model->index(m_row, m.column), Qt::EditRole);
     const QByteArray prop = targetProperty(m);
-    if (t->property(prop.constData()) != value)
-        t->setProperty(prop.constData(), value);
+    if (t->property(prop.constData()) == value)
+        return;
+    // A NULL (or a text a number field cannot take) must not leave the previous row's value behind.
+    if (!t->setProperty(prop.constData(), value))
+        t->setProperty(prop.constData(), QVariant(t->property(prop.constData()).userType(), nullptr));
 }
 
 void VDRDataWidgetMapper::populate()
@@ -165,6 +170,9 @@ bool VDRDataWidgetMapper::commit(int column)
         bool differs;
         if (m.property == kRichText)
             differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString());
+        else if (modelValue.isNull())
+            // An untouched field showing the empty value of its type leaves a NULL alone.
+            differs = widgetValue != QVariant(widgetValue.userType(), nullptr);
         else
             differs = widgetValue != modelValue;
         if (!differs)

@@ -14,6 +14,7 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QHostInfo>
+#include <QLocale>
 #include <QSettings>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -531,7 +532,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
             const QString text =
                 head + tr("Das neueste unbeschädigte Backup stammt vom %1.\nSoll dieses Backup wiederhergestellt "
                           "werden (empfohlen)?")
-                           .arg(QFileInfo(backup).lastModified().toString());
+                           .arg(QLocale().toString(QFileInfo(backup).lastModified(), QLocale::ShortFormat));
             const int choice = VDRPrompt::instance()->choose(
                 VDRPrompt::Warning, tr("Beschädigte Datenbank-Datei"), text,
                 {tr("Backup wiederherstellen"), tr("Beschädigte Datei öffnen")}, 0, 1);
