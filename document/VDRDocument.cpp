@@ -690,6 +690,9 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
 
 void VDRDocument::removeTemporaryFiles()
 {
+    m_imageTempPaths.clear();
+    m_thumbnailTempPaths.clear();
+    m_uploadImages.clear();
     for (const QString& file : qAsConst(m_filesToRemove))
         QFile::remove(file);
     m_filesToRemove.clear();

@@ -3,6 +3,8 @@
 #include "document/VDRSqlTableModel.h"
 
 #include <QDateTime>
+#include <QImage>
+#include <QPixmap>
 #include <QMap>
 #include <QObject>
 #include <QSqlDatabase>
@@ -187,6 +189,67 @@ public:
     bool appendCompany1(const QString& type);
     bool appendCompany2();
 
+    // ---- Report operations (VDRDocumentEntry.cpp) ----
+    // New sub-table rows with the default values of their table; the report's models are built
+    // when needed. Nothing is submitted.
+    bool appendEntryAttendee(int entryId);
+    bool appendEntryWorkforce(int entryId);
+    bool appendEntryTimeRecording(int entryId, int workforceId);
+    bool appendEntryDelay(int entryId);
+    bool appendEntryObstruction(int entryId);
+    bool appendEntryDfcy(int entryId);
+    bool appendEntryAcceptance(int entryId);
+    bool appendEntryPhoto1(int entryId, const QDate& date, const QString& caption, int imageId);
+    bool appendEntryPhoto2(int entryId, const QDate& date, const QString& caption, int imageId);
+    bool appendEntryPhoto3(int entryId, const QDate& date, const QString& caption, int imageId);
+    bool appendEntryPhoto4(int entryId, const QDate& date, const QString& caption, int imageId);
+    bool appendEntryPhoto5(int entryId, const QDate& date, const QString& caption, int imageId);
+    bool appendEntryDirective(int entryId);
+    bool appendEntryAuxiliaryservice(int entryId);
+    bool appendEntryConstructionmeasure(int entryId);
+    bool appendEntryConstructionmaterial(int entryId);
+    bool appendEntryScheduleddelivery(int entryId);
+    bool appendEntryTelephoneNotice(int entryId);
+    bool appendEntryConcern(int entryId);
+    bool appendEntryEquipment(int entryId);
+    // Whole reports, addressed by their row in modelEntryAll().
+    bool copyEntryAll(int row);
+    bool removeEntryAll(int row);
+    bool lockEntry(int row, bool locked);
+    bool deleteAudioRecord(int audioId);
+    // Locking a report freezes copies of the companies it names (negative categories).
+    void lockCompanyRecords4lockedEntry(int row);
+    // Set when frozen company copies were added; the master-data windows clear it.
+    bool isMasterDataModified() const { return m_masterDataModified; }
+    void setMasterDataModified(bool modified) { m_masterDataModified = modified; }
+
+    // ---- Image store (VDRDocumentImage.cpp) ----
+    static QString imageSizeSettingsKey() { return QStringLiteral("foto/imagesize"); }
+    // New image rows: from a file (turned upright by its EXIF orientation and fitted to the
+    // configured size) or from a picture (kept at its size). -1 when nothing could be stored.
+    int createImage(const QString& path);
+    int createImage(const QImage& image);
+    int createImage(const QPixmap& pixmap);
+    bool exchangeImage(int id, const QImage& image, bool fit);
+    bool exchangeImage(int id, const QPixmap& pixmap, bool fit);
+    QByteArray getImageData(int id);
+    QByteArray getImageThumbnailData(int id);
+    QImage getImage(int id);
+    QImage getImageThumbnail(int id);
+    QPixmap getImagePixmap(int id);
+    QPixmap getImageThumbnailPixmap(int id);
+    bool getImageMetadata(int id, QMap<QString, QVariant>& metadata);
+    bool exportImage(int id, const QString& path);
+    QString getImageTempPath(int id);
+    QString getImageThumbnailTempPath(int id);
+    QString getImageTempPath4Upload(int id);
+    QString getImageThumbnailTempPath4Upload(int id);
+    QStringList getListOfUploadImages() const { return m_uploadImages; }
+    void clearListOfUploadImages() { m_uploadImages.clear(); }
+    QList<int> getImageIds();
+    int countImageAccess(int id);
+    bool deleteImage(int id);
+
     // Saving: 0 saved, 1 refused or cancelled before anything was touched, 2 failed. An empty path
     // saves over the current file.
     int saveDocument(const QString& path = QString());
@@ -274,6 +337,11 @@ private:
     VDRSqlTableModel* m_modelExternalEntryNumber = nullptr;
     QMap<int, QMap<int, VDRSqlTableModel*>> m_entryModels;
     QMap<int, VDRSqlTableModel*> m_addresslistModels;
+    bool m_masterDataModified = false;
+    // Temporary files of images, written once per opening.
+    QMap<int, QString> m_imageTempPaths;
+    QMap<int, QString> m_thumbnailTempPaths;
+    QStringList m_uploadImages;
     // Declared column types per table, read once per opening for the models' value types.
     QHash<QString, QHash<QString, QString>> m_declaredTypes;
 };

@@ -266,3 +266,30 @@ bool VDRDocument::appendCompany2()
                                        {"email", empty},
                                        {"pos", m_modelCompany2->maxPos() + 1}});
 }
+
+// Placeholders until the report operations land.
+bool VDRDocument::appendEntryAttendee(int) { return false; }
+bool VDRDocument::appendEntryWorkforce(int) { return false; }
+bool VDRDocument::appendEntryTimeRecording(int, int) { return false; }
+bool VDRDocument::appendEntryDelay(int) { return false; }
+bool VDRDocument::appendEntryObstruction(int) { return false; }
+bool VDRDocument::appendEntryDfcy(int) { return false; }
+bool VDRDocument::appendEntryAcceptance(int) { return false; }
+bool VDRDocument::appendEntryPhoto1(int, const QDate&, const QString&, int) { return false; }
+bool VDRDocument::appendEntryPhoto2(int, const QDate&, const QString&, int) { return false; }
+bool VDRDocument::appendEntryPhoto3(int, const QDate&, const QString&, int) { return false; }
+bool VDRDocument::appendEntryPhoto4(int, const QDate&, const QString&, int) { return false; }
+bool VDRDocument::appendEntryPhoto5(int, const QDate&, const QString&, int) { return false; }
+bool VDRDocument::appendEntryDirective(int) { return false; }
+bool VDRDocument::appendEntryAuxiliaryservice(int) { return false; }
+bool VDRDocument::appendEntryConstructionmeasure(int) { return false; }
+bool VDRDocument::appendEntryConstructionmaterial(int) { return false; }
+bool VDRDocument::appendEntryScheduleddelivery(int) { return false; }
+bool VDRDocument::appendEntryTelephoneNotice(int) { return false; }
+bool VDRDocument::appendEntryConcern(int) { return false; }
+bool VDRDocument::appendEntryEquipment(int) { return false; }
+bool VDRDocument::copyEntryAll(int) { return false; }
+bool VDRDocument::removeEntryAll(int) { return false; }
+bool VDRDocument::lockEntry(int, bool) { return false; }
+bool VDRDocument::deleteAudioRecord(int) { return false; }
+void VDRDocument::lockCompanyRecords4lockedEntry(int) {}

@@ -94,6 +94,13 @@ void VDRDocumentsDb::checkDocumentDBsFreeSpace(const QString& diaryPath)
     Q_UNUSED(diaryPath)
 }
 
+bool VDRDocumentsDb::removeRecordsOnDocumentsDb4Entry(VDRDocument* document, int entryId)
+{
+    Q_UNUSED(document)
+    Q_UNUSED(entryId)
+    return true;
+}
+
 bool VDRDocumentsDb::importExternalDocuments(VDRDocument* document)
 {
     Q_UNUSED(document)

@@ -19,6 +19,8 @@ public:
     static bool compactDocumentDB(const QString& diaryPath);
     // After closing: offers compaction when much space could be freed.
     static void checkDocumentDBsFreeSpace(const QString& diaryPath);
+    // Reports removed in the diary: their documents become pending removals (status 1 -> 3, 0 -> 2).
+    static bool removeRecordsOnDocumentsDb4Entry(VDRDocument* document, int entryId);
     // One-time move of external document files into the database; leaves "documentImport" alone
     // while nothing was moved.
     static bool importExternalDocuments(VDRDocument* document);
