@@ -7,6 +7,7 @@
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QProcess>
+#include <QSettings>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -50,6 +51,12 @@ private slots:
     void checkExitCodes_data();
     void checkExitCodes();
     void heldDiaryIsReportedByInfoAndCheck();
+    void saveRunRepeatedlyRotatesBackups_data();
+    void saveRunRepeatedlyRotatesBackups();
+    void saveOfOlderStructureNeedsYes();
+    void restore_data();
+    void restore();
+    void compactReportsSizes();
 
 private:
     Run cli(const QStringList& args);
@@ -284,6 +291,114 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
     QVERIFY(doc.modelVdr()->submitAll());
     QVERIFY(doc.closeDocument());
     QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
+}
+
+void TestCli::saveRunRepeatedlyRotatesBackups_data()
+{
+    QTest::addColumn<int>("backups");
+    QTest::addColumn<QStringList>("expected");
+    QTest::newRow("four") << 4
+                          << QStringList{"d.vd2: Stand 5", "d.vd2.01.bak: Stand 4", "d.vd2.02.bak: Stand 3",
+                                         "d.vd2.03.bak: Stand 2", "d.vd2.bak: Stand 5"};
+    QTest::newRow("none") << 0 << QStringList{"d.vd2: Stand 5"};
+}
+
+void TestCli::saveRunRepeatedlyRotatesBackups()
+{
+    QFETCH(int, backups);
+    QFETCH(QStringList, expected);
+    QSettings().setValue(QStringLiteral("file/NumberOfBackups"), backups);
+    QSettings().sync();
+    const QString folder = m_dir.filePath(QStringLiteral("rotation-%1").arg(backups));
+    QDir().mkpath(folder);
+    const QString path = folder + QStringLiteral("/d.vd2");
+    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
+    // Each run is one opening with one save; the diary is changed in between as by another session.
+    for (int i = 1; i <= 5; ++i) {
+        QVERIFY(execSql(path, {QStringLiteral("UPDATE vdr SET name = 'Stand %1'").arg(i)}));
+        const Run r = cli({QStringLiteral("save"), path});
+        QCOMPARE(r.exitCode, 0);
+        QVERIFY2(r.err.isEmpty(), qPrintable(r.err));
+    }
+    QStringList found;
+    for (const QString& name : QDir(folder).entryList(QDir::Files, QDir::Name))
+        found << name + QStringLiteral(": ") +
+                     queryValue(folder + QLatin1Char('/') + name, QStringLiteral("SELECT name FROM vdr")).toString();
+    QCOMPARE(found, expected);
+    QSettings().remove(QStringLiteral("file/NumberOfBackups"));
+}
+
+void TestCli::saveOfOlderStructureNeedsYes()
+{
+    const QString path = m_dir.filePath(QStringLiteral("alt-speichern.vd2"));
+    QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
+    const QByteArray before = fileHash(path);
+    const Run cancelled = cli({QStringLiteral("save"), path});
+    QCOMPARE(cancelled.exitCode, 3);
+    QVERIFY(cancelled.err.contains(QStringLiteral("Datei-Warnung: Das Dokument wurde mit einer früheren Programmversion "
+                                                  "erstellt.")));
+    QCOMPARE(fileHash(path), before);
+
+    const Run saved = cli({QStringLiteral("save"), path, QStringLiteral("--yes")});
+    QCOMPARE(saved.exitCode, 0);
+    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'fileversion'").toString(), QStringLiteral("0.4"));
+    QCOMPARE(queryValue(path + QStringLiteral(".bak"), "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
+             QStringLiteral("0.3"));
+    QCOMPARE(cli({QStringLiteral("info"), path}).err, QString()); // nothing left to upgrade
+}
+
+void TestCli::restore_data()
+{
+    QTest::addColumn<QStringList>("damaged");
+    QTest::addColumn<int>("exitCode");
+    QTest::newRow("from the newest intact backup") << QStringList{"r.vd2", "r.vd2.bak"} << 0;
+    QTest::newRow("intact diary") << QStringList() << 4;
+    QTest::newRow("no intact backup") << QStringList{"r.vd2", "r.vd2.bak", "r.vd2.01.bak"} << 3;
+}
+
+void TestCli::restore()
+{
+    QFETCH(QStringList, damaged);
+    QFETCH(int, exitCode);
+    const QString folder = m_dir.filePath(QStringLiteral("restore-%1").arg(exitCode));
+    QDir().mkpath(folder);
+    const QString path = folder + QStringLiteral("/r.vd2");
+    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
+    for (int i = 1; i <= 2; ++i) {
+        QVERIFY(execSql(path, {QStringLiteral("UPDATE vdr SET name = 'Stand %1'").arg(i)}));
+        QCOMPARE(cli({QStringLiteral("save"), path}).exitCode, 0);
+    }
+    // r.vd2 and r.vd2.bak: Stand 2, r.vd2.01.bak: Stand 1.
+    for (const QString& name : damaged)
+        QVERIFY(damageFile(folder + QLatin1Char('/') + name));
+    const Run r = cli({QStringLiteral("restore"), path});
+    QCOMPARE(r.exitCode, exitCode);
+    if (exitCode == 0) {
+        QCOMPARE(r.out, folder + QStringLiteral("/rERROR.01.vd2\n"));
+        QCOMPARE(queryValue(path, "SELECT name FROM vdr").toString(), QStringLiteral("Stand 1"));
+        QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
+    } else if (exitCode == 3) {
+        QVERIFY(r.err.contains(QStringLiteral("Die Backup-Dateien sind ebenfalls beschädigt.")));
+    }
+}
+
+void TestCli::compactReportsSizes()
+{
+    const QString path = m_dir.filePath(QStringLiteral("kompakt.vd2"));
+    QVERIFY(createDiary(path));
+    QVERIFY(execSql(path, {"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
+                           "thumbnail_width, thumbnail_height) VALUES (zeroblob(2000000), 'image/jpeg', 1, 1, "
+                           "zeroblob(10), 'image/jpeg', 1, 1)"}));
+    const Run r = cli({QStringLiteral("compact"), path});
+    QCOMPARE(r.exitCode, 0);
+    const QStringList lines = r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+    QCOMPARE(lines.size(), 2);
+    const qint64 before = lines[0].section(QLatin1Char(' '), 1, 1).toLongLong();
+    const qint64 after = lines[1].section(QLatin1Char(' '), 1, 1).toLongLong();
+    QVERIFY(before > 2000000);
+    QVERIFY(after < before - 1900000);
+    QCOMPARE(after, QFileInfo(path).size());
+    QVERIFY(r.err.contains(QStringLiteral("Die Dateigröße wurde von")));
 }
 
 QTEST_GUILESS_MAIN(TestCli)

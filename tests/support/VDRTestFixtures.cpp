@@ -2,6 +2,7 @@
 
 #include "document/VDRDocument.h"
 
+#include <QCoreApplication>
 #include <QDebug>
 #include <QDir>
 #include <QSqlRecord>
@@ -33,6 +34,9 @@ template <typename F> auto withDb(const QString& path, F work)
 
 void isolateSettings(const QString& folder)
 {
+    // The program's own names, so that settings written here are the ones a child process reads.
+    QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
+    QCoreApplication::setApplicationName(QStringLiteral("Varduna"));
     QStandardPaths::setTestModeEnabled(true);
     QSettings::setPath(QSettings::NativeFormat, QSettings::UserScope, folder);
     QSettings::setPath(QSettings::IniFormat, QSettings::UserScope, folder);
