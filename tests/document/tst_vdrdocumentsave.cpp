@@ -2,6 +2,7 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
+#include "document/VDRFileSizeDialog.h"
 
 #include <QDir>
 #include <QSettings>
@@ -54,6 +55,8 @@ private slots:
     void damagedDiaryIsRestoredFromNewestIntactBackup();
     void compactionRemovesUnreferencedImages();
     void manyDeletedImagesOfferCompaction();
+    void fileSizeCheckAfterOpening_data();
+    void fileSizeCheckAfterOpening();
 
 private:
     QString diary(const QString& name);
@@ -474,6 +477,54 @@ void TestVDRDocumentSave::manyDeletedImagesOfferCompaction()
     QCOMPARE(doc.saveDocument(), 0);
     QCOMPARE(doc.saveDocument(), 0); // compacted: counted anew
     QVERIFY(doc.closeDocument());
+}
+
+void TestVDRDocumentSave::fileSizeCheckAfterOpening_data()
+{
+    QTest::addColumn<int>("limit");
+    QTest::addColumn<QString>("meta");
+    QTest::addColumn<int>("answer");
+    QTest::addColumn<bool>("notAgain");
+    QTest::addColumn<int>("result");
+    QTest::newRow("below the limit") << 2 << QString() << -1 << false << int(VDRFileSizeDialog::NotDue);
+    QTest::newRow("over the limit, export") << 0 << QString() << 0 << false << int(VDRFileSizeDialog::ExportRequested);
+    QTest::newRow("over the limit, cancel") << 0 << QString() << 1 << false << int(VDRFileSizeDialog::Dismissed);
+    QTest::newRow("not again for this file") << 0 << QString() << 1 << true << int(VDRFileSizeDialog::Dismissed);
+    QTest::newRow("warning switched off") << 0 << "NoFileSizeWarning" << -1 << false << int(VDRFileSizeDialog::NotDue);
+    QTest::newRow("master data exported") << 0 << "exportedTo" << -1 << false << int(VDRFileSizeDialog::NotDue);
+}
+
+void TestVDRDocumentSave::fileSizeCheckAfterOpening()
+{
+    QFETCH(int, limit);
+    QFETCH(QString, meta);
+    QFETCH(int, answer);
+    QFETCH(bool, notAgain);
+    QFETCH(int, result);
+    const QString path = diary(QStringLiteral("gross.vd2"));
+    // A little over one MB (bytes / 1,024,000).
+    QStringList statements{"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
+                           "thumbnail_width, thumbnail_height) VALUES (zeroblob(1100000), 'image/jpeg', 1, 1, "
+                           "zeroblob(10), 'image/jpeg', 1, 1)"};
+    if (!meta.isEmpty())
+        statements << QStringLiteral("INSERT INTO meta (key, value) VALUES ('%1', '1')").arg(meta);
+    QVERIFY(execSql(path, statements));
+    QSettings().setValue(VDRFileSizeDialog::fileSizeSettingsKey(), limit);
+
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    if (notAgain)
+        m_prompt.expectTicked(QStringLiteral("Datei-Information"), QStringLiteral("Größe von 1 MB"), answer);
+    else if (answer >= 0)
+        m_prompt.expect(QStringLiteral("Datei-Information"), QStringLiteral("Diese Datei hat eine Größe von 1 MB.\n"),
+                        answer);
+    VDRFileSizeDialog dialog(&doc);
+    QCOMPARE(int(dialog.exec()), result);
+    QVERIFY(doc.closeDocument());
+    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'NoFileSizeWarning'").toString(),
+             notAgain || meta == QLatin1String("NoFileSizeWarning") ? QStringLiteral("1") : QString());
+    QSettings().remove(VDRFileSizeDialog::fileSizeSettingsKey());
 }
 
 QTEST_GUILESS_MAIN(TestVDRDocumentSave)

@@ -12,16 +12,23 @@ VDRTestPrompt::~VDRTestPrompt()
 
 void VDRTestPrompt::expect(const QString& title, const QString& textPart, int answer)
 {
-    m_expected.append({title, textPart, answer});
+    m_expected.append({title, textPart, answer, false});
 }
 
-bool VDRTestPrompt::take(const Message& m, int* answer)
+void VDRTestPrompt::expectTicked(const QString& title, const QString& textPart, int answer)
+{
+    m_expected.append({title, textPart, answer, true});
+}
+
+bool VDRTestPrompt::take(const Message& m, int* answer, bool* tick)
 {
     messages << m;
     if (!m_expected.isEmpty()) {
         const Expectation& e = m_expected.first();
         if (e.title == m.title && m.text.contains(e.textPart)) {
             *answer = e.answer;
+            if (tick)
+                *tick = e.tick;
             m_expected.removeFirst();
             return true;
         }
@@ -64,10 +71,14 @@ VDRPrompt::StandardButton VDRTestPrompt::question(Kind kind, const QString& titl
 }
 
 int VDRTestPrompt::choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons, int,
-                          int escapeIndex, const QString&, bool*)
+                          int escapeIndex, const QString& checkBoxText, bool* checked)
 {
     int answer = -1;
-    if (!take({kind, title, text, buttons}, &answer) || answer < 0)
+    bool tick = false;
+    const bool expected = take({kind, title, text, buttons}, &answer, &tick);
+    if (tick && checked && !checkBoxText.isEmpty())
+        *checked = true;
+    if (!expected || answer < 0)
         return escapeIndex;
     return answer;
 }

@@ -24,6 +24,8 @@ public:
     // Expects a message titled 'title' whose text contains 'textPart'. 'answer' is the button index
     // for named buttons or a StandardButton for standard ones; -1 takes the cancelling choice.
     void expect(const QString& title, const QString& textPart = QString(), int answer = -1);
+    // The same, and the question's check box is ticked.
+    void expectTicked(const QString& title, const QString& textPart, int answer);
     void expectFileName(const QString& path) { m_fileAnswers << path; }
 
     // True when every expectation was met and nothing unexpected came; 'report' says what went wrong.
@@ -51,9 +53,10 @@ private:
         QString title;
         QString textPart;
         int answer;
+        bool tick;
     };
     // Returns the answer of the matching expectation, or records an unexpected message.
-    bool take(const Message& m, int* answer);
+    bool take(const Message& m, int* answer, bool* tick = nullptr);
 
     QList<Expectation> m_expected;
     QStringList m_fileAnswers;
