@@ -1,25 +1,11 @@
 #pragma once
 
-#include <QDialog>
-
-class QSpinBox;
+#include "editing/VDRSettingsSpinDialog.h"
 
 // How many backup generations saving keeps.
-class VDRBackupConfigDialog : public QDialog
+class VDRBackupConfigDialog : public VDRSettingsSpinDialog
 {
     Q_OBJECT
 public:
     explicit VDRBackupConfigDialog(QWidget* parent = nullptr);
-    static int defaultValue() { return 4; }
-    QSpinBox* spinBox() const { return m_spin; }
-
-public slots:
-    void accept() override;
-    void slotDefaults();
-
-protected:
-    void showEvent(QShowEvent* event) override;
-
-private:
-    QSpinBox* m_spin;
 };

@@ -1,43 +1,59 @@
 #include "editing/VDRSettingsSpinDialog.h"
 
-#include <QDialog>
 #include <QFormLayout>
 #include <QHBoxLayout>
 #include <QLabel>
 #include <QPushButton>
+#include <QSettings>
 #include <QSpinBox>
 #include <QVBoxLayout>
 
-QSpinBox* VDRSettingsSpinDialog::build(QDialog* dialog, const QString& title, const QString& explanation,
-                                       const QString& label, int minimum, int maximum, int step)
+VDRSettingsSpinDialog::VDRSettingsSpinDialog(const Setup& setup, QWidget* parent)
+    : QDialog(parent), m_key(setup.settingsKey), m_default(setup.defaultValue), m_spin(new QSpinBox(this))
 {
-    dialog->setWindowTitle(title);
-    auto* layout = new QVBoxLayout(dialog);
-    auto* text = new QLabel(explanation, dialog);
+    setWindowTitle(setup.title);
+    auto* layout = new QVBoxLayout(this);
+    auto* text = new QLabel(setup.explanation, this);
     text->setWordWrap(true);
     layout->addWidget(text);
     auto* form = new QFormLayout;
-    auto* spin = new QSpinBox(dialog);
-    spin->setObjectName(QStringLiteral("spinBox"));
-    spin->setRange(minimum, maximum);
-    spin->setSingleStep(step);
-    form->addRow(label, spin);
+    m_spin->setObjectName(QStringLiteral("spinBox"));
+    m_spin->setRange(setup.minimum, setup.maximum);
+    m_spin->setSingleStep(setup.step);
+    form->addRow(setup.label, m_spin);
     layout->addLayout(form);
+
     auto* buttons = new QHBoxLayout;
-    auto* defaults = new QPushButton(QDialog::tr("Standardeinstellung"), dialog);
+    auto* defaults = new QPushButton(tr("Standardeinstellung"), this);
     defaults->setObjectName(QStringLiteral("pushButtonDefaults"));
-    auto* ok = new QPushButton(QDialog::tr("OK"), dialog);
+    auto* ok = new QPushButton(tr("OK"), this);
     ok->setObjectName(QStringLiteral("pushButtonOk"));
     ok->setDefault(true);
-    auto* cancel = new QPushButton(QDialog::tr("Abbrechen"), dialog);
+    auto* cancel = new QPushButton(tr("Abbrechen"), this);
     cancel->setObjectName(QStringLiteral("pushButtonCancel"));
     buttons->addWidget(defaults);
     buttons->addStretch();
     buttons->addWidget(ok);
     buttons->addWidget(cancel);
     layout->addLayout(buttons);
-    QObject::connect(defaults, SIGNAL(clicked()), dialog, SLOT(slotDefaults()));
-    QObject::connect(ok, &QPushButton::clicked, dialog, &QDialog::accept);
-    QObject::connect(cancel, &QPushButton::clicked, dialog, &QDialog::reject);
-    return spin;
+    connect(defaults, &QPushButton::clicked, this, &VDRSettingsSpinDialog::slotDefaults);
+    connect(ok, &QPushButton::clicked, this, &QDialog::accept);
+    connect(cancel, &QPushButton::clicked, this, &QDialog::reject);
+}
+
+void VDRSettingsSpinDialog::showEvent(QShowEvent* event)
+{
+    m_spin->setValue(QSettings().value(m_key, m_default).toInt());
+    QDialog::showEvent(event);
+}
+
+void VDRSettingsSpinDialog::slotDefaults()
+{
+    m_spin->setValue(m_default);
+}
+
+void VDRSettingsSpinDialog::accept()
+{
+    QSettings().setValue(m_key, m_spin->value());
+    QDialog::accept();
 }
