@@ -245,6 +245,9 @@ void VDRDocument::clearState()
     m_lockInfoPath.clear();
     m_fileVersion.clear();
     m_transactionDepth = 0;
+    m_masterDataModified = false;
+    m_deletedImages = 0;
+    m_deletedAudio = 0;
 }
 
 bool VDRDocument::openWorkingCopyConnection(bool showErrors)
@@ -616,9 +619,15 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     }
     {
         QSqlQuery q(database());
-        if (!q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) ||
-            !q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"))) {
-            VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(q.lastError()));
+        // The dummy write only takes the lock. Synced, it would force the whole fresh copy to disk
+        // here; the user's first edit syncs it anyway, and a copy broken before that holds no edits.
+        q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
+        const bool locked = q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) &&
+                            q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
+        const QSqlError error = q.lastError();
+        q.exec(QStringLiteral("PRAGMA synchronous = FULL"));
+        if (!locked) {
+            VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(error));
             q.finish();
             abandonOpening(madeWorkingCopy);
             return false;
@@ -639,6 +648,10 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     }
 
     // 11, 12
+    // Trigger of the photo-assignment repair: entry_photo lacks relation_id before the upgrade
+    // adds it. The repaired working copy has the column, so once saved the repair never runs again.
+    const bool photoAssignmentsMissing = !VDRDatabaseSchema::columns(database(), QStringLiteral("entry_photo"))
+                                              .contains(QStringLiteral("relation_id"), Qt::CaseInsensitive);
     bool extended = false;
     if (!VDRDatabaseSchema::upgrade(database(), extended)) {
         abandonOpening(madeWorkingCopy);
@@ -674,6 +687,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     // 14
     initModels();
     m_fileVersion = metaValue(QStringLiteral("fileversion"));
+    if (photoAssignmentsMissing)
+        repairPhotoAssignments();
     if (m_fileVersion == QLatin1String("0.1") || m_fileVersion == QLatin1String("0.0"))
         repairOldVersion();
 
@@ -759,8 +774,6 @@ bool VDRDocument::writeWorkingCopyTo(const QString& target)
 
 bool VDRDocument::importExternalDocuments()
 {
-    // Moving the files named in the `document` columns into the documents database belongs to the
-    // documents database; until it does, "documentImport" stays as it is so the import runs later.
     return VDRDocumentsDb::importExternalDocuments(this);
 }
 
@@ -772,7 +785,14 @@ void VDRDocument::repairOldVersion()
 
 void VDRDocument::freezeCompaniesOfLockedEntries()
 {
-    // Filled in with report locking: locked reports of these versions get frozen company copies.
+    // These versions locked reports without freezing their companies.
+    beginTransaction();
+    m_modelEntryAll->fetch_all();
+    for (int row = 0; row < m_modelEntryAll->rowCount(); ++row) {
+        if (m_modelEntryAll->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0)
+            lockCompanyRecords4lockedEntry(row); // submits the copies and the report's rows
+    }
+    endTransaction();
 }
 
 void VDRDocument::renumberPositions()

@@ -301,6 +301,7 @@ private:
     bool importExternalDocuments();
     void repairOldVersion();
     void freezeCompaniesOfLockedEntries();
+    void repairPhotoAssignments();
     void renumberPositions();
     void clearState();
     void removeTemporaryFiles();

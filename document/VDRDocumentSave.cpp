@@ -164,7 +164,7 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
         return false;
     }
     if (!dropped.isEmpty())
-        QFile::remove(dropped);
+        VDRFileOps::removeInBackground(dropped, diary);
     return true;
 }
 

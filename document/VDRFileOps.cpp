@@ -6,6 +6,7 @@
 #include <QRegularExpression>
 #include <QSaveFile>
 #include <QTemporaryFile>
+#include <QThreadPool>
 
 #include <cstdio>
 #include <fcntl.h>
@@ -25,6 +26,33 @@ void syncDirectory(const QString& path)
         ::close(fd);
     }
 }
+// The kernel copies without the data passing through this process where it can (copy_file_range);
+// elsewhere, or when that fails at the start, a plain read and write loop does it.
+bool copyContents(QFile& in, QFile& out)
+{
+    const qint64 size = in.size();
+    qint64 done = 0;
+    while (done < size) {
+        const ssize_t n = ::copy_file_range(in.handle(), nullptr, out.handle(), nullptr, size_t(size - done), 0);
+        if (n <= 0)
+            break;
+        done += n;
+    }
+    if (done == size)
+        return true;
+    if (!in.seek(done) || !out.seek(done))
+        return false;
+    QByteArray buffer;
+    for (;;) {
+        buffer = in.read(4 * 1024 * 1024);
+        if (buffer.isEmpty())
+            break;
+        if (out.write(buffer) != buffer.size())
+            return false;
+    }
+    return in.error() == QFileDevice::NoError && out.flush() && out.size() == size;
+}
+
 } // namespace
 
 void VDRFileOps::setFailurePredicate(FailurePredicate predicate)
@@ -39,9 +67,16 @@ bool VDRFileOps::shouldFail(Op op, const QString& path)
 
 bool VDRFileOps::copy(const QString& source, const QString& target)
 {
-    if (shouldFail(Copy, target))
+    if (shouldFail(Copy, target) || QFileInfo::exists(target))
         return false;
-    return QFile::copy(source, target);
+    const QString temporary = copyToTemporary(source, target, false);
+    if (temporary.isEmpty())
+        return false;
+    if (!QFile::rename(temporary, target)) {
+        QFile::remove(temporary);
+        return false;
+    }
+    return true;
 }
 
 bool VDRFileOps::rename(const QString& source, const QString& target)
@@ -119,6 +154,11 @@ QString VDRFileOps::writeDurableCopy(const QString& source, const QString& targe
 {
     if (shouldFail(Copy, target))
         return QString();
+    return copyToTemporary(source, target, true);
+}
+
+QString VDRFileOps::copyToTemporary(const QString& source, const QString& target, bool flush)
+{
     QFile in(source);
     if (!in.open(QIODevice::ReadOnly))
         return QString();
@@ -127,15 +167,7 @@ QString VDRFileOps::writeDurableCopy(const QString& source, const QString& targe
                        QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
     if (!out.open())
         return QString();
-    QByteArray buffer;
-    for (;;) {
-        buffer = in.read(4 * 1024 * 1024);
-        if (buffer.isEmpty())
-            break;
-        if (out.write(buffer) != buffer.size())
-            return QString();
-    }
-    if (in.error() != QFileDevice::NoError || !out.flush() || ::fsync(out.handle()) != 0)
+    if (!copyContents(in, out) || (flush && ::fsync(out.handle()) != 0))
         return QString();
     out.setPermissions(in.permissions() | QFileDevice::WriteOwner | QFileDevice::ReadOwner);
     out.setAutoRemove(false);
@@ -163,6 +195,26 @@ bool VDRFileOps::copyDurably(const QString& source, const QString& target)
         return false;
     }
     return true;
+}
+
+void VDRFileOps::removeInBackground(const QString& path, const QString& neighbour)
+{
+    const QFileInfo fi(neighbour);
+    QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() + QLatin1String(kTemporaryInfix) +
+                        QStringLiteral("XXXXXX.tmp"));
+    if (!name.open()) {
+        QFile::remove(path);
+        return;
+    }
+    name.close();
+    const QString doomed = name.fileName();
+    name.setAutoRemove(false);
+    if (std::rename(QFile::encodeName(path).constData(), QFile::encodeName(doomed).constData()) != 0) {
+        QFile::remove(doomed);
+        QFile::remove(path);
+        return;
+    }
+    QThreadPool::globalInstance()->start([doomed] { QFile::remove(doomed); });
 }
 
 QStringList VDRFileOps::leftoverTemporaries(const QString& target)

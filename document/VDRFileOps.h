@@ -33,6 +33,10 @@ public:
     static bool replaceFile(const QString& temporary, const QString& target);
     // writeDurableCopy and replaceFile: 'target' is at every instant absent/old or the complete copy.
     static bool copyDurably(const QString& source, const QString& target);
+    // Deletes a file in the background: a large backup takes a while to free on some file systems,
+    // and nobody waits for it. The file first gets a temporary name beside 'neighbour' so that a
+    // crash leaves only a leftover the next opening removes.
+    static void removeInBackground(const QString& path, const QString& neighbour);
     // Temporary files a durable copy to 'target' left behind when it was interrupted.
     static QStringList leftoverTemporaries(const QString& target);
 
@@ -42,4 +46,5 @@ public:
 
 private:
     static bool shouldFail(Op op, const QString& path);
+    static QString copyToTemporary(const QString& source, const QString& target, bool flush);
 };

@@ -2,7 +2,6 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 
-#include <QCryptographicHash>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -21,13 +20,6 @@ struct Run
     QString err;
 };
 
-QByteArray fileHash(const QString& path)
-{
-    QFile f(path);
-    if (!f.open(QIODevice::ReadOnly))
-        return QByteArray();
-    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
-}
 } // namespace
 
 // Drives varduna-cli as a separate process, as people who automate use it.

@@ -3,7 +3,6 @@
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 
-#include <QCryptographicHash>
 #include <QFile>
 #include <QTemporaryDir>
 #include <QtTest>
@@ -11,12 +10,6 @@
 using namespace VDRTestFixtures;
 
 namespace {
-QByteArray fileHash(const QString& path)
-{
-    QFile f(path);
-    f.open(QIODevice::ReadOnly);
-    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
-}
 
 QStringList columnNames(const QString& path, const QString& table)
 {
@@ -211,11 +204,14 @@ void TestVDRDatabaseSchema::upgradeConvertsOldData()
     const QString db = openUpgradedWorkingCopy(old);
     QVERIFY(!db.isEmpty());
 
-    // Files of version 0.1 also get their list positions renumbered from 0 per report.
+    // Files of version 0.1 also get their list positions renumbered from 0 per report, and the locked
+    // report 001 names frozen copies of its companies from then on.
+    QCOMPARE(queryTexts(db, "SELECT id, category, type, company FROM company WHERE category < 0 ORDER BY id"),
+             QStringList({"4|-2|Rohbau|Bau GmbH", "5|-2|Elektro|Strom AG", "6|-1|Bauherr|"}));
     // Three count/type pairs become one summed workforce row plus one time recording per used pair.
     QCOMPARE(queryTexts(db, "SELECT id, entry_id, company_id, comment, person_count, person_type, pos FROM "
                             "entry_workforce ORDER BY id"),
-             QStringList({"4|1|2|Kolonne A|5|Maurer, Polier|0", "5|1|3|Kolonne B|5|Elektriker, Helfer|1",
+             QStringList({"4|1|4|Kolonne A|5|Maurer, Polier|0", "5|1|5|Kolonne B|5|Elektriker, Helfer|1",
                           "6|2|2|leer|0||0"}));
     QCOMPARE(queryTexts(db, "SELECT id, entry_id, workforce_id, person_count, person_type FROM entry_time_recording "
                             "ORDER BY id"),
@@ -231,7 +227,7 @@ void TestVDRDatabaseSchema::upgradeConvertsOldData()
     // Progress rows keep their data; the date may now be empty.
     QCOMPARE(queryTexts(db, "SELECT id, type, description, company_id, date, roomname, roombook_number, pos FROM "
                             "entry_progress ORDER BY id"),
-             QStringList({"1|1|Lieferung verspätet|2|2009-03-02|||0", "2|4|Riss in Wand|3|2009-03-02|||0"}));
+             QStringList({"1|1|Lieferung verspätet|4|2009-03-02|||0", "2|4|Riss in Wand|5|2009-03-02|||0"}));
     QVERIFY(execSql(db, {"INSERT INTO entry_progress (id, entry_id, pos, type, description, roomname, roombook_number) "
                          "VALUES (9, 1, 3, 1, 'ohne Datum', '', '')"}));
 
@@ -240,7 +236,8 @@ void TestVDRDatabaseSchema::upgradeConvertsOldData()
              QStringList({"001|1|1|NULL|0", "002 (Entwurf)|1|1|NULL|0"}));
     QCOMPARE(queryTexts(db, "SELECT name, address1, show_address1, logo2_image_id FROM vdr"),
              QStringList({"Altbau Schillerstraße|-1|0|0"}));
-    QCOMPARE(queryValue(db, "SELECT group_concat(pos) FROM company ORDER BY id").toString(), QStringLiteral("1,2,3"));
+    QCOMPARE(queryValue(db, "SELECT group_concat(pos) FROM company WHERE category > 0 ORDER BY id").toString(),
+             QStringLiteral("1,2,3"));
     QCOMPARE(queryValue(db, "SELECT value FROM meta WHERE key = 'fileversion'").toString(), QStringLiteral("0.1"));
 }
 

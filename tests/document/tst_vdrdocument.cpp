@@ -3,7 +3,6 @@
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
 
-#include <QCryptographicHash>
 #include <QDir>
 #include <QProcess>
 #include <QSignalSpy>
@@ -16,13 +15,6 @@
 using namespace VDRTestFixtures;
 
 namespace {
-QByteArray fileHash(const QString& path)
-{
-    QFile f(path);
-    if (!f.open(QIODevice::ReadOnly))
-        return QByteArray();
-    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
-}
 
 QString helperPath(const char* name)
 {

@@ -3,6 +3,7 @@
 #include "document/VDRDocument.h"
 
 #include <QCoreApplication>
+#include <QCryptographicHash>
 #include <QDebug>
 #include <QDir>
 #include <QSqlRecord>
@@ -124,6 +125,14 @@ QStringList tableNames(const QString& path)
                                         "'sqlite_%' ORDER BY name")))
         result << row[0].toString();
     return result;
+}
+
+QByteArray fileHash(const QString& path)
+{
+    QFile f(path);
+    if (!f.open(QIODevice::ReadOnly))
+        return QByteArray();
+    return QCryptographicHash::hash(f.readAll(), QCryptographicHash::Sha256);
 }
 
 bool damageFile(const QString& path)

@@ -29,6 +29,9 @@ QStringList queryTexts(const QString& path, const QString& sql);
 QStringList tableLayout(const QString& path, const QString& table);
 QStringList tableNames(const QString& path);
 
+// SHA-256 of a file's bytes (empty when it cannot be read): shows that a file was left untouched.
+QByteArray fileHash(const QString& path);
+
 // Overwrites bytes in the middle of the file so that SQLite sees a damaged b-tree.
 bool damageFile(const QString& path);
 
