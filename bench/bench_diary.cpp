@@ -4,6 +4,7 @@
 //   save    vs  cp + sync (copy and flush)
 //   compact vs  sqlite3 "VACUUM"
 // Usage: bench_diary [--reports N] [--photos N] [--runs N] [--file PATH] [--keep]
+// BENCH_VERBOSE=1 prints every run, not only the medians.
 #include "document/VDRDocument.h"
 
 #include <QBuffer>
@@ -310,6 +311,11 @@ int main(int argc, char* argv[])
         saveOurs << t.nsecsElapsed() / 1e6;
         readSave = bytesRead() - beforeSave;
         doc.closeDocument();
+    }
+    if (qEnvironmentVariableIsSet("BENCH_VERBOSE")) {
+        for (int i = 0; i < saveOurs.size(); ++i)
+            out() << QString::asprintf("  run %d: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f)\n", i + 1,
+                                       openOurs[i], openBase[i], saveOurs[i], saveBase[i]);
     }
     const qint64 copyBytes = copyRead(file, copy);
     report("open", median(openOurs), median(openBase), readOpen,

@@ -307,6 +307,8 @@ private:
     void removeTemporaryFiles();
     void cleanUpInterruptedSave(const QString& diaryPath);
     bool compactWorkingCopy();
+    int saveDocumentImpl(const QString& path, bool compacted);
+    QString vacuumInto(const QString& target);
     int reopenAfterSave(int result);
     bool replaceDiaryKeepingBackups(const QString& temporary);
     bool saveAs(const QString& target);

@@ -255,6 +255,49 @@ int VDRDocument::reopenAfterSave(int result)
 
 int VDRDocument::saveDocument(const QString& path)
 {
+    return saveDocumentImpl(path, false);
+}
+
+// Writes a compacted copy of the closed working copy beside 'target' in one pass over the data,
+// instead of rebuilding the working copy in place and copying it afterwards.
+QString VDRDocument::vacuumInto(const QString& target)
+{
+    const QString temporary = VDRFileOps::emptyTemporaryBeside(target);
+    if (temporary.isEmpty())
+        return QString();
+    bool ok;
+    QSqlError error;
+    {
+        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("COMPACT"));
+        db.setDatabaseName(m_workingCopyPath);
+        ok = db.open();
+        if (ok) {
+            QSqlQuery q(db);
+            q.prepare(QStringLiteral("VACUUM INTO ?"));
+            q.addBindValue(temporary);
+            ok = q.exec();
+            error = q.lastError();
+        } else {
+            error = db.lastError();
+        }
+        db.close();
+    }
+    QSqlDatabase::removeDatabase(QStringLiteral("COMPACT"));
+    if (ok && !VDRFileOps::flush(temporary))
+        ok = false;
+    if (!ok) {
+        QFile::remove(temporary);
+        if (error.isValid())
+            VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(error));
+        VDRPrompt::warning(tr("Datenbank bereinigen"),
+                           tr("Aufgrund eines SQL-Fehlers konnte die Datenbank nicht bereinigt werden."));
+        return QString();
+    }
+    return temporary;
+}
+
+int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
+{
     if (!m_valid)
         return 2;
     if (m_demo) {
@@ -321,16 +364,31 @@ int VDRDocument::saveDocument(const QString& path)
             VDRPrompt::critical(tr("interner Fehler"), tr("Dateiname fehlt."));
             return reopenAfterSave(2);
         }
-        CopyThread copy(m_workingCopyPath, m_filePath);
-        copy.setReplaceTarget(false);
-        if (!copy.copyAndWait()) {
-            VDRPrompt::critical(tr("Dateifehler"),
-                                tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+        QString temporary;
+        if (compacted) {
+            temporary = vacuumInto(m_filePath);
+            if (temporary.isEmpty())
+                return reopenAfterSave(2);
+        } else {
+            CopyThread copy(m_workingCopyPath, m_filePath);
+            copy.setReplaceTarget(false);
+            if (!copy.copyAndWait()) {
+                VDRPrompt::critical(tr("Dateifehler"),
+                                    tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+                return reopenAfterSave(2);
+            }
+            temporary = copy.temporaryFile();
+        }
+        if (!replaceDiaryKeepingBackups(temporary)) {
+            QFile::remove(temporary);
             return reopenAfterSave(2);
         }
-        if (!replaceDiaryKeepingBackups(copy.temporaryFile())) {
-            QFile::remove(copy.temporaryFile());
-            return reopenAfterSave(2);
+        // Edits go on from the compacted state. Should this copy fail, the old working copy stays:
+        // it holds the same data, only larger.
+        if (compacted) {
+            QFile::remove(m_workingCopyPath + QStringLiteral("-journal"));
+            if (!VDRFileOps::copyDurably(m_filePath, m_workingCopyPath))
+                qWarning().noquote() << "working copy not replaced by the compacted diary:" << m_workingCopyPath;
         }
     } else {
         if (!saveAs(target))
@@ -505,11 +563,14 @@ int VDRDocument::compactDB(bool showReport)
         tr("Die Datenbank wird jetzt bereinigt.\nDieser Vorgang kann für größere Datenbanken mehrere Minuten "
            "dauern.\n\nUnterbrechen Sie diesen Vorgang nicht und schalten Sie den Computer nicht aus.\n"));
     m_compactSizeBefore = QFileInfo(m_workingCopyPath).size();
-    if (!compactWorkingCopy()) {
+    if (!removeObsoleteImages()) {
         VDRPrompt::instance()->endNotice();
         return 2;
     }
-    const int saved = saveDocument(QString());
+    VDRDocumentsDb::compactDocumentDB(m_filePath);
+    m_deletedImages = 0;
+    m_deletedAudio = 0;
+    const int saved = saveDocumentImpl(QString(), true);
     VDRPrompt::instance()->endNotice();
     if (saved != 0) {
         VDRPrompt::warning(tr("Datenbank bereinigen"),

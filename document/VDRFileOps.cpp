@@ -174,6 +174,25 @@ QString VDRFileOps::copyToTemporary(const QString& source, const QString& target
     return out.fileName();
 }
 
+QString VDRFileOps::emptyTemporaryBeside(const QString& target)
+{
+    if (shouldFail(Copy, target))
+        return QString();
+    const QFileInfo fi(target);
+    QTemporaryFile file(fi.absolutePath() + QLatin1Char('/') + fi.fileName() + QLatin1String(kTemporaryInfix) +
+                        QStringLiteral("XXXXXX.tmp"));
+    if (!file.open())
+        return QString();
+    file.setAutoRemove(false);
+    return file.fileName();
+}
+
+bool VDRFileOps::flush(const QString& path)
+{
+    QFile file(path);
+    return file.open(QIODevice::ReadWrite) && ::fsync(file.handle()) == 0;
+}
+
 bool VDRFileOps::replaceFile(const QString& temporary, const QString& target)
 {
     if (shouldFail(Rename, target))

@@ -29,6 +29,10 @@ public:
     // Copies 'source' to a new temporary file beside 'target' and flushes it to disk. Returns the
     // temporary file's name, empty on failure (nothing is left behind then).
     static QString writeDurableCopy(const QString& source, const QString& target);
+    // A new empty file under a temporary name beside 'target', for a writer that makes the contents itself.
+    static QString emptyTemporaryBeside(const QString& target);
+    // Flushes a finished file to disk.
+    static bool flush(const QString& path);
     // Renames 'temporary' over 'target' in one step and makes the rename itself durable.
     static bool replaceFile(const QString& temporary, const QString& target);
     // writeDurableCopy and replaceFile: 'target' is at every instant absent/old or the complete copy.
