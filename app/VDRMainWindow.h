@@ -1,13 +1,21 @@
 #pragma once
 
+#include "app/Ui_VDRMainWindowClass.h"
+
+#include <QDate>
 #include <QMainWindow>
+#include <QStringList>
 
+class QCalendarWidget;
+class QDockWidget;
 class QLabel;
+class QStackedWidget;
 class QTableView;
+class QTimer;
 class VDRDocument;
+class VDRSpellChecker;
 
-// The main window. For now it creates or opens one diary and shows its reports; menus, docks
-// and the report form come with the full window.
+// The one main window: menus, tool bar, docks, status bar and the document-level commands.
 class VDRMainWindow : public QMainWindow
 {
     Q_OBJECT
@@ -16,23 +24,80 @@ public:
     ~VDRMainWindow() override;
 
     VDRDocument* document() const { return m_document; }
+    // The start-up's spell checker; text fields ask it. May be null.
+    void setSpellChecker(VDRSpellChecker* checker);
+    VDRSpellChecker* spellChecker() const { return m_spellChecker; }
+    Ui_VDRMainWindowClass& ui() { return m_ui; }
 
-    // 0 = opened, 2 = cancelled or failed.
-    int openDocument(const QString& path);
-    bool createDocument();
-    bool closeDocument();
+    // 0 = opened, 2 = cancelled or failed. An empty path asks for a file.
+    int openDocument(const QString& path, bool noRecentEntry, bool noSaveQuestion);
+    bool createDocument(bool hideSyncButton);
+    // 0 = the caller may go on (saved, or changes discarded), any other value = cancelled.
+    int saveDocument(bool saveAs, bool withoutQuestion);
+    // True when no document is open afterwards.
+    bool closeDocument(bool askToSave);
+
+    void addRecentFile(const QString& path);
+    void removeRecentFile(const QString& path);
+    QStringList recentFiles() const { return m_recentFiles; }
+    void updateGuiRecentFileList();
+    void updateGui();
+    void updateStatusBar();
+
+    // The demo project beside the program ("../Projects/Ejemplo.vd2").
+    static QString demoProjectPath();
+
+    // Ends at once, as on logout: unsaved work stays in the working copy for the next opening.
+    void endSession();
+
+    static QString recentFileListSettingsKey() { return QStringLiteral("recentFileList"); }
+    static QString geometrySettingsKey() { return QStringLiteral("MainWindow/geometry"); }
+    static QString windowStateSettingsKey() { return QStringLiteral("MainWindow/windowState"); }
+    static QString showEntryListSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryList"); }
+    static QString showEntryDateSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryDate"); }
+
+public slots:
+    void slotDocumentOpened(VDRDocument* document);
+    void slotDocumentClosed(VDRDocument* document);
+    void showWelcomePage();
+
+private slots:
+    void on_actionFileNew_triggered();
+    void on_actionFileOpen_triggered();
+    void on_actionFileSave_triggered();
+    void on_actionFileSaveAs_triggered();
+    void on_actionOpenDemoProject_triggered();
+    void on_actionFileExit_triggered();
+    void on_actionViewToolbar_triggered();
+    void on_actionViewStatusbar_triggered();
+    void on_actionNumberOfBackups_triggered();
+    void on_actionFileSizeWarning_triggered();
+    void on_actionCompactDB_triggered();
+    void on_actionStartSpellChecking_triggered();
+    void slotReportDatesChanged(const QList<QDate>& dates);
 
 protected:
     void closeEvent(QCloseEvent* event) override;
 
-private slots:
-    void slotDocumentOpened();
-    void slotDocumentClosed();
-
 private:
+    QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content, Qt::DockWidgetArea area);
+    void connectActions();
+    void checkFileSize();
+
+    Ui_VDRMainWindowClass m_ui;
     VDRDocument* m_document;
-    QLabel* m_projectLabel;
-    QTableView* m_reports;
+    QStringList m_recentFiles;
+    QStackedWidget* m_central;
+    QLabel* m_welcome;
+    QLabel* m_reportPage;
+    QTableView* m_entryList;
+    QCalendarWidget* m_calendar;
+    QDockWidget* m_dockEntryList;
+    QDockWidget* m_dockEntryDate;
+    QLabel* m_clock;
+    QTimer* m_clockTimer;
+    VDRSpellChecker* m_spellChecker = nullptr;
 };
 
+// The one main window of the process, set at start-up.
 extern VDRMainWindow* g_mainWindow;

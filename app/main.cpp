@@ -1,19 +1,81 @@
+#include "app/KeyPressEater.h"
+#include "app/MyProxyStyle.h"
+#include "app/VDRApplication.h"
 #include "app/VDRMainWindow.h"
+#include "app/VDRSignalWatcher.h"
 #include "document/VDRDocument.h"
+#include "editing/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
 
-#include <QApplication>
+#include <QDir>
+#include <QFileInfo>
+#include <QLibraryInfo>
+#include <QLocale>
+#include <QProcess>
+#include <QSettings>
 #include <QSqlDatabase>
+#include <QTimer>
+#include <QTranslator>
+
+namespace {
+
+const int kRestartExitCode = 1000;
+
+void installTranslators(QCoreApplication& app, const QLocale& locale)
+{
+    const QString base = QCoreApplication::applicationDirPath();
+    const QString language = VDRSpellChecker::translationLanguage(locale.language(), locale.country());
+    const struct
+    {
+        QString name;
+        QString folder;
+    } files[] = {{QStringLiteral("qt_") + locale.name(), base + QStringLiteral("/../Translations")},
+                 {QStringLiteral("qtBase_") + locale.name(), base + QStringLiteral("/../Translations")},
+                 {QStringLiteral("ncreport_") + language, base + QStringLiteral("/../NCreport/i18n")},
+                 {QStringLiteral("vdr_") + language, base + QStringLiteral("/../Translations")}};
+    for (const auto& file : files) {
+        auto* translator = new QTranslator(&app);
+        // A missing translation leaves the German source texts; it must not stop the start.
+        if (translator->load(file.name, file.folder))
+            QCoreApplication::installTranslator(translator);
+        else
+            delete translator;
+    }
+}
+
+} // namespace
 
 int main(int argc, char* argv[])
 {
-    QApplication app(argc, argv);
+    VDRApplication app(argc, argv);
+    app.setStyle(new MyProxyStyle);
+    QCoreApplication::addLibraryPath(QCoreApplication::applicationDirPath() + QStringLiteral("/plugins"));
     QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
     QCoreApplication::setOrganizationDomain(QStringLiteral("korvant-software.de"));
     QCoreApplication::setApplicationName(QStringLiteral("Varduna"));
 
+    QSettings settings;
+    // German, English and Spanish are served; any other system language starts in German.
+    QLocale::Language systemLanguage = QLocale::system().language();
+    if (systemLanguage != QLocale::English && systemLanguage != QLocale::Spanish)
+        systemLanguage = QLocale::German;
+    const int language = settings.value(QStringLiteral("language"), int(systemLanguage)).toInt();
+    settings.setValue(QStringLiteral("language"), language);
+    const auto chosen = QLocale::Language(language);
+    const QLocale locale{chosen, chosen == QLocale::system().language() ? QLocale::system().country()
+                                                                         : QLocale::AnyCountry};
+    QLocale::setDefault(locale);
+    installTranslators(app, locale);
+
     VDRWidgetPrompt prompt;
     VDRPrompt::setInstance(&prompt);
+
+    const QString dictionaries = QCoreApplication::applicationDirPath() + QStringLiteral("/../Dictionaries/");
+    const QString suffix = VDRSpellChecker::dictionarySuffix(locale.language(), locale.country());
+    VDRSpellChecker spellChecker(dictionaries + QStringLiteral("vdr_") + suffix,
+                                 dictionaries + QStringLiteral("vdr_userDict_") + suffix + QStringLiteral(".txt"));
+    settings.remove(QStringLiteral("spellCheckerDialogX"));
+    settings.remove(QStringLiteral("spellCheckerDialogY"));
 
     if (!QSqlDatabase::drivers().contains(QStringLiteral("QSQLITE"))) {
         VDRPrompt::critical(QObject::tr("Fehler"), QObject::tr("Ihre QT-Installation unterstützt SQLITE nicht. Bitte "
@@ -25,22 +87,62 @@ int main(int argc, char* argv[])
     {
         VDRMainWindow window;
         g_mainWindow = &window;
+        window.setSpellChecker(&spellChecker);
         prompt.setParentWidget(&window);
+        window.restoreGeometry(settings.value(VDRMainWindow::geometrySettingsKey()).toByteArray());
+        window.restoreState(settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray());
         window.show();
 
+        // The first document: a file the desktop handed over, the language dialog's re-open key,
+        // a single argument, or the argument after "-file".
+        QString file = app.fileToOpen();
+        const QString reopenKey = QStringLiteral("language/reopenFile");
         const QStringList args = QCoreApplication::arguments().mid(1);
-        QString file;
-        if (args.size() == 1)
+        if (file.isEmpty() && settings.contains(reopenKey)) {
+            file = settings.value(reopenKey).toString();
+            settings.remove(reopenKey);
+        }
+        if (file.isEmpty() && args.size() == 1)
             file = args.first();
-        else if (const int i = args.indexOf(QStringLiteral("-file")); i >= 0 && i + 1 < args.size())
-            file = args.at(i + 1);
-        if (!file.isEmpty())
-            window.openDocument(file);
-        else
-            window.createDocument();
+        if (file.isEmpty()) {
+            const int i = args.indexOf(QStringLiteral("-file"));
+            if (i >= 0 && i + 1 < args.size())
+                file = args.at(i + 1);
+        }
+        bool opened = false;
+        if (!file.isEmpty()) {
+            if (QFileInfo(file).suffix().compare(QLatin1String("vdx"), Qt::CaseInsensitive) == 0)
+                opened = window.createDocument(true); // the exchange import follows with the exchange itself
+            else
+                opened = window.openDocument(file, false, true) == 0;
+        }
+        QObject::connect(&app, &QGuiApplication::lastWindowClosed, &app, &QCoreApplication::quit);
+        QObject::connect(&app, &VDRApplication::fileOpenRequested, &window,
+                         [&window](const QString& path) { window.openDocument(path, false, false); });
+
+        if (!opened && settings.value(QStringLiteral("tips/showWelcomePageOnStart"), true).toBool())
+            QTimer::singleShot(2000, &window, &VDRMainWindow::showWelcomePage);
+
+        KeyPressEater eater;
+        app.installEventFilter(&eater);
+
+        VDRSignalWatcher watcher;
+        QObject::connect(&watcher, &VDRSignalWatcher::terminationRequested, &window, [&window](int) {
+            window.endSession();
+            QCoreApplication::exit(0);
+        });
 
         result = app.exec();
+        app.removeEventFilter(&eater);
     }
     VDRPrompt::setInstance(nullptr);
+
+    if (result == kRestartExitCode) {
+        QStringList args = QCoreApplication::arguments();
+        const QString program = args.size() > 1 ? args.takeAt(1) : QCoreApplication::applicationFilePath();
+        args.removeFirst();
+        QProcess::startDetached(program, args);
+        return 0;
+    }
     return result;
 }

@@ -600,8 +600,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     if (m_workingCopyPath != workingCopy)
         m_lockInfoPath.clear();
 
-    // 7: write permission.
-    if (!VDRFileOps::isWritable(diaryPath)) {
+    // 7: write permission. The demo is never saved, so its shipped read-only mode stays.
+    if (!m_demo && !VDRFileOps::isWritable(diaryPath)) {
         QFile::setPermissions(diaryPath, QFile::permissions(diaryPath) | QFile::ReadOwner | QFile::WriteOwner |
                                              QFile::ReadUser | QFile::WriteUser);
         if (!VDRFileOps::isWritable(diaryPath) && !m_demo)
@@ -743,6 +743,23 @@ bool VDRDocument::closeDocument()
     }
     clearState();
     return ok;
+}
+
+void VDRDocument::closeKeepingWorkingCopy()
+{
+    if (!m_valid)
+        return;
+    emit documentClosed(this);
+    destroyModels();
+    while (m_transactionDepth > 0)
+        endTransaction();
+    closeConnection();
+    // A temporary working copy (new diary, demo) cannot be resumed: nothing would find it.
+    if (m_filesToRemove.contains(m_workingCopyPath) || m_filePath.isEmpty())
+        VDRFileOps::removeDatabase(m_workingCopyPath);
+    m_workingCopyPath.clear();
+    removeTemporaryFiles();
+    clearState();
 }
 
 bool VDRDocument::reopenWorkingCopyAfterError()

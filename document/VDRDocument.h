@@ -28,6 +28,9 @@ public:
     bool createDocument(bool hideSyncButton);
     bool openDocument(const QString& path, bool& showError);
     bool closeDocument();
+    // Ends without closing properly, as a crash would: the working copy and the lock information
+    // stay, so the next opening resumes the unsaved state. Used when the session ends under us.
+    void closeKeepingWorkingCopy();
 
     bool isStateValid() const { return m_valid; }
     bool isStateNew() const { return m_new; }
