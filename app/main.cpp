@@ -3,6 +3,7 @@
 #include "app/VDRApplication.h"
 #include "app/VDRMainWindow.h"
 #include "app/VDRSignalWatcher.h"
+#include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
@@ -93,29 +94,9 @@ int main(int argc, char* argv[])
         window.restoreState(settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray());
         window.show();
 
-        // The first document: a file the desktop handed over, the language dialog's re-open key,
-        // a single argument, or the argument after "-file".
-        QString file = app.fileToOpen();
-        const QString reopenKey = QStringLiteral("language/reopenFile");
-        const QStringList args = QCoreApplication::arguments().mid(1);
-        if (file.isEmpty() && settings.contains(reopenKey)) {
-            file = settings.value(reopenKey).toString();
-            settings.remove(reopenKey);
-        }
-        if (file.isEmpty() && args.size() == 1)
-            file = args.first();
-        if (file.isEmpty()) {
-            const int i = args.indexOf(QStringLiteral("-file"));
-            if (i >= 0 && i + 1 < args.size())
-                file = args.at(i + 1);
-        }
-        bool opened = false;
-        if (!file.isEmpty()) {
-            if (QFileInfo(file).suffix().compare(QLatin1String("vdx"), Qt::CaseInsensitive) == 0)
-                opened = window.createDocument(true); // the exchange import follows with the exchange itself
-            else
-                opened = window.openDocument(file, false, true) == 0;
-        }
+        const QString file = VDRStartup::firstDocumentPath(app.fileToOpen(), settings,
+                                                           QCoreApplication::arguments().mid(1));
+        const bool opened = VDRStartup::openFirstDocument(window, file);
         QObject::connect(&app, &QGuiApplication::lastWindowClosed, &app, &QCoreApplication::quit);
         QObject::connect(&app, &VDRApplication::fileOpenRequested, &window,
                          [&window](const QString& path) { window.openDocument(path, false, false); });
@@ -138,10 +119,9 @@ int main(int argc, char* argv[])
     VDRPrompt::setInstance(nullptr);
 
     if (result == kRestartExitCode) {
-        QStringList args = QCoreApplication::arguments();
-        const QString program = args.size() > 1 ? args.takeAt(1) : QCoreApplication::applicationFilePath();
-        args.removeFirst();
-        QProcess::startDetached(program, args);
+        const auto command =
+            VDRStartup::restartCommand(QCoreApplication::arguments(), QCoreApplication::applicationFilePath());
+        QProcess::startDetached(command.first, command.second);
         return 0;
     }
     return result;
