@@ -38,24 +38,24 @@ QTime at(const char* hhmm)
 }
 
 // ---- The diary's content ----
-// clang-format off
 
 struct Company
 {
-    const char *key, *type, *firstname, *lastname, *company, *street, *plz, *city, *telephone, *telefax, *mobile,
-        *email;
+    const char *key, *type, *firstname, *lastname, *company, *street, *plz, *city, *telephone, *telefax,
+        *mobile, *email;
 };
 
 // List 1, the persons; a new diary already holds Bauherr, Bauleitung and Architekt in this order.
 const Company kPersons[] = {
-    {"bauherr", "Bauherr", "Jens", "Albrecht", "Kinderhaus Sonnenblume e.V.", "Lindenstraße 14", "21335", "Lüneburg",
-     "04131 7781-0", "04131 7781-29", "", "j.albrecht@kinderhaus-sonnenblume.example"},
-    {"bauleitung", "Bauleitung", "Katrin", "Vogt", "Lindner + Kahl Architekten PartG mbB", "Am Sande 5", "21335",
-     "Lüneburg", "04131 24468-12", "04131 24468-99", "0171 4432189", "k.vogt@lindner-kahl.example"},
-    {"architekt", "Architekt", "Martin", "Lindner", "Lindner + Kahl Architekten PartG mbB", "Am Sande 5", "21335",
-     "Lüneburg", "04131 24468-10", "04131 24468-99", "0172 9081345", "m.lindner@lindner-kahl.example"},
-    {"tragwerk", "Tragwerksplanung", "Felix", "Hauser", "Ingenieurbüro Hauser", "Bardowicker Straße 30", "21335",
-     "Lüneburg", "04131 40917", "", "0160 2235487", "hauser@ib-hauser.example"},
+    {"bauherr", "Bauherr", "Jens", "Albrecht", "Kinderhaus Sonnenblume e.V.", "Lindenstraße 14", "21335",
+     "Lüneburg", "04131 7781-0", "04131 7781-29", "", "j.albrecht@kinderhaus-sonnenblume.example"},
+    {"bauleitung", "Bauleitung", "Katrin", "Vogt", "Lindner + Kahl Architekten PartG mbB", "Am Sande 5",
+     "21335", "Lüneburg", "04131 24468-12", "04131 24468-99", "0171 4432189", "k.vogt@lindner-kahl.example"},
+    {"architekt", "Architekt", "Martin", "Lindner", "Lindner + Kahl Architekten PartG mbB", "Am Sande 5",
+     "21335", "Lüneburg", "04131 24468-10", "04131 24468-99", "0172 9081345",
+     "m.lindner@lindner-kahl.example"},
+    {"tragwerk", "Tragwerksplanung", "Felix", "Hauser", "Ingenieurbüro Hauser", "Bardowicker Straße 30",
+     "21335", "Lüneburg", "04131 40917", "", "0160 2235487", "hauser@ib-hauser.example"},
     {"tga", "TGA-Planung", "Tobias", "Reim", "Reim Ingenieure GmbH", "Harburger Ring 17", "21073", "Hamburg",
      "040 7665302", "040 7665309", "", "t.reim@reim-ingenieure.example"},
     {"sigeko", "SiGeKo", "Andrea", "Petersen", "Petersen Arbeitsschutz", "Dorfstraße 3", "21365", "Adendorf",
@@ -64,18 +64,20 @@ const Company kPersons[] = {
 
 // List 2, the companies on site by trade.
 const Company kCompanies[] = {
-    {"rohbau", "Rohbau", "Uwe", "Hartmann", "Hartmann Bau GmbH & Co. KG", "Industriestraße 8", "21337", "Lüneburg",
-     "04131 85520", "04131 855229", "0170 5512873", "bau@hartmann-bau.example"},
+    {"rohbau", "Rohbau", "Uwe", "Hartmann", "Hartmann Bau GmbH & Co. KG", "Industriestraße 8", "21337",
+     "Lüneburg", "04131 85520", "04131 855229", "0170 5512873", "bau@hartmann-bau.example"},
     {"erdbau", "Erd- und Entwässerungsarbeiten", "Sven", "Lorenz", "Lorenz Tiefbau GmbH", "Am Gewerbepark 2",
      "21391", "Reppenstedt", "04131 66120", "04131 661222", "", "info@lorenz-tiefbau.example"},
-    {"zimmerer", "Zimmerer- und Dachdeckerarbeiten", "Henning", "Wenzel", "Holzbau Wenzel GmbH", "Sägewerkweg 4",
-     "29553", "Bienenbüttel", "05823 95410", "05823 954120", "0171 2290461", "post@holzbau-wenzel.example"},
-    {"elektro", "Elektroinstallation", "Marco", "Brandt", "Elektro Brandt GmbH", "Vor dem Neuen Tore 22", "21339",
-     "Lüneburg", "04131 37745", "04131 377459", "", "service@elektro-brandt.example"},
-    {"sanitaer", "Heizung / Sanitär", "Jan", "Sommer", "Sommer Haustechnik GmbH", "Luhdorfer Straße 61", "21423",
-     "Winsen (Luhe)", "04171 60780", "04171 607899", "0173 4418820", "info@sommer-haustechnik.example"},
-    {"geruest", "Gerüstbau", "Dirk", "Krüger", "Gerüstbau Krüger", "Bleckeder Landstraße 90", "21337", "Lüneburg",
-     "04131 52233", "", "0162 8830114", "kontakt@geruestbau-krueger.example"},
+    {"zimmerer", "Zimmerer- und Dachdeckerarbeiten", "Henning", "Wenzel", "Holzbau Wenzel GmbH",
+     "Sägewerkweg 4", "29553", "Bienenbüttel", "05823 95410", "05823 954120", "0171 2290461",
+     "post@holzbau-wenzel.example"},
+    {"elektro", "Elektroinstallation", "Marco", "Brandt", "Elektro Brandt GmbH", "Vor dem Neuen Tore 22",
+     "21339", "Lüneburg", "04131 37745", "04131 377459", "", "service@elektro-brandt.example"},
+    {"sanitaer", "Heizung / Sanitär", "Jan", "Sommer", "Sommer Haustechnik GmbH", "Luhdorfer Straße 61",
+     "21423", "Winsen (Luhe)", "04171 60780", "04171 607899", "0173 4418820",
+     "info@sommer-haustechnik.example"},
+    {"geruest", "Gerüstbau", "Dirk", "Krüger", "Gerüstbau Krüger", "Bleckeder Landstraße 90", "21337",
+     "Lüneburg", "04131 52233", "", "0162 8830114", "kontakt@geruestbau-krueger.example"},
     {"beton", "Transportbeton", "", "", "Nordheide Transportbeton GmbH", "Kiesgrubenweg 1", "21409", "Embsen",
      "04134 90880", "04134 908820", "", "dispo@nordheide-beton.example"},
 };
@@ -102,10 +104,12 @@ const Report kReports[] = {
      "Betonage Ringbalken OG Achsen A–E mit Autobetonpumpe, 12,5 m³ C25/30. Nachbehandlung mit Folie.",
      "Frischbetonprüfung: Ausbreitmaß 48 cm (F3), Betontemperatur 14 °C.", "", "", true},
     {3, "07:30", "10:00", "bedeckt", "leichter Regen", "mäßiger Wind aus Südwest", "6", "93",
-     "Rohbau: Ringbalken ausgeschalt, Giebel Achse 1 begonnen.\nElektro: Rohinstallation EG Gruppenräume 1–3.\n"
+     "Rohbau: Ringbalken ausgeschalt, Giebel Achse 1 begonnen.\nElektro: Rohinstallation EG Gruppenräume "
+     "1–3.\n"
      "Sanitär: Vorwandinstallation WC Kinder EG."},
     {4, "07:30", "09:30", "wolkig", "kein Niederschlag", "mäßiger Wind aus West", "8", "76",
-     "Rohbau: Giebel Achsen 1 und 6 fertig.\nGerüstbau: Gerüst auf Traufhöhe erhöht, Dachfanggerüst montiert."},
+     "Rohbau: Giebel Achsen 1 und 6 fertig.\nGerüstbau: Gerüst auf Traufhöhe erhöht, Dachfanggerüst "
+     "montiert."},
     {7, "07:00", "10:00", "bedeckt", "kein Niederschlag", "schwacher Wind aus Nordwest", "5", "80",
      "Zimmerer: Konstruktionsvollholz angeliefert, Dachstuhl Achsen 1–3 mit Autokran aufgerichtet.\n"
      "Rohbau: Restarbeiten Giebel."},
@@ -127,6 +131,7 @@ const Report kReports[] = {
      "", "", "Nächste Baubesprechung am Donnerstag, 19.03., um 10:00 Uhr im Baucontainer."},
 };
 
+// clang-format off
 // Workforce of a company on one report, with the time recording behind its figures.
 struct Shift
 {
@@ -145,9 +150,11 @@ struct Crew
 const std::vector<Crew> kCrews = {
     {0, "rohbau", "Mauerwerk OG", {{1, "Polier", "07:00", "16:30", 60}, {4, "Maurer", "07:00", "16:30", 60}}},
     {0, "elektro", "Schlitze, Leerrohre EG", {{2, "Elektroinstallateur", "07:00", "15:30", 30}}},
-    {1, "rohbau", "Schalung, Mauerwerk", {{1, "Polier", "07:00", "16:30", 60}, {4, "Maurer", "07:00", "16:30", 60}}},
+    {1, "rohbau", "Schalung, Mauerwerk",
+     {{1, "Polier", "07:00", "16:30", 60}, {4, "Maurer", "07:00", "16:30", 60}}},
     {1, "sanitaer", "Vorwandinstallation EG", {{2, "Anlagenmechaniker", "07:30", "16:00", 30}}},
-    {2, "rohbau", "Ringbalken OG", {{1, "Polier", "07:00", "17:00", 60}, {4, "Betonbauer", "07:00", "17:00", 60}}},
+    {2, "rohbau", "Ringbalken OG",
+     {{1, "Polier", "07:00", "17:00", 60}, {4, "Betonbauer", "07:00", "17:00", 60}}},
     {3, "beton", "Betonpumpe", {{1, "Maschinist", "13:15", "15:45", 0}}},
     {4, "rohbau", "Giebel", {{1, "Polier", "07:00", "16:30", 60}, {4, "Maurer", "07:00", "16:30", 60}}},
     {4, "elektro", "Rohinstallation EG",
@@ -155,18 +162,23 @@ const std::vector<Crew> kCrews = {
     {4, "sanitaer", "Vorwandinstallation EG", {{2, "Anlagenmechaniker", "07:30", "16:00", 30}}},
     {5, "rohbau", "Giebel", {{1, "Polier", "07:00", "16:30", 60}, {3, "Maurer", "07:00", "16:30", 60}}},
     {5, "geruest", "Gerüst, Dachfanggerüst", {{3, "Gerüstbauer", "07:00", "14:00", 30}}},
-    {6, "zimmerer", "Dachstuhl", {{1, "Vorarbeiter", "07:00", "16:00", 45}, {4, "Zimmerer", "07:00", "16:00", 45}}},
+    {6, "zimmerer", "Dachstuhl",
+     {{1, "Vorarbeiter", "07:00", "16:00", 45}, {4, "Zimmerer", "07:00", "16:00", 45}}},
     {6, "rohbau", "Restarbeiten Giebel", {{2, "Maurer", "07:00", "16:30", 60}}},
     {7, "zimmerer", "Dachstuhl, Sturmsicherung",
      {{1, "Vorarbeiter", "07:00", "16:00", 45}, {4, "Zimmerer", "07:00", "16:00", 45}}},
     {7, "elektro", "Rohinstallation OG", {{2, "Elektroinstallateur", "07:00", "15:30", 30}}},
-    {8, "zimmerer", "Dachstuhl", {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Zimmerer", "07:00", "16:00", 45}}},
+    {8, "zimmerer", "Dachstuhl",
+     {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Zimmerer", "07:00", "16:00", 45}}},
     {8, "sanitaer", "Vorwandinstallation EG", {{2, "Anlagenmechaniker", "07:30", "16:00", 30}}},
-    {9, "erdbau", "Schmutzwasser außen", {{1, "Vorarbeiter", "07:00", "16:00", 45}, {2, "Tiefbauer", "07:00", "16:00", 45}}},
-    {10, "zimmerer", "Dach", {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Dachdecker", "07:00", "16:00", 45}}},
+    {9, "erdbau", "Schmutzwasser außen",
+     {{1, "Vorarbeiter", "07:00", "16:00", 45}, {2, "Tiefbauer", "07:00", "16:00", 45}}},
+    {10, "zimmerer", "Dach",
+     {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Dachdecker", "07:00", "16:00", 45}}},
     {10, "elektro", "Durchbrüche OG", {{2, "Elektroinstallateur", "07:00", "15:30", 30}}},
     {10, "sanitaer", "Durchbrüche OG", {{2, "Anlagenmechaniker", "07:30", "16:00", 30}}},
-    {11, "zimmerer", "Dach Nordseite", {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Dachdecker", "07:00", "16:00", 45}}},
+    {11, "zimmerer", "Dach Nordseite",
+     {{1, "Vorarbeiter", "07:00", "16:00", 45}, {3, "Dachdecker", "07:00", "16:00", 45}}},
     {11, "rohbau", "Instandsetzung Ringbalken", {{2, "Maurer", "07:00", "12:00", 15}}},
 };
 
@@ -195,52 +207,58 @@ std::vector<Row> rows()
         {11, TN::TN_ATTENDEE, "bauherr", {{"comment", "Baustellenbegehung"}}},
         {11, TN::TN_ATTENDEE, "architekt", {{"comment", "Baustellenbegehung"}}},
 
-        {1, TN::TN_OBSTRUCTION, "rohbau", {{"description", "Nachtfrost bis −3 °C: Mauerarbeiten mit Dünnbettmörtel "
-            "erst ab 10:00 Uhr möglich, Ausfall etwa 2,5 Stunden."}, {"date", day(1)}}},
-        {7, TN::TN_OBSTRUCTION, "zimmerer", {{"description", "Sturmböen über 60 km/h: Kranarbeiten ab 11:30 Uhr "
-            "eingestellt, Dachstuhl verschiebt sich um einen halben Tag."}, {"date", day(8)}}},
-        {5, TN::TN_DELAY, "zimmerer", {{"description", "Lieferung Konstruktionsvollholz drei Arbeitstage verspätet, "
-            "Beginn Dachstuhl am 09.03. statt am 06.03."}, {"date", day(4)}}},
-        {11, TN::TN_DELAY, "elektro", {{"description", "Unterverteilung UV-OG: Liefertermin vom Hersteller auf KW 14 "
-            "verschoben."}, {"date", day(11)}}},
-        {4, TN::TN_DEFICIENCY, "elektro", {{"description", "Leerrohre in der Innenwand zu flach verlegt, Überdeckung "
-            "unter 1 cm."}, {"roomname", "Gruppenraum 2"}, {"roombook_number", "EG.04"}, {"date", day(7)}}},
-        {6, TN::TN_DEFICIENCY, "rohbau", {{"description", "Abplatzung an der Ringbalkenkante, etwa 30 × 8 cm, "
-            "Bewehrung sichtbar."}, {"roomname", "OG Außenwand Nord, Achse 4"}, {"date", day(11)}}},
-        {10, TN::TN_DEFICIENCY, "zimmerer", {{"description", "Unterdeckbahn nicht an das Traufblech angeschlossen, "
-            "Wasser kann hinter die Rinne laufen."}, {"roomname", "Dach Nordseite, Traufe"}, {"date", day(11)}}},
-        {2, TN::TN_ACCEPTANCE, "tragwerk", {{"description", "Bewehrung Ringbalken OG Achsen A–E ohne Beanstandung."},
-            {"roomname", "OG"}}},
-        {5, TN::TN_ACCEPTANCE, "geruest", {{"description", "Fassaden- und Dachfanggerüst, Prüfprotokoll liegt vor."},
-            {"roomname", "Fassade umlaufend"}}},
-        {8, TN::TN_ACCEPTANCE, "elektro", {{"description", "Nachkontrolle Leerrohre: Mangel vom 05.03. beseitigt."},
-            {"roomname", "Gruppenraum 2"}, {"roombook_number", "EG.04"}}},
+        {1, TN::TN_OBSTRUCTION, "rohbau", {{"description", "Nachtfrost bis −3 °C: Mauerarbeiten mit "
+            "Dünnbettmörtel erst ab 10:00 Uhr möglich, Ausfall etwa 2,5 Stunden."}, {"date", day(1)}}},
+        {7, TN::TN_OBSTRUCTION, "zimmerer", {{"description", "Sturmböen über 60 km/h: Kranarbeiten ab "
+            "11:30 Uhr eingestellt, Dachstuhl verschiebt sich um einen halben Tag."}, {"date", day(8)}}},
+        {5, TN::TN_DELAY, "zimmerer", {{"description", "Lieferung Konstruktionsvollholz drei Arbeitstage "
+            "verspätet, Beginn Dachstuhl am 09.03. statt am 06.03."}, {"date", day(4)}}},
+        {11, TN::TN_DELAY, "elektro", {{"description", "Unterverteilung UV-OG: Liefertermin vom Hersteller "
+            "auf KW 14 verschoben."}, {"date", day(11)}}},
+        {4, TN::TN_DEFICIENCY, "elektro", {{"description", "Leerrohre in der Innenwand zu flach verlegt, "
+            "Überdeckung unter 1 cm."}, {"roomname", "Gruppenraum 2"}, {"roombook_number", "EG.04"},
+            {"date", day(7)}}},
+        {6, TN::TN_DEFICIENCY, "rohbau", {{"description", "Abplatzung an der Ringbalkenkante, etwa "
+            "30 × 8 cm, Bewehrung sichtbar."}, {"roomname", "OG Außenwand Nord, Achse 4"},
+            {"date", day(11)}}},
+        {10, TN::TN_DEFICIENCY, "zimmerer", {{"description", "Unterdeckbahn nicht an das Traufblech "
+            "angeschlossen, Wasser kann hinter die Rinne laufen."}, {"roomname", "Dach Nordseite, Traufe"},
+            {"date", day(11)}}},
+        {2, TN::TN_ACCEPTANCE, "tragwerk", {{"description", "Bewehrung Ringbalken OG Achsen A–E ohne "
+            "Beanstandung."}, {"roomname", "OG"}}},
+        {5, TN::TN_ACCEPTANCE, "geruest", {{"description", "Fassaden- und Dachfanggerüst, Prüfprotokoll "
+            "liegt vor."}, {"roomname", "Fassade umlaufend"}}},
+        {8, TN::TN_ACCEPTANCE, "elektro", {{"description", "Nachkontrolle Leerrohre: Mangel vom 05.03. "
+            "beseitigt."}, {"roomname", "Gruppenraum 2"}, {"roombook_number", "EG.04"}}},
         {9, TN::TN_ACCEPTANCE, "erdbau", {{"description", "Schmutzwasserleitungen S1–S4 nach bestandener "
             "Dichtheitsprüfung."}, {"roomname", "Außenanlage Nord"}}},
 
-        {1, TN::TN_DIRECTIVE, "rohbau", {{"description", "Frisches Mauerwerk über Nacht mit Folie und Dämmmatten "
-            "gegen Frost schützen."}}},
-        {4, TN::TN_DIRECTIVE, "elektro", {{"description", "Leerrohre Gruppenraum 2 tiefer setzen, vor dem Verputzen "
-            "Kontrolle durch die Bauleitung."}}},
-        {10, TN::TN_DIRECTIVE, "zimmerer", {{"description", "Anschluss Unterdeckbahn an das Traufblech Nordseite "
-            "bis 13.03. herstellen."}}},
-        {4, TN::TN_AUXILIARY_SERVICE, "rohbau", {{"description", "Kernbohrung DN 150 in der Außenwand für den "
-            "Hausanschluss, 3 Stunden, Regiebericht Nr. 7."}}},
+        {1, TN::TN_DIRECTIVE, "rohbau", {{"description", "Frisches Mauerwerk über Nacht mit Folie und "
+            "Dämmmatten gegen Frost schützen."}}},
+        {4, TN::TN_DIRECTIVE, "elektro", {{"description", "Leerrohre Gruppenraum 2 tiefer setzen, vor dem "
+            "Verputzen Kontrolle durch die Bauleitung."}}},
+        {10, TN::TN_DIRECTIVE, "zimmerer", {{"description", "Anschluss Unterdeckbahn an das Traufblech "
+            "Nordseite bis 13.03. herstellen."}}},
+        {4, TN::TN_AUXILIARY_SERVICE, "rohbau", {{"description", "Kernbohrung DN 150 in der Außenwand für "
+            "den Hausanschluss, 3 Stunden, Regiebericht Nr. 7."}}},
         {2, TN::TN_CONSTRUCTION_MEASURE, "tragwerk", {{"description", "Bewehrungsabnahme Ringbalken OG"},
-            {"timefrom", at("07:30")}, {"timeto", at("08:30")}, {"location", "OG Achsen A–E"}, {"kks", "RB-OG"}}},
+            {"timefrom", at("07:30")}, {"timeto", at("08:30")}, {"location", "OG Achsen A–E"},
+            {"kks", "RB-OG"}}},
         {3, TN::TN_CONSTRUCTION_MEASURE, "rohbau", {{"description", "Betonage Ringbalken OG"},
-            {"timefrom", at("13:30")}, {"timeto", at("15:45")}, {"location", "OG Achsen A–E"}, {"kks", "RB-OG"}}},
+            {"timefrom", at("13:30")}, {"timeto", at("15:45")}, {"location", "OG Achsen A–E"},
+            {"kks", "RB-OG"}}},
 
         {0, TN::TN_CONSTRUCTION_MATERIAL, "rohbau", {{"material", "Kalksandstein-Planelemente KS XL 17,5 cm"},
             {"quantity", 96.0}, {"unit", "m²"}, {"process", "Mauerwerk OG"}, {"material_temperature", 5},
             {"conditions", "trocken, abgedeckt gelagert"}, {"workflow", "Dünnbettmörtel, ab +5 °C"},
             {"note", "Lieferschein 44812"}}},
         {3, TN::TN_CONSTRUCTION_MATERIAL, "beton", {{"material", "Transportbeton C25/30 XC1 F3, 16 mm"},
-            {"quantity", 12.5}, {"unit", "m³"}, {"process", "Betonage Ringbalken OG"}, {"material_temperature", 14},
-            {"conditions", "Lufttemperatur 7 °C, kein Frost"}, {"workflow", "Pumpe, Innenrüttler"},
+            {"quantity", 12.5}, {"unit", "m³"}, {"process", "Betonage Ringbalken OG"},
+            {"material_temperature", 14}, {"conditions", "Lufttemperatur 7 °C, kein Frost"},
+            {"workflow", "Pumpe, Innenrüttler"},
             {"note", "Lieferscheine 118834 bis 118836, drei Probewürfel"}}},
-        {6, TN::TN_CONSTRUCTION_MATERIAL, "zimmerer", {{"material", "Konstruktionsvollholz C24"}, {"quantity", 14.2},
-            {"unit", "m³"}, {"process", "Dachstuhl"}, {"conditions", "trocken, auf Kanthölzern gelagert"},
+        {6, TN::TN_CONSTRUCTION_MATERIAL, "zimmerer", {{"material", "Konstruktionsvollholz C24"},
+            {"quantity", 14.2}, {"unit", "m³"}, {"process", "Dachstuhl"}, {"conditions", "trocken, gelagert"},
             {"workflow", "Abbund im Werk"}, {"note", "Holzfeuchte unter 15 %"}}},
         {2, TN::TN_SCHEDULED_DELIVERY, "rohbau", {{"deliverynumber", "TWP-112"}, {"deliveryindex", "C"},
             {"deliverydate", day(2)}, {"comment", "Bewehrungsplan Ringbalken OG"}}},
@@ -249,17 +267,19 @@ std::vector<Row> rows()
         {8, TN::TN_SCHEDULED_DELIVERY, "bauherr", {{"deliverynumber", "A-FE-310"}, {"deliveryindex", "A"},
             {"deliverydate", day(9)}, {"comment", "Fensterliste mit Farbmustern zur Freigabe"}}},
 
-        {0, TN::TN_TELEPHONE_NOTICE, "tga", {{"description", "Revidierte Durchbruchsplanung EG folgt bis Mittwoch."},
-            {"time", at("09:15")}}},
-        {5, TN::TN_TELEPHONE_NOTICE, "zimmerer", {{"description", "Holz kommt Montag um 7:00 Uhr, Autokran ist "
-            "bestellt."}, {"time", at("11:40")}}},
-        {10, TN::TN_CONCERN, "sanitaer", {{"description", "Bedenken gegen die Leitungsführung Heizung im Flur OG: "
-            "Abstand zur Abhangdecke für Brandschutzmanschetten zu gering."}}},
+        {0, TN::TN_TELEPHONE_NOTICE, "tga", {{"description", "Revidierte Durchbruchsplanung EG folgt bis "
+            "Mittwoch."}, {"time", at("09:15")}}},
+        {5, TN::TN_TELEPHONE_NOTICE, "zimmerer", {{"description", "Holz kommt Montag um 7:00 Uhr, Autokran "
+            "ist bestellt."}, {"time", at("11:40")}}},
+        {10, TN::TN_CONCERN, "sanitaer", {{"description", "Bedenken gegen die Leitungsführung Heizung im "
+            "Flur OG: Abstand zur Abhangdecke für Brandschutzmanschetten zu gering."}}},
 
-        {0, TN::TN_EQUIPMENT, "rohbau", {{"equipment", "Turmdrehkran 81 K"}, {"operating_zone", "Baufeld Nord"},
-            {"entry_time", at("07:00")}, {"exit_time", at("16:30")}, {"downtime", 0}}},
-        {3, TN::TN_EQUIPMENT, "beton", {{"equipment", "Autobetonpumpe 36 m"}, {"operating_zone", "Zufahrt Süd"},
-            {"entry_time", at("13:15")}, {"exit_time", at("15:45")}, {"downtime", 20},
+        {0, TN::TN_EQUIPMENT, "rohbau", {{"equipment", "Turmdrehkran 81 K"},
+            {"operating_zone", "Baufeld Nord"}, {"entry_time", at("07:00")}, {"exit_time", at("16:30")},
+            {"downtime", 0}}},
+        {3, TN::TN_EQUIPMENT, "beton", {{"equipment", "Autobetonpumpe 36 m"},
+            {"operating_zone", "Zufahrt Süd"}, {"entry_time", at("13:15")}, {"exit_time", at("15:45")},
+            {"downtime", 20},
             {"downtime_reasons", "Wartezeit auf das zweite Fahrmischerfahrzeug"}}},
         {7, TN::TN_EQUIPMENT, "zimmerer", {{"equipment", "Autokran 40 t"}, {"operating_zone", "Zufahrt Süd"},
             {"entry_time", at("07:00")}, {"exit_time", at("15:00")}, {"downtime", 210},
@@ -350,7 +370,7 @@ void drawRoof(QPainter& p)
     p.drawLine(120, 210, 900, 210); // ridge purlin
 }
 
-// The size the application stores a photo at by default.
+// Drawn at the size the application stores photos at by default.
 QImage picture(void (*draw)(QPainter&))
 {
     QImage image(1000, 750, QImage::Format_RGB32);
@@ -448,7 +468,13 @@ bool fillDiary(VDRDocument& doc)
     };
     fillList(doc.modelCompany1(), std::begin(kPersons), std::end(kPersons), true);
     fillList(doc.modelCompany2(), std::begin(kCompanies), std::end(kCompanies), false);
-    const auto company = [&](const char* key) { return QVariant(companyIds.value(QLatin1String(key))); };
+    const auto company = [&](const char* key) {
+        if (companyIds.contains(QLatin1String(key)))
+            return QVariant(companyIds.value(QLatin1String(key)));
+        std::fprintf(stderr, "vdr_makedemo: no company %s\n", key);
+        ok = false;
+        return QVariant();
+    };
 
     VDRSqlTableModel* vdr = doc.modelVdr();
     ok &=
@@ -608,7 +634,7 @@ int main(int argc, char* argv[])
         std::fprintf(stderr, "vdr_makedemo: %s existiert bereits.\n", qPrintable(target));
         return 1;
     }
-    // The builder's own settings (author code, photo size) must not reach the demo.
+    // The settings of whoever builds (the author code of new reports, say) must not reach the demo.
     QTemporaryDir settings;
     QSettings::setPath(QSettings::NativeFormat, QSettings::UserScope, settings.path());
     QSettings::setPath(QSettings::IniFormat, QSettings::UserScope, settings.path());
