@@ -72,6 +72,11 @@ QStringList VDRDiaryCheck::existingBackups(const QString& path)
     return result;
 }
 
+bool VDRDiaryCheck::isHeld(const QString& workingCopy)
+{
+    return QFileInfo::exists(workingCopy) && look(workingCopy, false).busy;
+}
+
 VDRDiaryCheck::Result VDRDiaryCheck::inspect(const QString& path)
 {
     Result r;
@@ -86,7 +91,7 @@ VDRDiaryCheck::Result VDRDiaryCheck::inspect(const QString& path)
     const QString workingCopy = VDRDocument::workingCopyPathFor(diary);
     r.workingCopyExists = QFileInfo::exists(workingCopy);
     if (r.workingCopyExists) {
-        r.workingCopyHeld = look(workingCopy, false).busy;
+        r.workingCopyHeld = isHeld(workingCopy);
         r.lockInfo = VDRDocument::readLockInfo(VDRDocument::lockInfoPathFor(diary));
     }
 

@@ -22,5 +22,7 @@ public:
     };
 
     static Result inspect(const QString& path);
+    // True when a running instance holds this working copy (read-only probe, no waiting).
+    static bool isHeld(const QString& workingCopy);
     static QStringList existingBackups(const QString& path);
 };

@@ -2,6 +2,7 @@
 #include "document/CVdShared.h"
 #include "document/CopyThread.h"
 #include "document/VDRDatabaseSchema.h"
+#include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
@@ -177,27 +178,11 @@ bool VDRDocument::saveAs(const QString& target)
         return false;
     }
     // Never overwrite a diary that another running instance has open.
-    if (QFileInfo::exists(targetWorkingCopy)) {
-        bool busy = false;
-        {
-            QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("SAVEASTEST"));
-            db.setDatabaseName(targetWorkingCopy);
-            db.setConnectOptions(QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"));
-            if (db.open()) {
-                QSqlQuery q(db);
-                busy = !q.exec(QStringLiteral("SELECT count(*) FROM sqlite_master")) &&
-                       (q.lastError().nativeErrorCode() == QLatin1String("5") ||
-                        q.lastError().nativeErrorCode() == QLatin1String("6"));
-            }
-            db.close();
-        }
-        QSqlDatabase::removeDatabase(QStringLiteral("SAVEASTEST"));
-        if (busy) {
-            VDRPrompt::warning(tr("Datenbank in Bearbeitung"),
-                               tr("Die Datei\n%1\nist in Bearbeitung und kann nicht überschrieben werden.")
-                                   .arg(nativePath(target)));
-            return false;
-        }
+    if (VDRDiaryCheck::isHeld(targetWorkingCopy)) {
+        VDRPrompt::warning(tr("Datenbank in Bearbeitung"),
+                           tr("Die Datei\n%1\nist in Bearbeitung und kann nicht überschrieben werden.")
+                               .arg(nativePath(target)));
+        return false;
     }
 
     CopyThread copy(m_workingCopyPath, target);

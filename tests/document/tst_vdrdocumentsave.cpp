@@ -6,6 +6,8 @@
 
 #include <QDir>
 #include <QSettings>
+#include <QSqlDatabase>
+#include <QSqlQuery>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -47,6 +49,7 @@ private slots:
     void leftoverOfInterruptedSaveIsRemovedOnOpening();
     void saveAsMovesWorkingCopyAndLock();
     void newDiarySavedUnderAName();
+    void saveAsNeverOverwritesADiaryInUse();
     void olderStructureAsksAndWritesCurrentVersion_data();
     void olderStructureAsksAndWritesCurrentVersion();
     void refusals_data();
@@ -307,6 +310,39 @@ void TestVDRDocumentSave::newDiarySavedUnderAName()
     QCOMPARE(projectNameIn(target), QStringLiteral("Neubau"));
     QVERIFY(doc.closeDocument());
     QCOMPARE(filesBeside(target), QStringList{"Baustelle.vd2"});
+}
+
+void TestVDRDocumentSave::saveAsNeverOverwritesADiaryInUse()
+{
+    const QString path = diary(QStringLiteral("d.vd2"));
+    const QString target = QFileInfo(path).absolutePath() + QStringLiteral("/belegt.vd2");
+    QVERIFY(createDiary(target));
+    QVERIFY(execSql(target, {"UPDATE vdr SET name = 'Kollegin arbeitet'"}));
+    const QByteArray before = fileHash(target);
+    // Another instance holds the target: its working copy is locked exclusively.
+    QVERIFY(QFile::copy(target, target + QStringLiteral(".workingcopy")));
+    {
+        QSqlDatabase holder = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("HOLDER"));
+        holder.setDatabaseName(target + QStringLiteral(".workingcopy"));
+        QVERIFY(holder.open());
+        QSqlQuery q(holder);
+        QVERIFY(q.exec("PRAGMA locking_mode = EXCLUSIVE"));
+        QVERIFY(q.exec("INSERT INTO meta (key, value) VALUES ('dummy', 'dummy')"));
+        QVERIFY(q.exec("DELETE FROM meta WHERE key = 'dummy'"));
+
+        VDRDocument doc;
+        bool showError = true;
+        QVERIFY(doc.openDocument(path, showError));
+        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"), QStringLiteral("kann nicht überschrieben werden"));
+        QCOMPARE(doc.saveDocument(target), 2);
+        QVERIFY(doc.isStateValid());
+        QCOMPARE(doc.getFilepath(), QFileInfo(path).absoluteFilePath());
+        QVERIFY(doc.closeDocument());
+        q.finish();
+        holder.close();
+    }
+    QSqlDatabase::removeDatabase(QStringLiteral("HOLDER"));
+    QCOMPARE(fileHash(target), before);
 }
 
 void TestVDRDocumentSave::olderStructureAsksAndWritesCurrentVersion_data()
