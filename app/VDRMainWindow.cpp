@@ -4,7 +4,9 @@
 #include "document/VDRDocument.h"
 #include "document/VDRFileSizeDialog.h"
 #include "document/VDRPrompt.h"
+#include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
+#include "editing/VDRCompleter.h"
 #include "editing/VDRFileSizeConfigDialog.h"
 #include "editing/VDRSpellChecker.h"
 
@@ -35,7 +37,8 @@ const char* const kWiredActions[] = {"actionFileNew",         "actionFileOpen", 
                                      "actionFileSaveAs",      "actionOpenDemoProject",  "actionFileExit",
                                      "actionViewToolbar",     "actionViewStatusbar",    "actionViewEntryList",
                                      "actionEntrySearchByDate", "actionNumberOfBackups", "actionFileSizeWarning",
-                                     "actionCompactDB",       "actionStartSpellChecking"};
+                                     "actionCompactDB",       "actionStartSpellChecking",
+                                     "actionVorschlagtexte"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB"};
 } // namespace
@@ -178,6 +181,7 @@ int VDRMainWindow::openDocument(const QString& path, bool noRecentEntry, bool no
         updateGui();
         return 2;
     }
+    syncCompleterTexts();
     updateGui();
     if (!noRecentEntry)
         addRecentFile(file);
@@ -196,6 +200,7 @@ bool VDRMainWindow::createDocument(bool hideSyncButton)
         updateGui();
         return false;
     }
+    CompleterEditor::writeNewDocumentDefaults();
     updateGui();
     return true;
 }
@@ -264,6 +269,7 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
         return 1;
     if (!target.isEmpty())
         addRecentFile(target);
+    syncCompleterTexts();
     updateGui();
     return 0;
 }
@@ -408,6 +414,7 @@ void VDRMainWindow::closeEvent(QCloseEvent* event)
         event->ignore();
         return;
     }
+    syncCompleterTexts();
     QSettings settings;
     settings.setValue(geometrySettingsKey(), saveGeometry());
     settings.setValue(windowStateSettingsKey(), saveState());
@@ -485,6 +492,16 @@ void VDRMainWindow::on_actionStartSpellChecking_triggered()
         return;
     m_spellChecker->setActive(!m_spellChecker->isActive());
     setSpellChecker(m_spellChecker);
+}
+
+void VDRMainWindow::syncCompleterTexts()
+{
+    VDRCompleter::writeAll();
+}
+
+void VDRMainWindow::on_actionVorschlagtexte_triggered()
+{
+    CompleterEditor::editCompleters(this);
 }
 
 void VDRMainWindow::on_actionCompactDB_triggered()

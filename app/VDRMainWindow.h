@@ -74,6 +74,7 @@ private slots:
     void on_actionFileSizeWarning_triggered();
     void on_actionCompactDB_triggered();
     void on_actionStartSpellChecking_triggered();
+    void on_actionVorschlagtexte_triggered();
     void slotReportDatesChanged(const QList<QDate>& dates);
 
 protected:
@@ -83,6 +84,8 @@ private:
     QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content, Qt::DockWidgetArea area);
     void connectActions();
     void checkFileSize();
+    // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).
+    void syncCompleterTexts();
 
     Ui_VDRMainWindowClass m_ui;
     VDRDocument* m_document;

@@ -5,6 +5,7 @@
 #include "app/VDRSignalWatcher.h"
 #include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
+#include "editing/VDRCompleter.h"
 #include "editing/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
 
@@ -94,6 +95,13 @@ int main(int argc, char* argv[])
         window.restoreState(settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray());
         window.show();
 
+        // Before the first document: a logout during a long opening must not kill us unprepared.
+        VDRSignalWatcher watcher;
+        QObject::connect(&watcher, &VDRSignalWatcher::terminationRequested, &window, [&window](int) {
+            window.endSession();
+            QCoreApplication::exit(0);
+        });
+
         const QString file = VDRStartup::firstDocumentPath(app.fileToOpen(), settings,
                                                            QCoreApplication::arguments().mid(1));
         const bool opened = VDRStartup::openFirstDocument(window, file);
@@ -106,12 +114,7 @@ int main(int argc, char* argv[])
 
         KeyPressEater eater;
         app.installEventFilter(&eater);
-
-        VDRSignalWatcher watcher;
-        QObject::connect(&watcher, &VDRSignalWatcher::terminationRequested, &window, [&window](int) {
-            window.endSession();
-            QCoreApplication::exit(0);
-        });
+        VDRCompleter::migrateSettings();
 
         result = app.exec();
         app.removeEventFilter(&eater);

@@ -3,6 +3,7 @@
 #include "app/KeyPressEater.h"
 #include "app/VDRMainWindow.h"
 #include "app/VDRStartup.h"
+#include "editing/VDRCompleter.h"
 #include "document/VDRDocument.h"
 
 #include <QAction>
@@ -32,6 +33,7 @@ private slots:
 
     void menusAndToolBarInOrder();
     void documentCommandsFollowTheDocument();
+    void newDiaryBringsDefaultSuggestionTexts();
     void recentFilesHoldOneEntryPerFile();
     void failedOpenFromCommandGivesNewDiary();
     void closingWithUnsavedChanges_data();
@@ -136,6 +138,23 @@ void TestVDRMainWindow::documentCommandsFollowTheDocument()
     QVERIFY(save->isEnabled());
     QVERIFY(m_window->closeDocument(false));
     QVERIFY(!save->isEnabled());
+}
+
+void TestVDRMainWindow::newDiaryBringsDefaultSuggestionTexts()
+{
+    QSettings settings;
+    settings.remove(VDRCompleter::settingsGroup());
+    m_window->ui().action(QStringLiteral("actionFileNew"))->trigger();
+    const QString group = VDRCompleter::settingsGroup();
+    QCOMPARE(settings.value(group + QStringLiteral("/Mängel/Raumname/values/size")).toInt(), 6);
+    QCOMPARE(settings.value(group + QStringLiteral("/Mängel/Raumbuch-Nr./values/1/centry")).toString(),
+             QStringLiteral("UG-001"));
+    QCOMPARE(settings.value(group + QStringLiteral("/Baustoffe/Einheit/values/size")).toInt(), 5);
+    // A list the user changed is not overwritten by the next new diary.
+    settings.setValue(group + QStringLiteral("/Baustoffe/Einheit/values/1/centry"), QStringLiteral("Sack"));
+    QVERIFY(m_window->createDocument(true));
+    QCOMPARE(settings.value(group + QStringLiteral("/Baustoffe/Einheit/values/1/centry")).toString(),
+             QStringLiteral("Sack"));
 }
 
 void TestVDRMainWindow::recentFilesHoldOneEntryPerFile()
