@@ -190,12 +190,15 @@ bool VDRDocument::saveAs(const QString& target)
         VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der Working Copy Datei."));
         return false;
     }
-    if (!m_filePath.isEmpty()) {
-        const QString documents = documentsDbPathFor(m_filePath);
-        if (QFileInfo::exists(documents) && !VDRFileOps::copyDurably(documents, documentsDbPathFor(target))) {
+    const QString documents = m_filePath.isEmpty() ? QString() : documentsDbPathFor(m_filePath);
+    if (!documents.isEmpty() && QFileInfo::exists(documents)) {
+        if (!VDRFileOps::copyDurably(documents, documentsDbPathFor(target))) {
             VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der Dokumente Datenbank."));
             return false;
         }
+    } else {
+        // The overwritten diary's documents do not belong to this one.
+        VDRFileOps::removeDatabase(documentsDbPathFor(target));
     }
     if (!writeLockInfo(targetLockInfo)) {
         VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der User Data Datei."));

@@ -289,6 +289,14 @@ void TestVDRDocumentSave::saveAsMovesWorkingCopyAndLock()
     QCOMPARE(projectNameIn(target + QStringLiteral(".bak")), QStringLiteral("Unter neuem Namen"));
     QVERIFY(doc.closeDocument());
     QCOMPARE(filesBeside(path), QStringList({"Kopie März.vd2", "Kopie März.vd2.bak", "alt.vd2"}));
+
+    // Saving a diary without documents over one with documents leaves no foreign documents behind.
+    const QString other = QFileInfo(path).absolutePath() + QStringLiteral("/Anderes.vdd");
+    QVERIFY(QFile::copy(path, other)); // any file stands in for the other diary's documents
+    QVERIFY(doc.openDocument(path, showError = true));
+    QCOMPARE(doc.saveDocument(QFileInfo(path).absolutePath() + QStringLiteral("/Anderes.vd2")), 0);
+    QVERIFY(!QFile::exists(other));
+    QVERIFY(doc.closeDocument());
 }
 
 void TestVDRDocumentSave::newDiarySavedUnderAName()
