@@ -100,7 +100,8 @@ const MenuDef kMenus[] = {
       {"actionExportMasterData", QT_TRANSLATE_NOOP("VDRMainWindow", "Stammdaten in neue Datei kopieren")}}},
     {"menuFirmenliste_Im_Export",
      QT_TRANSLATE_NOOP("VDRMainWindow", "Firmen Im-/Export"),
-     {{"actionImportExternalCompanies", QT_TRANSLATE_NOOP("VDRMainWindow", "Import aus externer Adress-Datei")},
+     {{"actionImportExternalCompanies",
+       QT_TRANSLATE_NOOP("VDRMainWindow", "Import aus externer Adress-Datei")},
       {"actionEntryImportTextCompany", QT_TRANSLATE_NOOP("VDRMainWindow", "Import aus anderem Varduna")},
       {"actionEntryExportTextCompany", QT_TRANSLATE_NOOP("VDRMainWindow", "Export")}}},
     {"menuEntry",
@@ -149,8 +150,9 @@ const MenuDef kMenus[] = {
       {"actionHelpInfoDialog", QT_TRANSLATE_NOOP("VDRMainWindow", "Info über Varduna")}}},
 };
 
-const char* const kTopLevelMenus[] = {"menuFile",   "menuDrucken",  "menuSynchronisation", "menuMasterData",
-                                      "menuEntry",  "menuSettings", "menuView",            "menuHelp"};
+const char* const kTopLevelMenus[] = {"menuFile",       "menuDrucken", "menuSynchronisation",
+                                      "menuMasterData", "menuEntry",   "menuSettings",
+                                      "menuView",       "menuHelp"};
 
 // Tool-bar-only actions and their labels.
 const Entry kToolBarOnly[] = {

@@ -2,9 +2,7 @@
 
 #include <QFileOpenEvent>
 
-VDRApplication::VDRApplication(int& argc, char** argv) : QApplication(argc, argv)
-{
-}
+VDRApplication::VDRApplication(int& argc, char** argv) : QApplication(argc, argv) {}
 
 bool VDRApplication::event(QEvent* event)
 {

@@ -33,12 +33,11 @@ VDRMainWindow* g_mainWindow = nullptr;
 
 namespace {
 // Actions whose commands are wired here; every other action waits for its feature.
-const char* const kWiredActions[] = {"actionFileNew",         "actionFileOpen",         "actionFileSave",
-                                     "actionFileSaveAs",      "actionOpenDemoProject",  "actionFileExit",
-                                     "actionViewToolbar",     "actionViewStatusbar",    "actionViewEntryList",
-                                     "actionEntrySearchByDate", "actionNumberOfBackups", "actionFileSizeWarning",
-                                     "actionCompactDB",       "actionStartSpellChecking",
-                                     "actionVorschlagtexte"};
+const char* const kWiredActions[] = {
+    "actionFileNew",         "actionFileOpen",           "actionFileSave",        "actionFileSaveAs",
+    "actionOpenDemoProject", "actionFileExit",           "actionViewToolbar",     "actionViewStatusbar",
+    "actionViewEntryList",   "actionEntrySearchByDate",  "actionNumberOfBackups", "actionFileSizeWarning",
+    "actionCompactDB",       "actionStartSpellChecking", "actionVorschlagtexte"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB"};
 } // namespace
@@ -55,9 +54,10 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     m_welcome->setObjectName(QStringLiteral("welcomePage"));
     m_welcome->setAlignment(Qt::AlignCenter);
     m_welcome->setWordWrap(true);
-    m_welcome->setText(tr("<h2>Willkommen bei Varduna</h2><p>Legen Sie mit <b>Datei - Neu</b> ein neues "
-                          "Bautagebuch an, öffnen Sie mit <b>Datei - Öffnen</b> ein vorhandenes oder sehen Sie sich "
-                          "mit <b>Datei - Musterprojekt öffnen</b> ein Beispiel an.</p>"));
+    m_welcome->setText(
+        tr("<h2>Willkommen bei Varduna</h2><p>Legen Sie mit <b>Datei - Neu</b> ein neues "
+           "Bautagebuch an, öffnen Sie mit <b>Datei - Öffnen</b> ein vorhandenes oder sehen Sie sich "
+           "mit <b>Datei - Musterprojekt öffnen</b> ein Beispiel an.</p>"));
     m_reportPage->setObjectName(QStringLiteral("reportPage"));
     m_reportPage->setAlignment(Qt::AlignCenter);
     m_central->addWidget(m_welcome);
@@ -79,7 +79,8 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
                                          {QT_TR_NOOP("Bilder Baustoffe"), "dockWidgetPhotos5"}};
     QDockWidget* firstPhotoDock = nullptr;
     for (const auto& dock : photoDocks) {
-        QDockWidget* d = addDock(tr(dock[0]), QLatin1String(dock[1]), new QWidget(this), Qt::RightDockWidgetArea);
+        QDockWidget* d =
+            addDock(tr(dock[0]), QLatin1String(dock[1]), new QWidget(this), Qt::RightDockWidgetArea);
         if (firstPhotoDock)
             tabifyDockWidget(firstPhotoDock, d);
         else
@@ -88,8 +89,8 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     tabifyDockWidget(firstPhotoDock, addDock(tr("Druck-Ansicht"), QStringLiteral("dockWidgetPreview"),
                                              new QWidget(this), Qt::RightDockWidgetArea));
     firstPhotoDock->raise();
-    QDockWidget* search =
-        addDock(tr("Volltextsuche"), QStringLiteral("dockWidgetSearch"), new QWidget(this), Qt::BottomDockWidgetArea);
+    QDockWidget* search = addDock(tr("Volltextsuche"), QStringLiteral("dockWidgetSearch"), new QWidget(this),
+                                  Qt::BottomDockWidgetArea);
     resizeDocks({m_dockEntryList, firstPhotoDock}, {320, 320}, Qt::Horizontal);
     resizeDocks({search}, {120}, Qt::Vertical);
 
@@ -155,8 +156,8 @@ void VDRMainWindow::connectActions()
 
 QString VDRMainWindow::demoProjectPath()
 {
-    return QDir(QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects")).absoluteFilePath(
-        QStringLiteral("Ejemplo.vd2"));
+    return QDir(QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects"))
+        .absoluteFilePath(QStringLiteral("Ejemplo.vd2"));
 }
 
 int VDRMainWindow::openDocument(const QString& path, bool noRecentEntry, bool noSaveQuestion)
@@ -177,7 +178,8 @@ int VDRMainWindow::openDocument(const QString& path, bool noRecentEntry, bool no
     bool showError = true;
     if (!m_document->openDocument(file, showError)) {
         if (showError)
-            VDRPrompt::critical(tr("Fehler"), tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+            VDRPrompt::critical(tr("Fehler"),
+                                tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
         updateGui();
         return 2;
     }
@@ -196,7 +198,8 @@ bool VDRMainWindow::createDocument(bool hideSyncButton)
     if (!closeDocument(false))
         return false;
     if (!m_document->createDocument(hideSyncButton)) {
-        VDRPrompt::critical(tr("Fehler"), tr("Beim Erstellen eines neuen Dokuments ist ein Fehler aufgetreten!"));
+        VDRPrompt::critical(tr("Fehler"),
+                            tr("Beim Erstellen eines neuen Dokuments ist ein Fehler aufgetreten!"));
         updateGui();
         return false;
     }
@@ -212,12 +215,13 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
     const QString file = m_document->getFilepath();
     const bool readOnly = !file.isEmpty() && QFileInfo::exists(file) && !QFileInfo(file).isWritable();
     if (!saveAs && readOnly && withoutQuestion) {
-        const int choice = VDRPrompt::instance()->choose(
-            VDRPrompt::Question, tr("Dokument speichern"),
-            tr("Das Dokument kann nicht gespeichert werden, da die Datei\n%1\nschreibgeschützt ist.\n\nMöchten Sie "
-               "die Änderungen in einer neuen Datei speichern?")
-                .arg(QDir::toNativeSeparators(file)),
-            {tr("Speichern unter"), tr("Abbrechen")}, 0, 1);
+        const int choice =
+            VDRPrompt::instance()->choose(VDRPrompt::Question, tr("Dokument speichern"),
+                                          tr("Das Dokument kann nicht gespeichert werden, da die "
+                                             "Datei\n%1\nschreibgeschützt ist.\n\nMöchten Sie "
+                                             "die Änderungen in einer neuen Datei speichern?")
+                                              .arg(QDir::toNativeSeparators(file)),
+                                          {tr("Speichern unter"), tr("Abbrechen")}, 0, 1);
         if (choice != 0)
             return 1;
         saveAs = true;
@@ -240,7 +244,8 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
         } else {
             const int choice = VDRPrompt::instance()->choose(
                 VDRPrompt::Question, tr("Dokument geändert"),
-                tr("Das Dokument wurde geändert.\nDie Datei \n%1\nist jedoch schreibgeschützt.\n\nMöchten Sie die "
+                tr("Das Dokument wurde geändert.\nDie Datei \n%1\nist jedoch schreibgeschützt.\n\nMöchten "
+                   "Sie die "
                    "Änderungen in einer neuen Datei speichern?")
                     .arg(QDir::toNativeSeparators(file)),
                 {tr("Speichern unter"), tr("Verwerfen"), tr("Abbrechen")}, 0, 2);
@@ -344,7 +349,8 @@ void VDRMainWindow::updateGui()
     m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_reportPage) : m_welcome);
     QString title = tr("Varduna");
     if (valid) {
-        const QString name = m_document->isStateNew() ? tr("Neues Dokument") : QFileInfo(m_document->getFilepath()).fileName();
+        const QString name =
+            m_document->isStateNew() ? tr("Neues Dokument") : QFileInfo(m_document->getFilepath()).fileName();
         title = tr("Varduna - %1").arg(name);
         if (m_document->isDemoProject())
             title += tr(" (Musterprojekt)");
@@ -370,7 +376,8 @@ void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
     const QSqlRecord record = model->record();
     for (int c = 0; c < record.count(); ++c) {
         const QString field = record.fieldName(c);
-        m_entryList->setColumnHidden(c, field != QLatin1String("number") && field != QLatin1String("inspection_date"));
+        m_entryList->setColumnHidden(c, field != QLatin1String("number") &&
+                                            field != QLatin1String("inspection_date"));
     }
     model->setHeaderData(QStringLiteral("number"), Qt::Horizontal, tr("Nr."));
     model->setHeaderData(QStringLiteral("inspection_date"), Qt::Horizontal, tr("Datum"));
@@ -483,7 +490,8 @@ void VDRMainWindow::setSpellChecker(VDRSpellChecker* checker)
     m_spellChecker = checker;
     QAction* action = m_ui.action(QStringLiteral("actionStartSpellChecking"));
     action->setEnabled(checker && checker->isValid());
-    action->setText(checker && checker->isActive() ? tr("Rechtschreibprüfung aus") : tr("Rechtschreibprüfung ein"));
+    action->setText(checker && checker->isActive() ? tr("Rechtschreibprüfung aus")
+                                                   : tr("Rechtschreibprüfung ein"));
 }
 
 void VDRMainWindow::on_actionStartSpellChecking_triggered()
@@ -508,21 +516,24 @@ void VDRMainWindow::on_actionCompactDB_triggered()
 {
     const QString title = tr("Datenbank bereinigen");
     if (m_document->isDemoProject()) {
-        VDRPrompt::information(title, tr("Eine Bereinigung der Datenbank ist für das Musterprojekt nicht möglich."));
+        VDRPrompt::information(title,
+                               tr("Eine Bereinigung der Datenbank ist für das Musterprojekt nicht möglich."));
         return;
     }
-    QString text = tr(" Verringern der Datenbankgröße durch Bereinigung der Datenbank\n\nBestimmte Datenbankvorgänge, "
-                      "wie z.B. das Löschen von Daten, führen zur Fragmentierung der Datenbank-Datei.\nDurch das "
-                      "Bereinigen der Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
-                      "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann, insbesondere nach dem "
-                      "Löschen von Fotos, zu einer z.T. erheblichen Reduzierung der Dateigröße führen.\n");
+    QString text =
+        tr(" Verringern der Datenbankgröße durch Bereinigung der Datenbank\n\nBestimmte Datenbankvorgänge, "
+           "wie z.B. das Löschen von Daten, führen zur Fragmentierung der Datenbank-Datei.\nDurch das "
+           "Bereinigen der Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
+           "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann, insbesondere nach dem "
+           "Löschen von Fotos, zu einer z.T. erheblichen Reduzierung der Dateigröße führen.\n");
     QString confirm = tr("Datenbank bereinigen");
     if (m_document->isStateModified()) {
         text += tr("Das Dokument wurde geändert.\nVor dem Bereinigen der Datenbank werden die Änderungen "
                    "gespeichert.\n");
         confirm = tr("Speichern und Bereinigen der Datenbank");
     }
-    if (VDRPrompt::instance()->choose(VDRPrompt::Question, title, text, {confirm, tr("Abbrechen")}, 0, 1) != 0)
+    if (VDRPrompt::instance()->choose(VDRPrompt::Question, title, text, {confirm, tr("Abbrechen")}, 0, 1) !=
+        0)
         return;
     // A new diary has no file to compact into yet: it is saved under a name first.
     if (m_document->isStateNew() && saveDocument(true, true) != 0)

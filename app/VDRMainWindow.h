@@ -81,7 +81,8 @@ protected:
     void closeEvent(QCloseEvent* event) override;
 
 private:
-    QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content, Qt::DockWidgetArea area);
+    QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content,
+                         Qt::DockWidgetArea area);
     void connectActions();
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).

@@ -5,7 +5,8 @@
 #include <QFileInfo>
 #include <QSettings>
 
-QString VDRStartup::firstDocumentPath(const QString& desktopFile, QSettings& settings, const QStringList& arguments)
+QString VDRStartup::firstDocumentPath(const QString& desktopFile, QSettings& settings,
+                                      const QStringList& arguments)
 {
     if (!desktopFile.isEmpty())
         return desktopFile;
@@ -33,7 +34,8 @@ bool VDRStartup::openFirstDocument(VDRMainWindow& window, const QString& path)
     return window.openDocument(path, false, true) == 0;
 }
 
-QPair<QString, QStringList> VDRStartup::restartCommand(const QStringList& arguments, const QString& executable)
+QPair<QString, QStringList> VDRStartup::restartCommand(const QStringList& arguments,
+                                                       const QString& executable)
 {
     QStringList rest = arguments.mid(1);
     if (rest.isEmpty())

@@ -65,7 +65,7 @@ int main(int argc, char* argv[])
     settings.setValue(QStringLiteral("language"), language);
     const auto chosen = QLocale::Language(language);
     const QLocale locale{chosen, chosen == QLocale::system().language() ? QLocale::system().country()
-                                                                         : QLocale::AnyCountry};
+                                                                        : QLocale::AnyCountry};
     QLocale::setDefault(locale);
     installTranslators(app, locale);
 
@@ -75,13 +75,15 @@ int main(int argc, char* argv[])
     const QString dictionaries = QCoreApplication::applicationDirPath() + QStringLiteral("/../Dictionaries/");
     const QString suffix = VDRSpellChecker::dictionarySuffix(locale.language(), locale.country());
     VDRSpellChecker spellChecker(dictionaries + QStringLiteral("vdr_") + suffix,
-                                 dictionaries + QStringLiteral("vdr_userDict_") + suffix + QStringLiteral(".txt"));
+                                 dictionaries + QStringLiteral("vdr_userDict_") + suffix +
+                                     QStringLiteral(".txt"));
     settings.remove(QStringLiteral("spellCheckerDialogX"));
     settings.remove(QStringLiteral("spellCheckerDialogY"));
 
     if (!QSqlDatabase::drivers().contains(QStringLiteral("QSQLITE"))) {
-        VDRPrompt::critical(QObject::tr("Fehler"), QObject::tr("Ihre QT-Installation unterstützt SQLITE nicht. Bitte "
-                                                               "kontaktieren Sie den Softwarehersteller."));
+        VDRPrompt::critical(QObject::tr("Fehler"),
+                            QObject::tr("Ihre QT-Installation unterstützt SQLITE nicht. Bitte "
+                                        "kontaktieren Sie den Softwarehersteller."));
         return 1;
     }
 
@@ -102,8 +104,8 @@ int main(int argc, char* argv[])
             QCoreApplication::exit(0);
         });
 
-        const QString file = VDRStartup::firstDocumentPath(app.fileToOpen(), settings,
-                                                           QCoreApplication::arguments().mid(1));
+        const QString file =
+            VDRStartup::firstDocumentPath(app.fileToOpen(), settings, QCoreApplication::arguments().mid(1));
         const bool opened = VDRStartup::openFirstDocument(window, file);
         QObject::connect(&app, &QGuiApplication::lastWindowClosed, &app, &QCoreApplication::quit);
         QObject::connect(&app, &VDRApplication::fileOpenRequested, &window,
@@ -122,8 +124,8 @@ int main(int argc, char* argv[])
     VDRPrompt::setInstance(nullptr);
 
     if (result == kRestartExitCode) {
-        const auto command =
-            VDRStartup::restartCommand(QCoreApplication::arguments(), QCoreApplication::applicationFilePath());
+        const auto command = VDRStartup::restartCommand(QCoreApplication::arguments(),
+                                                        QCoreApplication::applicationFilePath());
         QProcess::startDetached(command.first, command.second);
         return 0;
     }

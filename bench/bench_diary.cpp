@@ -17,10 +17,10 @@
 #include <QPainter>
 #include <QProcess>
 #include <QRandomGenerator>
+#include <QSettings>
 #include <QSqlDatabase>
 #include <QSqlError>
 #include <QSqlQuery>
-#include <QSettings>
 #include <QTemporaryDir>
 #include <QTextStream>
 #include <QThreadPool>
@@ -59,7 +59,8 @@ QByteArray photo(int seed, int width, int height)
     for (int i = 0; i < 400; ++i) {
         p.setPen(QColor::fromRgb(rng.generate()));
         p.setBrush(QColor::fromRgb(rng.generate()));
-        p.drawEllipse(int(rng.bounded(width)), int(rng.bounded(height)), int(rng.bounded(200)), int(rng.bounded(200)));
+        p.drawEllipse(int(rng.bounded(width)), int(rng.bounded(height)), int(rng.bounded(200)),
+                      int(rng.bounded(200)));
     }
     p.end();
     QByteArray bytes;
@@ -102,11 +103,15 @@ bool generate(const QString& path, int reports, int photos)
         q.exec(QStringLiteral("DELETE FROM entry"));
         QSqlQuery entry(db);
         entry.prepare(QStringLiteral(
-            "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, inspection_time_to, env_time, "
-            "env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, deficiencies, tests, "
+            "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+            "inspection_time_to, env_time, "
+            "env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, "
+            "deficiencies, tests, "
             "interventions, special_incidents, construction_material_sample, notice, print_notice, "
-            "print_telephone_notice, progress_audio_id, user_id, exported_by_app) VALUES (?, ?, ?, ?, '07:30:00.000', "
-            "'16:15:00.000', '08:00:00.000', 'sonnig', 'trocken', 'windstill', '14', '60', ?, '', '', '', '', 0, '', 1, "
+            "print_telephone_notice, progress_audio_id, user_id, exported_by_app) VALUES (?, ?, ?, ?, "
+            "'07:30:00.000', "
+            "'16:15:00.000', '08:00:00.000', 'sonnig', 'trocken', 'windstill', '14', '60', ?, '', '', '', "
+            "'', 0, '', 1, "
             "1, 0, 'BL', 0)"));
         QSqlQuery row(db);
         int id = 0;
@@ -114,8 +119,9 @@ bool generate(const QString& path, int reports, int photos)
             row.prepare(sql);
             return exec(row);
         };
-        const QString progress = QStringLiteral("Rohbauarbeiten im 2. OG fortgesetzt, Schalung der Decke über EG "
-                                                "abgeschlossen, Bewehrung geprüft und abgenommen. ");
+        const QString progress =
+            QStringLiteral("Rohbauarbeiten im 2. OG fortgesetzt, Schalung der Decke über EG "
+                           "abgeschlossen, Bewehrung geprüft und abgenommen. ");
         for (int r = 1; ok && r <= reports; ++r) {
             entry.addBindValue(r);
             entry.addBindValue(r < reports - 5 ? 1 : 0);
@@ -126,41 +132,74 @@ bool generate(const QString& path, int reports, int photos)
             ok = exec(entry);
             for (int i = 0; ok && i < 3; ++i) {
                 ++id;
-                ok = insert(QStringLiteral("INSERT INTO entry_attendee VALUES (%1, %2, %3, 1, 'anwesend')").arg(id).arg(r).arg(i)) &&
-                     insert(QStringLiteral("INSERT INTO entry_workforce VALUES (%1, %2, %3, 2, 'Kolonne', 4, "
-                                           "'Maurer, Polier', 32.0)").arg(id).arg(r).arg(i)) &&
-                     insert(QStringLiteral("INSERT INTO entry_time_recording VALUES (%1, %2, %3, %1, 4, 'Maurer', "
-                                           "'07:00:00.000', '15:30:00.000', 30, 8.0)").arg(id).arg(r).arg(i)) &&
-                     insert(QStringLiteral("INSERT INTO entry_progress VALUES (%1, %2, %3, %4, 'Riss in der "
-                                           "Außenwand Achse B, Breite ca. 0,3 mm', 2, '2021-05-01', 'Flur', 'OG-01', 0)")
-                                .arg(id).arg(r).arg(i).arg(i % 4 + 1)) &&
-                     insert(QStringLiteral("INSERT INTO entry_task VALUES (%1, %2, %3, %4, 'Gerüst prüfen lassen', 2)")
-                                .arg(id).arg(r).arg(i).arg(i % 2 + 1)) &&
-                     insert(QStringLiteral("INSERT INTO entry_constructionmaterial VALUES (%1, %2, %3, 'Beton "
-                                           "C25/30', 12.5, 'm³', 'Einbau', 2, 8, 'trocken', 'zügig', '', '')")
-                                .arg(id).arg(r).arg(i)) &&
-                     insert(QStringLiteral("INSERT INTO entry_equipment VALUES (%1, %2, %3, 'Turmdrehkran', 'Feld "
-                                           "A', 2, '07:00:00.000', '16:00:00.000', 540, 0, '', '')")
-                                .arg(id).arg(r).arg(i));
+                ok =
+                    insert(QStringLiteral("INSERT INTO entry_attendee VALUES (%1, %2, %3, 1, 'anwesend')")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)) &&
+                    insert(QStringLiteral("INSERT INTO entry_workforce VALUES (%1, %2, %3, 2, 'Kolonne', 4, "
+                                          "'Maurer, Polier', 32.0)")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)) &&
+                    insert(QStringLiteral(
+                               "INSERT INTO entry_time_recording VALUES (%1, %2, %3, %1, 4, 'Maurer', "
+                               "'07:00:00.000', '15:30:00.000', 30, 8.0)")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)) &&
+                    insert(QStringLiteral(
+                               "INSERT INTO entry_progress VALUES (%1, %2, %3, %4, 'Riss in der "
+                               "Außenwand Achse B, Breite ca. 0,3 mm', 2, '2021-05-01', 'Flur', 'OG-01', 0)")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)
+                               .arg(i % 4 + 1)) &&
+                    insert(QStringLiteral(
+                               "INSERT INTO entry_task VALUES (%1, %2, %3, %4, 'Gerüst prüfen lassen', 2)")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)
+                               .arg(i % 2 + 1)) &&
+                    insert(QStringLiteral("INSERT INTO entry_constructionmaterial VALUES (%1, %2, %3, 'Beton "
+                                          "C25/30', 12.5, 'm³', 'Einbau', 2, 8, 'trocken', 'zügig', '', '')")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i)) &&
+                    insert(QStringLiteral(
+                               "INSERT INTO entry_equipment VALUES (%1, %2, %3, 'Turmdrehkran', 'Feld "
+                               "A', 2, '07:00:00.000', '16:00:00.000', 540, 0, '', '')")
+                               .arg(id)
+                               .arg(r)
+                               .arg(i));
             }
         }
         QSqlQuery image(db);
-        image.prepare(QStringLiteral("INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
-                                     "thumbnail_ct, thumbnail_width, thumbnail_height) VALUES (?, 'image/jpeg', 1000, "
-                                     "750, ?, 'image/jpeg', 240, 180)"));
+        image.prepare(
+            QStringLiteral("INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
+                           "thumbnail_ct, thumbnail_width, thumbnail_height) VALUES (?, 'image/jpeg', 1000, "
+                           "750, ?, 'image/jpeg', 240, 180)"));
         for (int p = 1; ok && p <= photos; ++p) {
             // Bytes after the end marker keep every photo distinct without another encode.
             image.addBindValue(pictures[p % pictures.size()] + QByteArray::number(p));
             image.addBindValue(thumbnails[p % thumbnails.size()]);
             ok = exec(image);
-            ok = ok && insert(QStringLiteral("INSERT INTO entry_photo VALUES (%1, %2, %3, %4, %5, 'Foto %1', '', 2, "
-                                             "'2021-05-01', -1)")
-                                  .arg(p).arg(1 + (p - 1) % std::max(1, reports)).arg(p % 2).arg(1 + p % 5).arg(p));
+            ok =
+                ok &&
+                insert(QStringLiteral("INSERT INTO entry_photo VALUES (%1, %2, %3, %4, %5, 'Foto %1', '', 2, "
+                                      "'2021-05-01', -1)")
+                           .arg(p)
+                           .arg(1 + (p - 1) % std::max(1, reports))
+                           .arg(p % 2)
+                           .arg(1 + p % 5)
+                           .arg(p));
         }
-        for (const char* table : {"entry", "entry_attendee", "entry_workforce", "entry_time_recording", "entry_progress",
-                                  "entry_task", "entry_constructionmaterial", "entry_equipment", "entry_photo"}) {
-            q.exec(QStringLiteral("INSERT OR REPLACE INTO id_generator VALUES ('%1', (SELECT max(id) FROM %1))")
-                       .arg(QLatin1String(table)));
+        for (const char* table :
+             {"entry", "entry_attendee", "entry_workforce", "entry_time_recording", "entry_progress",
+              "entry_task", "entry_constructionmaterial", "entry_equipment", "entry_photo"}) {
+            q.exec(
+                QStringLiteral("INSERT OR REPLACE INTO id_generator VALUES ('%1', (SELECT max(id) FROM %1))")
+                    .arg(QLatin1String(table)));
         }
         ok = ok && q.exec(QStringLiteral("COMMIT"));
         db.close();
@@ -228,9 +267,9 @@ double median(QList<double> values)
 
 void report(const char* what, double ours, double baseline, qint64 readOurs, qint64 readBaseline, qint64 size)
 {
-    out() << QString::asprintf("%-8s %9.0f ms   baseline %9.0f ms   ratio %5.2f   read %5.2f x file (baseline %4.2f)\n",
-                               what, ours, baseline, ours / baseline, double(readOurs) / size,
-                               double(readBaseline) / size);
+    out() << QString::asprintf(
+        "%-8s %9.0f ms   baseline %9.0f ms   ratio %5.2f   read %5.2f x file (baseline %4.2f)\n", what, ours,
+        baseline, ours / baseline, double(readOurs) / size, double(readBaseline) / size);
     out().flush();
 }
 
@@ -262,7 +301,8 @@ int main(int argc, char* argv[])
     QTemporaryDir dir(QDir::currentPath() + QStringLiteral("/bench-XXXXXX"));
     dir.setAutoRemove(!keep);
     // Settings of its own (default backups), never the user's.
-    QSettings::setPath(QSettings::NativeFormat, QSettings::UserScope, dir.filePath(QStringLiteral("settings")));
+    QSettings::setPath(QSettings::NativeFormat, QSettings::UserScope,
+                       dir.filePath(QStringLiteral("settings")));
     if (file.isEmpty())
         file = dir.filePath(QStringLiteral("Großbaustelle.vd2"));
 
@@ -273,8 +313,8 @@ int main(int argc, char* argv[])
         return 1;
     }
     const qint64 size = QFileInfo(file).size();
-    out() << QString::asprintf("diary: %s, %.1f MB, %d reports, %d photos (generated in %.1f s)\n", qPrintable(file),
-                               size / 1e6, reports, photos, t.elapsed() / 1000.0);
+    out() << QString::asprintf("diary: %s, %.1f MB, %d reports, %d photos (generated in %.1f s)\n",
+                               qPrintable(file), size / 1e6, reports, photos, t.elapsed() / 1000.0);
     const QString copy = dir.filePath(QStringLiteral("baseline.vd2"));
 
     QList<double> openOurs, openBase, saveOurs, saveBase;
@@ -314,8 +354,9 @@ int main(int argc, char* argv[])
     }
     if (qEnvironmentVariableIsSet("BENCH_VERBOSE")) {
         for (int i = 0; i < saveOurs.size(); ++i)
-            out() << QString::asprintf("  run %d: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f)\n", i + 1,
-                                       openOurs[i], openBase[i], saveOurs[i], saveBase[i]);
+            out() << QString::asprintf(
+                "  run %d: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f)\n", i + 1, openOurs[i],
+                openBase[i], saveOurs[i], saveBase[i]);
     }
     const qint64 copyBytes = copyRead(file, copy);
     report("open", median(openOurs), median(openBase), readOpen,
@@ -340,7 +381,8 @@ int main(int argc, char* argv[])
     doc.closeDocument();
     report("compact", compact, vacuum, readCompact, vacuumBytes, size);
     QThreadPool::globalInstance()->waitForDone();
-    for (const QString& backup : QDir(QFileInfo(file).path()).entryList({QFileInfo(file).fileName() + "*.bak"}))
+    for (const QString& backup :
+         QDir(QFileInfo(file).path()).entryList({QFileInfo(file).fileName() + "*.bak"}))
         QFile::remove(QFileInfo(file).dir().filePath(backup));
     return 0;
 }

@@ -12,12 +12,15 @@ public:
     void message(Kind kind, const QString& title, const QString& text) override;
     StandardButton question(Kind kind, const QString& title, const QString& text, StandardButtons buttons,
                             StandardButton defaultButton, StandardButton escape) override;
-    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons, int defaultIndex,
-               int escapeIndex, const QString& checkBoxText, bool* checked) override;
+    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons,
+               int defaultIndex, int escapeIndex, const QString& checkBoxText, bool* checked) override;
     QString openFileName(const QString&, const QString&, const QString&) override { return {}; }
     QString saveFileName(const QString&, const QString&, const QString&) override { return {}; }
     QString existingDirectory(const QString&, const QString&) override { return {}; }
-    void beginNotice(const QString& title, const QString& text) override { message(Information, title, text); }
+    void beginNotice(const QString& title, const QString& text) override
+    {
+        message(Information, title, text);
+    }
     void endNotice() override {}
     void setBusy(bool) override {}
 

@@ -14,19 +14,21 @@
 #include <QTextStream>
 
 #include <algorithm>
-#include <numeric>
 #include <cstdio>
+#include <numeric>
 
 namespace {
 
-enum ExitCode {
+enum ExitCode
+{
     ExitOk = 0,
     ExitUsage = 1,
     ExitRefused = 2,
 };
 
 // Exit codes of 'check'.
-enum CheckExit {
+enum CheckExit
+{
     CheckOpenable = 0,
     CheckMissing = 2,
     CheckDamaged = 3,
@@ -102,8 +104,9 @@ void err(const QString& text)
 int cmdNew(const QString& file)
 {
     if (QFileInfo::exists(file)) {
-        VDRPrompt::critical(QObject::tr("Dateifehler"),
-                            QObject::tr("Die Datei\n%1\nexistiert bereits.").arg(QFileInfo(file).absoluteFilePath()));
+        VDRPrompt::critical(
+            QObject::tr("Dateifehler"),
+            QObject::tr("Die Datei\n%1\nexistiert bereits.").arg(QFileInfo(file).absoluteFilePath()));
         return ExitRefused;
     }
     VDRDocument doc;
@@ -126,8 +129,9 @@ int cmdInfo(const QString& file, bool json)
     bool showError = true;
     if (!doc.openDocument(file, showError)) {
         if (showError)
-            VDRPrompt::critical(QObject::tr("Fehler"),
-                                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+            VDRPrompt::critical(
+                QObject::tr("Fehler"),
+                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
         return ExitRefused;
     }
     VDRAllEntryTableModel* entries = doc.modelEntryAll();
@@ -145,8 +149,11 @@ int cmdInfo(const QString& file, bool json)
             QJsonObject r;
             r.insert(QStringLiteral("number"), doc.entryNumberWithUserId(row));
             r.insert(QStringLiteral("date"),
-                     entries->data(row, QStringLiteral("inspection_date"), Qt::EditRole).toDate().toString(Qt::ISODate));
-            r.insert(QStringLiteral("locked"), entries->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0);
+                     entries->data(row, QStringLiteral("inspection_date"), Qt::EditRole)
+                         .toDate()
+                         .toString(Qt::ISODate));
+            r.insert(QStringLiteral("locked"),
+                     entries->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0);
             reports.append(r);
         }
         QJsonObject o;
@@ -192,7 +199,8 @@ int cmdSave(const QString& file)
         return ExitRefused;
     const int result = doc.saveDocument(QString());
     if (result == 2)
-        VDRPrompt::critical(QObject::tr("Fehler"), QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
+        VDRPrompt::critical(QObject::tr("Fehler"),
+                            QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
     doc.closeDocument();
     if (result == 0)
         out() << QFileInfo(file).absoluteFilePath() << "\n";
@@ -206,8 +214,8 @@ int cmdCompact(const QString& file)
         return ExitRefused;
     const int result = doc.compactDB(true);
     if (result == 0)
-        out() << "Vorher: " << doc.lastCompactionSizeBefore() << " Bytes\nNachher: " << doc.lastCompactionSizeAfter()
-              << " Bytes\n";
+        out() << "Vorher: " << doc.lastCompactionSizeBefore()
+              << " Bytes\nNachher: " << doc.lastCompactionSizeAfter() << " Bytes\n";
     doc.closeDocument();
     return result == 0 ? ExitOk : result == 1 ? 3 : ExitRefused;
 }
@@ -217,8 +225,9 @@ int cmdRestore(const QString& file)
     const QString title = QObject::tr("Backup wiederherstellen");
     const QFileInfo fi(file);
     if (!fi.isFile()) {
-        VDRPrompt::critical(QObject::tr("Dateifehler"),
-                            QObject::tr("Die Datei\n%1\nexistiert nicht.").arg(QDir::toNativeSeparators(file)));
+        VDRPrompt::critical(
+            QObject::tr("Dateifehler"),
+            QObject::tr("Die Datei\n%1\nexistiert nicht.").arg(QDir::toNativeSeparators(file)));
         return ExitRefused;
     }
     const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
@@ -228,15 +237,17 @@ int cmdRestore(const QString& file)
         return ExitRefused;
     }
     if (r.status != VDRDiaryCheck::Damaged) {
-        VDRPrompt::information(title, QObject::tr("Die Datei %1 ist nicht beschädigt.").arg(QDir::toNativeSeparators(file)));
+        VDRPrompt::information(
+            title, QObject::tr("Die Datei %1 ist nicht beschädigt.").arg(QDir::toNativeSeparators(file)));
         return 4;
     }
     int count = 0;
     const QString backup = VDRDocument::getBackupFile4Restore(fi.absoluteFilePath(), count);
     if (backup.isEmpty()) {
-        VDRPrompt::critical(title, QObject::tr("Die Datei konnte nicht wiederhegestellt werden.\n") +
-                                       (count > 0 ? QObject::tr("Die Backup-Dateien sind ebenfalls beschädigt.")
-                                                  : QObject::tr("Es existieren keine Backup-Dateien.")));
+        VDRPrompt::critical(title,
+                            QObject::tr("Die Datei konnte nicht wiederhegestellt werden.\n") +
+                                (count > 0 ? QObject::tr("Die Backup-Dateien sind ebenfalls beschädigt.")
+                                           : QObject::tr("Es existieren keine Backup-Dateien.")));
         return 3;
     }
     QString newName;
@@ -253,8 +264,8 @@ int cmdRestore(const QString& file)
 int cmdCheck(const QString& file, bool json)
 {
     const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
-    static const char* const statusNames[] = {"can be opened", "missing", "damaged", "held by a running instance",
-                                              "made by a newer version"};
+    static const char* const statusNames[] = {"can be opened", "missing", "damaged",
+                                              "held by a running instance", "made by a newer version"};
     static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged, CheckHeld, CheckNewer};
     if (json) {
         QJsonObject o;
@@ -283,8 +294,8 @@ int cmdCheck(const QString& file, bool json)
     }
     out() << "Integrity: " << r.integrity << "\n";
     out() << "Dateiversion: " << (r.version.isEmpty() ? QStringLiteral("-") : r.version) << "\n";
-    out() << "Working copy: " << (r.workingCopyExists ? (r.workingCopyHeld ? "held" : "present, not held") : "none")
-          << "\n";
+    out() << "Working copy: "
+          << (r.workingCopyExists ? (r.workingCopyHeld ? "held" : "present, not held") : "none") << "\n";
     if (r.workingCopyExists) {
         if (r.lockInfo.size() >= 4)
             out() << "Lock: User: " << r.lockInfo[0] << ", Computer: " << r.lockInfo[1] << ", seit dem "

@@ -18,9 +18,7 @@ QString plainTextOf(const QString& html)
 }
 } // namespace
 
-VDRDataWidgetMapper::VDRDataWidgetMapper(QObject* parent) : QObject(parent)
-{
-}
+VDRDataWidgetMapper::VDRDataWidgetMapper(QObject* parent) : QObject(parent) {}
 
 void VDRDataWidgetMapper::setModel(VDRSqlTableModel* model)
 {

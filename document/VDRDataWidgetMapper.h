@@ -12,7 +12,11 @@ class VDRDataWidgetMapper : public QObject
 {
     Q_OBJECT
 public:
-    enum SubmitPolicy { AutoSubmit, ManualSubmit };
+    enum SubmitPolicy
+    {
+        AutoSubmit,
+        ManualSubmit
+    };
 
     explicit VDRDataWidgetMapper(QObject* parent = nullptr);
 

@@ -154,19 +154,23 @@ void upgradeProgressDate(Upgrader& u)
             extraNames << c.name;
         }
     }
-    const QString baseDefs = QStringLiteral("id INTEGER NOT NULL PRIMARY KEY,entry_id INTEGER NOT NULL,type INTEGER "
-                                            "NOT NULL,description TEXT NOT NULL,company_id INTEGER,date DATE");
-    const QString allDefs = extraDefs.isEmpty() ? baseDefs : baseDefs + QLatin1Char(',') + extraDefs.join(',');
+    const QString baseDefs =
+        QStringLiteral("id INTEGER NOT NULL PRIMARY KEY,entry_id INTEGER NOT NULL,type INTEGER "
+                       "NOT NULL,description TEXT NOT NULL,company_id INTEGER,date DATE");
+    const QString allDefs =
+        extraDefs.isEmpty() ? baseDefs : baseDefs + QLatin1Char(',') + extraDefs.join(',');
     const QString allNames = (base + extraNames).join(',');
 
     u.transaction([&] {
         u.exec(QStringLiteral("CREATE TEMPORARY TABLE entry_progress_backup(%1)").arg(allDefs));
         if (!hasDate)
             u.exec(QStringLiteral("ALTER TABLE entry_progress ADD date DATE"));
-        u.exec(QStringLiteral("INSERT INTO entry_progress_backup SELECT %1 FROM entry_progress").arg(allNames));
+        u.exec(
+            QStringLiteral("INSERT INTO entry_progress_backup SELECT %1 FROM entry_progress").arg(allNames));
         u.exec(QStringLiteral("DROP TABLE entry_progress"));
         u.exec(QStringLiteral("CREATE TABLE entry_progress(%1)").arg(allDefs));
-        u.exec(QStringLiteral("INSERT INTO entry_progress SELECT %1 FROM entry_progress_backup").arg(allNames));
+        u.exec(
+            QStringLiteral("INSERT INTO entry_progress SELECT %1 FROM entry_progress_backup").arg(allNames));
         u.exec(QStringLiteral("DROP TABLE entry_progress_backup"));
     });
 }
@@ -188,9 +192,10 @@ void upgradeTimeRecording(Upgrader& u)
     if (VDRDatabaseSchema::tableExists(u.db(), QStringLiteral("entry_time_recording")))
         return;
     u.transaction([&] {
-        u.exec(QStringLiteral("CREATE TABLE entry_time_recording (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
-                              "NULL, workforce_id INTEGER NOT NULL, person_count INTEGER, person_type TEXT NOT NULL, "
-                              "time_from TIME, time_to TIME, breaks INTEGER, hours REAL)"));
+        u.exec(QStringLiteral(
+            "CREATE TABLE entry_time_recording (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
+            "NULL, workforce_id INTEGER NOT NULL, person_count INTEGER, person_type TEXT NOT NULL, "
+            "time_from TIME, time_to TIME, breaks INTEGER, hours REAL)"));
         if (u.failed())
             return;
         const QStringList cols = VDRDatabaseSchema::columns(u.db(), QStringLiteral("entry_workforce"));
@@ -205,7 +210,8 @@ void upgradeTimeRecording(Upgrader& u)
         QSqlQuery read(u.db());
         read.setForwardOnly(true);
         const QString select =
-            QStringLiteral("SELECT id, entry_id, company_id, comment, %1, %2, %3, %4, %5, %6, %7 FROM entry_workforce")
+            QStringLiteral(
+                "SELECT id, entry_id, company_id, comment, %1, %2, %3, %4, %5, %6, %7 FROM entry_workforce")
                 .arg(col("count1"), col("type1"), col("count2"), col("type2"), col("count3"), col("type3"),
                      hasPos ? QStringLiteral("pos") : QStringLiteral("NULL"));
         if (!read.exec(select)) {
@@ -222,13 +228,15 @@ void upgradeTimeRecording(Upgrader& u)
         int counter = 0;
         {
             QSqlQuery maxId(u.db());
-            if (maxId.exec(QStringLiteral("SELECT id_counter FROM id_generator WHERE id_table = 'entry_time_recording'")) &&
+            if (maxId.exec(QStringLiteral(
+                    "SELECT id_counter FROM id_generator WHERE id_table = 'entry_time_recording'")) &&
                 maxId.next())
                 counter = maxId.value(0).toInt();
         }
         QSqlQuery insert(u.db());
-        insert.prepare(QStringLiteral("INSERT INTO entry_time_recording (id, entry_id, workforce_id, person_count, "
-                                      "person_type) VALUES (:id, :entry_id, :workforce_id, :person_count, :person_type)"));
+        insert.prepare(QStringLiteral(
+            "INSERT INTO entry_time_recording (id, entry_id, workforce_id, person_count, "
+            "person_type) VALUES (:id, :entry_id, :workforce_id, :person_count, :person_type)"));
         while (read.next()) {
             Row row;
             row.id = read.value(0);
@@ -259,15 +267,17 @@ void upgradeTimeRecording(Upgrader& u)
         read.finish();
         if (counter > 0) {
             u.exec(QStringLiteral("DELETE FROM id_generator WHERE id_table = 'entry_time_recording'"));
-            u.exec(QStringLiteral("INSERT INTO id_generator (id_table, id_counter) VALUES ('entry_time_recording', %1)")
+            u.exec(QStringLiteral(
+                       "INSERT INTO id_generator (id_table, id_counter) VALUES ('entry_time_recording', %1)")
                        .arg(counter));
         }
 
         const QString posDef = hasPos ? QStringLiteral(", pos INTEGER NOT NULL DEFAULT 0") : QString();
-        const QString layout = QStringLiteral("id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, company_id "
-                                              "INTEGER, comment TEXT NOT NULL, person_count INTEGER NOT NULL, "
-                                              "person_type TEXT NOT NULL, man_hours REAL") +
-                               posDef;
+        const QString layout =
+            QStringLiteral("id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, company_id "
+                           "INTEGER, comment TEXT NOT NULL, person_count INTEGER NOT NULL, "
+                           "person_type TEXT NOT NULL, man_hours REAL") +
+            posDef;
         // The old rows are held in memory while the table is rebuilt.
         u.exec(QStringLiteral("DROP TABLE entry_workforce"));
         u.exec(QStringLiteral("CREATE TABLE entry_workforce (%1)").arg(layout));
@@ -308,13 +318,15 @@ void upgradeMaterial(Upgrader& u)
     auto okText = [&](const char* textCol, const char* flagCol) {
         if (!has(flagCol))
             return text(textCol);
-        return QStringLiteral("CASE WHEN %1 THEN 'OK, ' || %2 ELSE %2 END").arg(QLatin1String(flagCol), text(textCol));
+        return QStringLiteral("CASE WHEN %1 THEN 'OK, ' || %2 ELSE %2 END")
+            .arg(QLatin1String(flagCol), text(textCol));
     };
     const bool hasPos = has("pos");
     const QString layout =
-        QStringLiteral("id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, material TEXT NOT NULL, quantity "
-                       "REAL, unit TEXT, process TEXT NOT NULL, company_id INTEGER, material_temperature INTEGER NOT "
-                       "NULL, conditions TEXT NOT NULL, workflow TEXT NOT NULL, note TEXT NOT NULL, document TEXT") +
+        QStringLiteral(
+            "id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, material TEXT NOT NULL, quantity "
+            "REAL, unit TEXT, process TEXT NOT NULL, company_id INTEGER, material_temperature INTEGER NOT "
+            "NULL, conditions TEXT NOT NULL, workflow TEXT NOT NULL, note TEXT NOT NULL, document TEXT") +
         (hasPos ? QStringLiteral(", pos INTEGER NOT NULL DEFAULT 0") : QString());
     const QString names = QStringLiteral("id, entry_id, material, quantity, unit, process, company_id, "
                                          "material_temperature, conditions, workflow, note, document") +
@@ -325,7 +337,8 @@ void upgradeMaterial(Upgrader& u)
             .arg(text("material"), text("process"), has("company_id") ? QStringLiteral("company_id") : "NULL",
                  has("material_temperature") ? QStringLiteral("material_temperature") : "0",
                  okText("conditions", "conditions_ok"), okText("workflow", "workflow_ok"), text("note"),
-                 has("document") ? QStringLiteral("document") : "NULL", hasPos ? QStringLiteral(", pos") : QString());
+                 has("document") ? QStringLiteral("document") : "NULL",
+                 hasPos ? QStringLiteral(", pos") : QString());
     u.transaction([&] {
         u.exec(QStringLiteral("CREATE TEMPORARY TABLE entry_constructionmaterial_backup (%1)").arg(layout));
         u.exec(QStringLiteral("INSERT INTO entry_constructionmaterial_backup (%1) %2").arg(names, select));
@@ -437,7 +450,8 @@ bool VDRDatabaseSchema::upgrade(QSqlDatabase db, bool& extended)
     u.addColumn("entry", "print_telephone_notice", "INTEGER NOT NULL DEFAULT 1");
     // 9, 10
     if (!u.failed() && !tableExists(db, "entry_telephone_notice"))
-        u.exec("CREATE TABLE entry_telephone_notice (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
+        u.exec("CREATE TABLE entry_telephone_notice (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
+               "NULL, "
                "description TEXT NOT NULL, company_id INTEGER, time TIME NOT NULL)");
     if (!u.failed() && !tableExists(db, "entry_concern"))
         u.exec("CREATE TABLE entry_concern (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
@@ -463,11 +477,13 @@ bool VDRDatabaseSchema::upgrade(QSqlDatabase db, bool& extended)
     u.addColumn("entry_progress", "roomname", "TEXT NOT NULL DEFAULT \"\"");
     u.addColumn("entry_progress", "roombook_number", "TEXT NOT NULL DEFAULT \"\"");
     // 16
-    for (const char* table : {"company", "entry_attendee", "entry_progress", "entry_task", "entry_constructionmeasure",
-                              "entry_constructionmaterial", "entry_scheduleddelivery", "entry_telephone_notice",
-                              "entry_concern", "entry_equipment", "entry_time_recording"}) {
+    for (const char* table :
+         {"company", "entry_attendee", "entry_progress", "entry_task", "entry_constructionmeasure",
+          "entry_constructionmaterial", "entry_scheduleddelivery", "entry_telephone_notice", "entry_concern",
+          "entry_equipment", "entry_time_recording"}) {
         if (!u.failed() && tableExists(db, table) && !u.hasColumn(table, "pos")) {
-            u.exec(QStringLiteral("ALTER TABLE %1 ADD pos INTEGER NOT NULL DEFAULT 0").arg(QLatin1String(table)));
+            u.exec(QStringLiteral("ALTER TABLE %1 ADD pos INTEGER NOT NULL DEFAULT 0")
+                       .arg(QLatin1String(table)));
             u.exec(QStringLiteral("UPDATE %1 SET pos=id").arg(QLatin1String(table)));
         }
     }
@@ -477,9 +493,10 @@ bool VDRDatabaseSchema::upgrade(QSqlDatabase db, bool& extended)
     u.addColumn("entry", "progress_audio_id", "INTEGER");
     // 20
     if (!u.failed() && !tableExists(db, "audio"))
-        u.exec("CREATE TABLE audio (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, recording BLOB NOT NULL, "
-               "recording_date DATE NOT NULL, recording_time TIME NOT NULL, recording_status INTEGER NOT NULL "
-               "DEFAULT 0)");
+        u.exec(
+            "CREATE TABLE audio (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, recording BLOB NOT NULL, "
+            "recording_date DATE NOT NULL, recording_time TIME NOT NULL, recording_status INTEGER NOT NULL "
+            "DEFAULT 0)");
     // 21
     if (!u.failed() && !u.hasColumn("entry", "user_id")) {
         u.exec("ALTER TABLE entry ADD user_id TEXT");

@@ -9,7 +9,10 @@ class VDRDatabaseSchema
 {
 public:
     static QString currentVersion() { return QStringLiteral("0.4"); }
-    static QString createScriptPath() { return QStringLiteral(":/VDRDatabase/Resources/database_create.sql"); }
+    static QString createScriptPath()
+    {
+        return QStringLiteral(":/VDRDatabase/Resources/database_create.sql");
+    }
 
     // Splits a script at ";" and runs every non-empty statement. The caller owns the transaction.
     // Reports failures to the user; returns false on the first failing statement.
@@ -18,7 +21,10 @@ public:
 
     // Compares "major.minor" texts numerically: <0, 0 or >0. Missing parts count as 0.
     static int compareVersions(const QString& a, const QString& b);
-    static bool isNewerThanCurrent(const QString& version) { return compareVersions(version, currentVersion()) > 0; }
+    static bool isNewerThanCurrent(const QString& version)
+    {
+        return compareVersions(version, currentVersion()) > 0;
+    }
 
     // Applies every upgrade step whose condition holds. 'extended' tells whether any did.
     // An SQL failure is shown as "SQL Error" and returns false.

@@ -26,7 +26,8 @@ ReadOnlyLook look(const QString& path, bool integrity)
 {
     ReadOnlyLook result;
     {
-        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QLatin1String(kCheckConnection));
+        QSqlDatabase db =
+            QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QLatin1String(kCheckConnection));
         db.setDatabaseName(path);
         db.setConnectOptions(QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"));
         result.opened = db.open();
@@ -57,8 +58,8 @@ QStringList VDRDiaryCheck::existingBackups(const QString& path)
 {
     const QFileInfo fi(path);
     const QDir dir = fi.dir();
-    const QRegularExpression pattern(QStringLiteral("^%1(\\.(\\d+))?\\.bak$")
-                                         .arg(QRegularExpression::escape(fi.fileName())));
+    const QRegularExpression pattern(
+        QStringLiteral("^%1(\\.(\\d+))?\\.bak$").arg(QRegularExpression::escape(fi.fileName())));
     QList<QPair<int, QString>> found;
     for (const QString& name : dir.entryList(QDir::Files)) {
         const QRegularExpressionMatch m = pattern.match(name);

@@ -8,17 +8,24 @@
 class VDRDiaryCheck
 {
 public:
-    enum Status { CanBeOpened = 0, Missing, Damaged, Held, Newer };
+    enum Status
+    {
+        CanBeOpened = 0,
+        Missing,
+        Damaged,
+        Held,
+        Newer
+    };
 
     struct Result
     {
         Status status = Missing;
-        QString integrity;      // "ok" or the first problem SQLite reports
-        QString version;        // "fileversion", empty when unreadable
+        QString integrity; // "ok" or the first problem SQLite reports
+        QString version;   // "fileversion", empty when unreadable
         bool workingCopyExists = false;
         bool workingCopyHeld = false;
-        QStringList lockInfo;   // user, computer, date, time
-        QStringList backups;    // newest first
+        QStringList lockInfo; // user, computer, date, time
+        QStringList backups;  // newest first
     };
 
     static Result inspect(const QString& path);

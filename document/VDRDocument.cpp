@@ -1,10 +1,10 @@
 #include "document/VDRDocument.h"
 
+#include "document/CVdShared.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
-#include "document/CVdShared.h"
 #include "document/VDRPrompt.h"
 
 #include <QCoreApplication>
@@ -43,7 +43,8 @@ QString nativePath(const QString& path)
 class ScopedConnection
 {
 public:
-    ScopedConnection(const QString& name, const QString& path, const QString& options = QString()) : m_name(name)
+    ScopedConnection(const QString& name, const QString& path, const QString& options = QString())
+        : m_name(name)
     {
         QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), name);
         db.setDatabaseName(path);
@@ -79,9 +80,7 @@ bool hasSqliteHeader(const QString& path)
 
 } // namespace
 
-VDRDocument::VDRDocument(QObject* parent) : QObject(parent)
-{
-}
+VDRDocument::VDRDocument(QObject* parent) : QObject(parent) {}
 
 VDRDocument::~VDRDocument()
 {
@@ -178,9 +177,10 @@ QString VDRDocument::findFreeTempFile(const QString& suffix)
         qint64 uptime = 0;
         QFile f(QStringLiteral("/proc/uptime"));
         if (f.open(QIODevice::ReadOnly))
-            uptime = static_cast<qint64>(QString::fromLatin1(f.readAll()).section(QLatin1Char(' '), 0, 0).toDouble());
-        QString name = QDir::tempPath() + QStringLiteral("/vdn_temp.") + QString::number(uptime) + QLatin1Char('.') +
-                       QString::number(std::rand());
+            uptime = static_cast<qint64>(
+                QString::fromLatin1(f.readAll()).section(QLatin1Char(' '), 0, 0).toDouble());
+        QString name = QDir::tempPath() + QStringLiteral("/vdn_temp.") + QString::number(uptime) +
+                       QLatin1Char('.') + QString::number(std::rand());
         if (!suffix.isEmpty())
             name += QLatin1Char('.') + (suffix.startsWith(QLatin1Char('.')) ? suffix.mid(1) : suffix);
         if (!QFileInfo::exists(name))
@@ -365,7 +365,8 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     if (!QFileInfo::exists(workingCopy))
         return WorkingCopyAbsent;
     // A short wait covers another instance's momentary read; a held lock is held for good.
-    ScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy, QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"));
+    ScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy,
+                          QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"));
     if (!lock.isOpen()) {
         VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(lock.lastError()));
         failed = true;
@@ -391,11 +392,13 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     return integrity == QLatin1String("ok") ? WorkingCopyFree : WorkingCopyCorrupt;
 }
 
-bool VDRDocument::discardWorkingCopy(const QString& workingCopy, const QString& lockInfo, const QString& diaryPath)
+bool VDRDocument::discardWorkingCopy(const QString& workingCopy, const QString& lockInfo,
+                                     const QString& diaryPath)
 {
     VDRDocumentsDb::resetChangesOnDocumentsDb(diaryPath);
     if (!VDRFileOps::removeDatabase(workingCopy)) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
         return false;
     }
     if (!lockInfo.isEmpty() && QFileInfo::exists(lockInfo))
@@ -460,7 +463,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
             const QStringList holder = readLockInfo(lockInfo);
             QString text;
             if (holder.size() >= 4)
-                text = tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist von\nUser: %1\nComputer: "
+                text = tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist von\nUser: "
+                          "%1\nComputer: "
                           "%2\nseit dem %3 %4 Uhr.")
                            .arg(holder[0], holder[1], holder[2], holder[3]);
             else
@@ -483,10 +487,11 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     // Nobody holds the diary: what an interrupted save left beside it can go.
     cleanUpInterruptedSave(diaryPath);
     if (resume)
-        VDRPrompt::information(tr("Datei öffnen"),
-                               tr("Die letzte Bearbeitung der Varduna-Datei wurde nicht ordnungsgemäß abgeschlossen.\n"
-                                  "Der letzte Bearbeitungsstand wird geöffnet. Speichern Sie die Datei, wenn Sie diesen "
-                                  "Stand behalten wollen."));
+        VDRPrompt::information(
+            tr("Datei öffnen"),
+            tr("Die letzte Bearbeitung der Varduna-Datei wurde nicht ordnungsgemäß abgeschlossen.\n"
+               "Der letzte Bearbeitungsstand wird geöffnet. Speichern Sie die Datei, wenn Sie diesen "
+               "Stand behalten wollen."));
 
     // 4: demo project?
     {
@@ -497,7 +502,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         }
         QSqlQuery q(demo.db());
         q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
-        if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = '%1'").arg(QStringLiteral("isdp"))) && q.next())
+        if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = '%1'").arg(QStringLiteral("isdp"))) &&
+            q.next())
             m_demo = q.value(0).toInt() == 42;
     }
 
@@ -525,17 +531,20 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         const QString backup = getBackupFile4Restore(diaryPath, count);
         if (count == 0 && !hasSqliteHeader(diaryPath)) {
             // Not a database at all and nothing to restore from: nothing the user could open.
-            VDRPrompt::critical(tr("Dateifehler"), tr("Die Datei\n%1\nist keine Varduna-Datei.").arg(nativePath(path)));
+            VDRPrompt::critical(tr("Dateifehler"),
+                                tr("Die Datei\n%1\nist keine Varduna-Datei.").arg(nativePath(path)));
             showError = false;
             return false;
         }
-        const QString head = tr("Die interne Struktur der Datenbank ist beschädigt.\nWenn Sie mit dieser Datenbank "
-                                "weiterarbeiten, drohen Datenverluste!\n");
+        const QString head =
+            tr("Die interne Struktur der Datenbank ist beschädigt.\nWenn Sie mit dieser Datenbank "
+               "weiterarbeiten, drohen Datenverluste!\n");
         if (!backup.isEmpty()) {
             const QString text =
-                head + tr("Das neueste unbeschädigte Backup stammt vom %1.\nSoll dieses Backup wiederhergestellt "
-                          "werden (empfohlen)?")
-                           .arg(QLocale().toString(QFileInfo(backup).lastModified(), QLocale::ShortFormat));
+                head +
+                tr("Das neueste unbeschädigte Backup stammt vom %1.\nSoll dieses Backup wiederhergestellt "
+                   "werden (empfohlen)?")
+                    .arg(QLocale().toString(QFileInfo(backup).lastModified(), QLocale::ShortFormat));
             const int choice = VDRPrompt::instance()->choose(
                 VDRPrompt::Warning, tr("Beschädigte Datenbank-Datei"), text,
                 {tr("Backup wiederherstellen"), tr("Beschädigte Datei öffnen")}, 0, 1);
@@ -557,10 +566,11 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         } else {
             const QString middle = count > 0 ? tr("Die Backup-Dateien sind ebenfalls beschädigt.")
                                              : tr("Es existieren keine Backup-Dateien.");
-            const QString text = head + middle +
-                                 tr(" Wenn sie über Sicherungskopien dieser Datei verfügen, stellen Sie diese wieder "
-                                    "her.\nAnsonsten öffnen Sie die beschädigte Datei, kopieren die Stammdaten in eine "
-                                    "neue Datei und arbeiten mit dieser Datei weiter.");
+            const QString text =
+                head + middle +
+                tr(" Wenn sie über Sicherungskopien dieser Datei verfügen, stellen Sie diese wieder "
+                   "her.\nAnsonsten öffnen Sie die beschädigte Datei, kopieren die Stammdaten in eine "
+                   "neue Datei und arbeiten mit dieser Datei weiter.");
             const int choice =
                 VDRPrompt::instance()->choose(VDRPrompt::Warning, tr("Beschädigte Datenbank-Datei"), text,
                                               {tr("Abbrechen"), tr("Beschädigte Datei öffnen")}, 1, 0);
@@ -570,8 +580,9 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
             }
         }
     } else if (VDRDatabaseSchema::isNewerThanCurrent(fileVersion)) {
-        VDRPrompt::warning(tr("Datei öffnen"), tr("Die Datei kann nicht geöffnet werden, da sie mit einer neueren "
-                                                  "Programmversion erstellt wurde."));
+        VDRPrompt::warning(tr("Datei öffnen"),
+                           tr("Die Datei kann nicht geöffnet werden, da sie mit einer neueren "
+                              "Programmversion erstellt wurde."));
         showError = false;
         return false;
     }
@@ -589,7 +600,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
             madeWorkingCopy = VDRFileOps::copy(diaryPath, m_workingCopyPath);
         }
         if (!madeWorkingCopy) {
-            VDRPrompt::critical(tr("Dateifehler"), tr("Die Working Copy Datei konnte nicht erstellt werden."));
+            VDRPrompt::critical(tr("Dateifehler"),
+                                tr("Die Working Copy Datei konnte nicht erstellt werden."));
             const bool isDemo = m_demo;
             abandonOpening(isDemo);
             showError = false;
@@ -602,14 +614,15 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
 
     // 7: write permission. The demo is never saved, so its shipped read-only mode stays.
     if (!m_demo && !VDRFileOps::isWritable(diaryPath)) {
-        QFile::setPermissions(diaryPath, QFile::permissions(diaryPath) | QFile::ReadOwner | QFile::WriteOwner |
-                                             QFile::ReadUser | QFile::WriteUser);
+        QFile::setPermissions(diaryPath, QFile::permissions(diaryPath) | QFile::ReadOwner |
+                                             QFile::WriteOwner | QFile::ReadUser | QFile::WriteUser);
         if (!VDRFileOps::isWritable(diaryPath) && !m_demo)
-            VDRPrompt::warning(tr("Datei-Warnung"),
-                               tr("Sie haben keine Schreibrechte für die Datei %1.\nWenn Sie die Datei speichern "
-                                  "wollen, können Sie dies nur unter einem anderen Namen oder in einen anderen "
-                                  "Ordner.\nWählen Sie hierzu im Menü 'Datei' den Menüpunkt 'Speichern unter'.")
-                                   .arg(nativePath(diaryPath)));
+            VDRPrompt::warning(
+                tr("Datei-Warnung"),
+                tr("Sie haben keine Schreibrechte für die Datei %1.\nWenn Sie die Datei speichern "
+                   "wollen, können Sie dies nur unter einem anderen Namen oder in einen anderen "
+                   "Ordner.\nWählen Sie hierzu im Menü 'Datei' den Menüpunkt 'Speichern unter'.")
+                    .arg(nativePath(diaryPath)));
     }
 
     // 8: take the exclusive lock.
@@ -622,8 +635,9 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         // The dummy write only takes the lock. Synced, it would force the whole fresh copy to disk
         // here; the user's first edit syncs it anyway, and a copy broken before that holds no edits.
         q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
-        const bool locked = q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) &&
-                            q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
+        const bool locked =
+            q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) &&
+            q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
         const QSqlError error = q.lastError();
         q.exec(QStringLiteral("PRAGMA synchronous = FULL"));
         if (!locked) {
@@ -650,8 +664,9 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     // 11, 12
     // Trigger of the photo-assignment repair: entry_photo lacks relation_id before the upgrade
     // adds it. The repaired working copy has the column, so once saved the repair never runs again.
-    const bool photoAssignmentsMissing = !VDRDatabaseSchema::columns(database(), QStringLiteral("entry_photo"))
-                                              .contains(QStringLiteral("relation_id"), Qt::CaseInsensitive);
+    const bool photoAssignmentsMissing =
+        !VDRDatabaseSchema::columns(database(), QStringLiteral("entry_photo"))
+             .contains(QStringLiteral("relation_id"), Qt::CaseInsensitive);
     bool extended = false;
     if (!VDRDatabaseSchema::upgrade(database(), extended)) {
         abandonOpening(madeWorkingCopy);
@@ -659,17 +674,21 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     }
     m_structureExtended = extended;
     if (extended) {
-        QString text = tr("Sie öffnen ein Dokument, das mit einer früheren Programmversion erstellt wurde.\nDie "
-                          "Struktur des Dokuments wird jetzt erweitert.\n\nWenn Sie das Dokument speichern, wird es im "
-                          "aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht mehr mit früheren "
-                          "Programmversionen bearbeiten.\n\n");
+        QString text =
+            tr("Sie öffnen ein Dokument, das mit einer früheren Programmversion erstellt wurde.\nDie "
+               "Struktur des Dokuments wird jetzt erweitert.\n\nWenn Sie das Dokument speichern, wird es im "
+               "aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht mehr mit früheren "
+               "Programmversionen bearbeiten.\n\n");
         if (isOnSyncList(diaryPath))
-            text += tr("Für dieses Dokument ist die Synchronisation mit einem mobilen Endgerät eingeschaltet.\nUm eine "
-                       "fehlerfreie Synchronisation zu gewährleisten, müssen Sie auf dem mobilen Endgerät die neueste "
+            text += tr("Für dieses Dokument ist die Synchronisation mit einem mobilen Endgerät "
+                       "eingeschaltet.\nUm eine "
+                       "fehlerfreie Synchronisation zu gewährleisten, müssen Sie auf dem mobilen Endgerät "
+                       "die neueste "
                        "Version der Varduna-App installieren!\n");
         else
-            text += tr("Wenn Sie das Dokument mit einem mobilen Endgerät synchronisieren wollen, müssen Sie auf dem "
-                       "mobilen Endgerät die neueste Version der Varduna-App installieren!\n");
+            text += tr(
+                "Wenn Sie das Dokument mit einem mobilen Endgerät synchronisieren wollen, müssen Sie auf dem "
+                "mobilen Endgerät die neueste Version der Varduna-App installieren!\n");
         VDRPrompt::warning(tr("Datei-Warnung"), text);
     }
 
@@ -731,7 +750,8 @@ bool VDRDocument::closeDocument()
 
     bool ok = true;
     if (!workingCopy.isEmpty() && !VDRFileOps::removeDatabase(workingCopy)) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Löschen der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy)));
         ok = false;
     }
     removeTemporaryFiles();
@@ -831,4 +851,3 @@ void VDRDocument::renumberPositions()
         }
     }
 }
-

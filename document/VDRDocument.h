@@ -4,9 +4,9 @@
 
 #include <QDateTime>
 #include <QImage>
-#include <QPixmap>
 #include <QMap>
 #include <QObject>
+#include <QPixmap>
 #include <QSqlDatabase>
 #include <QStringList>
 
@@ -92,17 +92,35 @@ public:
     bool hasEntryModels(int entryId) const { return m_entryModels.contains(entryId); }
     VDRSqlTableModel* modelEntry(int entryId, VDRSqlTableModel::TABLE_NAMES table);
     QList<VDRSqlTableModel*> entryModels(int entryId);
-    VDRSqlTableModel* modelEntryAttendee(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_ATTENDEE); }
-    VDRSqlTableModel* modelEntryWorkforce(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_WORKFORCE); }
+    VDRSqlTableModel* modelEntryAttendee(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_ATTENDEE);
+    }
+    VDRSqlTableModel* modelEntryWorkforce(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_WORKFORCE);
+    }
     VDRSqlTableModel* modelEntryTimeRecording(int entryId)
     {
         return modelEntry(entryId, VDRSqlTableModel::TN_TIME_RECORDING);
     }
     VDRSqlTableModel* modelEntryDelay(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DELAY); }
-    VDRSqlTableModel* modelEntryObstruction(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_OBSTRUCTION); }
-    VDRSqlTableModel* modelEntryDfcy(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DEFICIENCY); }
-    VDRSqlTableModel* modelEntryAcceptance(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_ACCEPTANCE); }
-    VDRSqlTableModel* modelEntryPhoto1(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_PROGRESS); }
+    VDRSqlTableModel* modelEntryObstruction(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_OBSTRUCTION);
+    }
+    VDRSqlTableModel* modelEntryDfcy(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_DEFICIENCY);
+    }
+    VDRSqlTableModel* modelEntryAcceptance(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_ACCEPTANCE);
+    }
+    VDRSqlTableModel* modelEntryPhoto1(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_PROGRESS);
+    }
     VDRSqlTableModel* modelEntryPhoto2(int entryId)
     {
         return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_DEFICIENCY);
@@ -111,9 +129,18 @@ public:
     {
         return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_OBSTRUCTION);
     }
-    VDRSqlTableModel* modelEntryPhoto4(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MEASURE); }
-    VDRSqlTableModel* modelEntryPhoto5(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MATERIAL); }
-    VDRSqlTableModel* modelEntryDirective(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_DIRECTIVE); }
+    VDRSqlTableModel* modelEntryPhoto4(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MEASURE);
+    }
+    VDRSqlTableModel* modelEntryPhoto5(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_PHOTO_MATERIAL);
+    }
+    VDRSqlTableModel* modelEntryDirective(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_DIRECTIVE);
+    }
     VDRSqlTableModel* modelEntryAuxiliaryservice(int entryId)
     {
         return modelEntry(entryId, VDRSqlTableModel::TN_AUXILIARY_SERVICE);
@@ -134,8 +161,14 @@ public:
     {
         return modelEntry(entryId, VDRSqlTableModel::TN_TELEPHONE_NOTICE);
     }
-    VDRSqlTableModel* modelEntryConcern(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_CONCERN); }
-    VDRSqlTableModel* modelEntryEquipment(int entryId) { return modelEntry(entryId, VDRSqlTableModel::TN_EQUIPMENT); }
+    VDRSqlTableModel* modelEntryConcern(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_CONCERN);
+    }
+    VDRSqlTableModel* modelEntryEquipment(int entryId)
+    {
+        return modelEntry(entryId, VDRSqlTableModel::TN_EQUIPMENT);
+    }
 
     void initAddresslistModels(int listId);
     VDRSqlTableModel* modelAddresslistItem(int listId);
@@ -260,11 +293,15 @@ public:
     static QString backupName(const QString& path, int generation);
     static int numberOfBackups();
     static QString numberOfBackupsSettingsKey() { return QStringLiteral("file/NumberOfBackups"); }
-    static QString dontShowCompactDbMsgSettingsKey() { return QStringLiteral("Messages/dontShowCompactDbMsg"); }
+    static QString dontShowCompactDbMsgSettingsKey()
+    {
+        return QStringLiteral("Messages/dontShowCompactDbMsg");
+    }
 
     // Restoring a damaged diary from its backups.
     static QString getBackupFile4Restore(const QString& path, int& count);
-    static bool restoreBackupFile(const QString& path, const QString& backup, QString& newName, QString& error);
+    static bool restoreBackupFile(const QString& path, const QString& backup, QString& newName,
+                                  QString& error);
 
     // Compaction: removes unreferenced images, VACUUMs and saves. 0 done, 1 refused, 2 failed.
     int compactDB(bool showReport);
@@ -293,7 +330,13 @@ signals:
     void recentFileMissing(const QString& path);
 
 private:
-    enum LockState { WorkingCopyAbsent, WorkingCopyLocked, WorkingCopyCorrupt, WorkingCopyFree };
+    enum LockState
+    {
+        WorkingCopyAbsent,
+        WorkingCopyLocked,
+        WorkingCopyCorrupt,
+        WorkingCopyFree
+    };
     LockState probeWorkingCopy(const QString& workingCopy, bool& failed);
     bool discardWorkingCopy(const QString& workingCopy, const QString& lockInfo, const QString& diaryPath);
     bool openWorkingCopyConnection(bool showErrors);

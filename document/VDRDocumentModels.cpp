@@ -13,8 +13,9 @@ const char* const kDateTimeFormat = "yyyy-MM-ddThh:mm:ss";
 
 VDRSqlTableModel* VDRDocument::createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter)
 {
-    VDRSqlTableModel* model = table == VDRSqlTableModel::TN_ENTRY ? new VDRAllEntryTableModel(this, database())
-                                                                   : new VDRSqlTableModel(table, this, database());
+    VDRSqlTableModel* model = table == VDRSqlTableModel::TN_ENTRY
+                                  ? new VDRAllEntryTableModel(this, database())
+                                  : new VDRSqlTableModel(table, this, database());
     const QString sqlTable = VDRSqlTableModel::sqlTableName(table);
     model->setTable(sqlTable);
     model->setFilter(filter);
@@ -53,8 +54,9 @@ VDRSqlTableModel* VDRDocument::createModel(VDRSqlTableModel::TABLE_NAMES table, 
 void VDRDocument::connectIdGenerator(VDRSqlTableModel* model)
 {
     const QString table = VDRSqlTableModel::sqlTableName(model->tableNameId());
-    if (table == QLatin1String("meta") || table == QLatin1String("image") || table == QLatin1String("audio") ||
-        table == QLatin1String("id_generator") || table == QLatin1String("external_entry_number"))
+    if (table == QLatin1String("meta") || table == QLatin1String("image") ||
+        table == QLatin1String("audio") || table == QLatin1String("id_generator") ||
+        table == QLatin1String("external_entry_number"))
         return;
     connect(model, &QSqlTableModel::primeInsert, this, &VDRDocument::sqlTableIdGenerator);
 }
@@ -66,8 +68,10 @@ void VDRDocument::initModels()
     m_modelMeta = createModel(VDRSqlTableModel::TN_META, QString());
     m_modelVdr = createModel(VDRSqlTableModel::TN_VDR, QString());
     m_modelAddresslist = createModel(VDRSqlTableModel::TN_ADDRESSLIST, QString());
-    m_modelCompany1 = createModel(VDRSqlTableModel::TN_COMPANY1, QStringLiteral("category = '1' OR category = '-1'"));
-    m_modelCompany2 = createModel(VDRSqlTableModel::TN_COMPANY2, QStringLiteral("category = '2' OR category = '-2'"));
+    m_modelCompany1 =
+        createModel(VDRSqlTableModel::TN_COMPANY1, QStringLiteral("category = '1' OR category = '-1'"));
+    m_modelCompany2 =
+        createModel(VDRSqlTableModel::TN_COMPANY2, QStringLiteral("category = '2' OR category = '-2'"));
     m_modelEntryAll = static_cast<VDRAllEntryTableModel*>(createModel(VDRSqlTableModel::TN_ENTRY, QString()));
     // external_entry_number has no TABLE_NAMES value of its own and no generated ids.
     m_modelExternalEntryNumber = new VDRSqlTableModel(VDRSqlTableModel::TN_META, this, database());
@@ -83,9 +87,9 @@ void VDRDocument::destroyModels()
     m_entryModels.clear();
     qDeleteAll(m_addresslistModels);
     m_addresslistModels.clear();
-    for (VDRSqlTableModel** model : {&m_modelMeta, &m_modelVdr, &m_modelAddresslist, &m_modelCompany1, &m_modelCompany2,
-                                     reinterpret_cast<VDRSqlTableModel**>(&m_modelEntryAll),
-                                     &m_modelExternalEntryNumber}) {
+    for (VDRSqlTableModel** model :
+         {&m_modelMeta, &m_modelVdr, &m_modelAddresslist, &m_modelCompany1, &m_modelCompany2,
+          reinterpret_cast<VDRSqlTableModel**>(&m_modelEntryAll), &m_modelExternalEntryNumber}) {
         delete *model;
         *model = nullptr;
     }
@@ -96,16 +100,26 @@ void VDRDocument::initEntryModels(int entryId)
     if (m_entryModels.contains(entryId))
         return;
     static const VDRSqlTableModel::TABLE_NAMES tables[] = {
-        VDRSqlTableModel::TN_ATTENDEE,         VDRSqlTableModel::TN_WORKFORCE,
-        VDRSqlTableModel::TN_TIME_RECORDING,   VDRSqlTableModel::TN_DELAY,
-        VDRSqlTableModel::TN_OBSTRUCTION,      VDRSqlTableModel::TN_DEFICIENCY,
-        VDRSqlTableModel::TN_ACCEPTANCE,       VDRSqlTableModel::TN_PHOTO_PROGRESS,
-        VDRSqlTableModel::TN_PHOTO_DEFICIENCY, VDRSqlTableModel::TN_PHOTO_OBSTRUCTION,
-        VDRSqlTableModel::TN_PHOTO_MEASURE,    VDRSqlTableModel::TN_PHOTO_MATERIAL,
-        VDRSqlTableModel::TN_DIRECTIVE,        VDRSqlTableModel::TN_AUXILIARY_SERVICE,
-        VDRSqlTableModel::TN_CONSTRUCTION_MEASURE, VDRSqlTableModel::TN_CONSTRUCTION_MATERIAL,
-        VDRSqlTableModel::TN_SCHEDULED_DELIVERY,   VDRSqlTableModel::TN_TELEPHONE_NOTICE,
-        VDRSqlTableModel::TN_CONCERN,          VDRSqlTableModel::TN_EQUIPMENT,
+        VDRSqlTableModel::TN_ATTENDEE,
+        VDRSqlTableModel::TN_WORKFORCE,
+        VDRSqlTableModel::TN_TIME_RECORDING,
+        VDRSqlTableModel::TN_DELAY,
+        VDRSqlTableModel::TN_OBSTRUCTION,
+        VDRSqlTableModel::TN_DEFICIENCY,
+        VDRSqlTableModel::TN_ACCEPTANCE,
+        VDRSqlTableModel::TN_PHOTO_PROGRESS,
+        VDRSqlTableModel::TN_PHOTO_DEFICIENCY,
+        VDRSqlTableModel::TN_PHOTO_OBSTRUCTION,
+        VDRSqlTableModel::TN_PHOTO_MEASURE,
+        VDRSqlTableModel::TN_PHOTO_MATERIAL,
+        VDRSqlTableModel::TN_DIRECTIVE,
+        VDRSqlTableModel::TN_AUXILIARY_SERVICE,
+        VDRSqlTableModel::TN_CONSTRUCTION_MEASURE,
+        VDRSqlTableModel::TN_CONSTRUCTION_MATERIAL,
+        VDRSqlTableModel::TN_SCHEDULED_DELIVERY,
+        VDRSqlTableModel::TN_TELEPHONE_NOTICE,
+        VDRSqlTableModel::TN_CONCERN,
+        VDRSqlTableModel::TN_EQUIPMENT,
     };
     QMap<int, VDRSqlTableModel*>& models = m_entryModels[entryId];
     for (VDRSqlTableModel::TABLE_NAMES table : tables) {
@@ -136,8 +150,8 @@ void VDRDocument::initAddresslistModels(int listId)
     if (m_addresslistModels.contains(listId))
         return;
     m_addresslistModels.insert(listId, createModel(VDRSqlTableModel::TN_ADDRESSLIST_ITEM,
-                                                   QStringLiteral("addresslist_id = '") + QString::number(listId) +
-                                                       QLatin1Char('\'')));
+                                                   QStringLiteral("addresslist_id = '") +
+                                                       QString::number(listId) + QLatin1Char('\'')));
 }
 
 VDRSqlTableModel* VDRDocument::modelAddresslistItem(int listId)
@@ -166,7 +180,8 @@ void VDRDocument::sqlTableIdGenerator(int row, QSqlRecord& record)
         newId = q.value(1).toInt() + 1;
         q.finish();
         QSqlQuery update(database());
-        update.prepare(QStringLiteral("UPDATE id_generator SET id_counter = :newid WHERE id_table = :tablename"));
+        update.prepare(
+            QStringLiteral("UPDATE id_generator SET id_counter = :newid WHERE id_table = :tablename"));
         update.bindValue(QStringLiteral(":newid"), newId);
         update.bindValue(QStringLiteral(":tablename"), table);
         if (!update.exec())
@@ -174,7 +189,8 @@ void VDRDocument::sqlTableIdGenerator(int row, QSqlRecord& record)
     } else {
         q.finish();
         QSqlQuery insert(database());
-        insert.prepare(QStringLiteral("INSERT INTO id_generator (id_table, id_counter) VALUES (:tablename, 1)"));
+        insert.prepare(
+            QStringLiteral("INSERT INTO id_generator (id_table, id_counter) VALUES (:tablename, 1)"));
         insert.bindValue(QStringLiteral(":tablename"), table);
         if (!insert.exec())
             qDebug().noquote() << "id generator:" << insert.lastError().text();
@@ -231,7 +247,8 @@ bool VDRDocument::setMasterDataImportVersion(const QDateTime& version)
 {
     if (!version.isValid())
         return false;
-    return setMetaValue(QStringLiteral("masterDataImportVersion"), version.toString(QLatin1String(kDateTimeFormat)));
+    return setMetaValue(QStringLiteral("masterDataImportVersion"),
+                        version.toString(QLatin1String(kDateTimeFormat)));
 }
 
 QString VDRDocument::projectName() const

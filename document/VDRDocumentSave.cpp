@@ -77,8 +77,8 @@ void VDRDocument::cleanUpInterruptedSave(const QString& diaryPath)
     // A backup put aside by an interrupted rotation goes back where it was, if that place is free.
     const QFileInfo fi(diaryPath);
     const QDir dir = fi.absoluteDir();
-    for (const QString& name : dir.entryList({fi.fileName() + QStringLiteral("*.bak") + QLatin1String(kDropSuffix)},
-                                             QDir::Files)) {
+    for (const QString& name :
+         dir.entryList({fi.fileName() + QStringLiteral("*.bak") + QLatin1String(kDropSuffix)}, QDir::Files)) {
         const QString dropped = dir.filePath(name);
         const QString original = dropped.left(dropped.size() - int(qstrlen(kDropSuffix)));
         if (QFileInfo::exists(original))
@@ -98,7 +98,8 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (n < 1 || !QFileInfo::exists(diary)) {
         if (VDRFileOps::replaceFile(temporary, diary))
             return true;
-        VDRPrompt::critical(tr("Dateifehler"), tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
         return false;
     }
 
@@ -129,8 +130,9 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
                 continue;
             const QString to = backupName(diary, k + 1);
             if (!VDRFileOps::rename(from, to)) {
-                VDRPrompt::critical(tr("Dateifehler"),
-                                    tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(from)));
+                VDRPrompt::critical(
+                    tr("Dateifehler"),
+                    tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(from)));
                 undo(done);
                 return false;
             }
@@ -149,14 +151,16 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (!linked) {
         renamed = VDRFileOps::rename(diary, newest);
         if (!renamed) {
-            VDRPrompt::critical(tr("Dateifehler"),
-                                tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+            VDRPrompt::critical(
+                tr("Dateifehler"),
+                tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
             undo(done);
             return false;
         }
     }
     if (!VDRFileOps::replaceFile(temporary, diary)) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
         if (renamed)
             QFile::rename(newest, diary);
         else
@@ -174,7 +178,8 @@ bool VDRDocument::saveAs(const QString& target)
     const QString targetWorkingCopy = workingCopyPathFor(target);
     const QString targetLockInfo = lockInfoPathFor(target);
     if (QFileInfo::exists(target) && !VDRFileOps::isWritable(target)) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Die Datei\n%1\nkonnte nicht gelöscht werden.").arg(nativePath(target)));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Die Datei\n%1\nkonnte nicht gelöscht werden.").arg(nativePath(target)));
         return false;
     }
     // Never overwrite a diary that another running instance has open.
@@ -297,18 +302,21 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
 
     // 2: many deletions fragment the file; offer to compact it on the way.
     QSettings settings;
-    if ((m_deletedImages > 4 || m_deletedAudio > 2) && !settings.value(dontShowCompactDbMsgSettingsKey(), false).toBool()) {
+    if ((m_deletedImages > 4 || m_deletedAudio > 2) &&
+        !settings.value(dontShowCompactDbMsgSettingsKey(), false).toBool()) {
         const QString first = m_deletedImages > 4 ? tr("Es wurden mehrere Bilder gelöscht.\n")
                                                   : tr("Es wurden mehrere Diktate gelöscht.\n");
         const QString text =
-            first + tr("\nDas Löschen von Daten führt zur Fragmentierung der Datenbank-Datei.\nDurch das Bereinigen der "
-                       "Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
-                       "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann zu einer z.T. erheblichen "
-                       "Reduzierung der Dateigröße führen.\n");
+            first +
+            tr("\nDas Löschen von Daten führt zur Fragmentierung der Datenbank-Datei.\nDurch das Bereinigen "
+               "der "
+               "Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
+               "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann zu einer z.T. erheblichen "
+               "Reduzierung der Dateigröße führen.\n");
         bool dontShow = false;
-        const int choice = VDRPrompt::instance()->choose(
-            VDRPrompt::Question, tr("Speichern"), text, {tr("Datenbank bereinigen"), tr("Abbrechen")}, 0, 1,
-            tr("Diese Meldung nicht mehr anzeigen"), &dontShow);
+        const int choice = VDRPrompt::instance()->choose(VDRPrompt::Question, tr("Speichern"), text,
+                                                         {tr("Datenbank bereinigen"), tr("Abbrechen")}, 0, 1,
+                                                         tr("Diese Meldung nicht mehr anzeigen"), &dontShow);
         if (dontShow)
             settings.setValue(dontShowCompactDbMsgSettingsKey(), true);
         if (choice == 0 && !compactWorkingCopy())
@@ -316,12 +324,14 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
     }
 
     // 3
-    if (sameFile && !m_filePath.isEmpty() && QFileInfo::exists(m_filePath) && !VDRFileOps::isWritable(m_filePath)) {
-        VDRPrompt::critical(tr("Speicher-Fehler"),
-                            tr("Sie können die Datei %1 nicht speichern, da sie keine Schreibrechte besitzen.\nWählen "
-                               "Sie im Menü 'Datei' den Menüpunkt 'Speichern unter',\num die Datei unter einem anderen "
-                               "Namen oder in einen anderen Ordner zu speichern.\n")
-                                .arg(nativePath(m_filePath)));
+    if (sameFile && !m_filePath.isEmpty() && QFileInfo::exists(m_filePath) &&
+        !VDRFileOps::isWritable(m_filePath)) {
+        VDRPrompt::critical(
+            tr("Speicher-Fehler"),
+            tr("Sie können die Datei %1 nicht speichern, da sie keine Schreibrechte besitzen.\nWählen "
+               "Sie im Menü 'Datei' den Menüpunkt 'Speichern unter',\num die Datei unter einem anderen "
+               "Namen oder in einen anderen Ordner zu speichern.\n")
+                .arg(nativePath(m_filePath)));
         return 1;
     }
     // 4
@@ -329,7 +339,8 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
         const VDRPrompt::StandardButton answer = VDRPrompt::instance()->question(
             VDRPrompt::Warning, tr("Datei-Warnung"),
             tr("Das Dokument wurde mit einer früheren Programmversion erstellt.\nWenn Sie das Dokument jetzt "
-               "speichern, wird es im aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht mehr mit "
+               "speichern, wird es im aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht "
+               "mehr mit "
                "früheren Programmversionen bearbeiten.\n\nVorgang fortsetzen?"),
             VDRPrompt::Ok | VDRPrompt::Cancel, VDRPrompt::Ok, VDRPrompt::Cancel);
         if (answer != VDRPrompt::Ok)
@@ -361,8 +372,9 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
             CopyThread copy(m_workingCopyPath, m_filePath);
             copy.setReplaceTarget(false);
             if (!copy.copyAndWait()) {
-                VDRPrompt::critical(tr("Dateifehler"),
-                                    tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+                VDRPrompt::critical(
+                    tr("Dateifehler"),
+                    tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
                 return reopenAfterSave(2);
             }
             temporary = copy.temporaryFile();
@@ -376,7 +388,8 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
         if (compacted) {
             QFile::remove(m_workingCopyPath + QStringLiteral("-journal"));
             if (!VDRFileOps::copyDurably(m_filePath, m_workingCopyPath))
-                qWarning().noquote() << "working copy not replaced by the compacted diary:" << m_workingCopyPath;
+                qWarning().noquote() << "working copy not replaced by the compacted diary:"
+                                     << m_workingCopyPath;
         }
     } else {
         if (!saveAs(target))
@@ -431,7 +444,8 @@ QString VDRDocument::getBackupFile4Restore(const QString& path, int& count)
     return found;
 }
 
-bool VDRDocument::restoreBackupFile(const QString& path, const QString& backup, QString& newName, QString& error)
+bool VDRDocument::restoreBackupFile(const QString& path, const QString& backup, QString& newName,
+                                    QString& error)
 {
     const QFileInfo fi(path);
     const QString stem = fi.absolutePath() + QLatin1Char('/') + fi.completeBaseName();
@@ -452,7 +466,8 @@ bool VDRDocument::restoreBackupFile(const QString& path, const QString& backup, 
     const bool linked = VDRFileOps::link(path, newName);
     if (!linked && !VDRFileOps::rename(path, newName)) {
         QFile::remove(temporary);
-        error = tr("Die Datei %1 konnte nicht in %2 umbenannt werden.").arg(nativePath(path), nativePath(newName));
+        error = tr("Die Datei %1 konnte nicht in %2 umbenannt werden.")
+                    .arg(nativePath(path), nativePath(newName));
         return false;
     }
     if (!VDRFileOps::replaceFile(temporary, path)) {
@@ -568,12 +583,14 @@ int VDRDocument::compactDB(bool showReport)
     m_compactSizeAfter = QFileInfo(m_filePath).size();
     if (showReport) {
         if (m_compactSizeAfter < m_compactSizeBefore)
-            VDRPrompt::information(tr("Datenbank bereinigen"),
-                                   tr("Die Datenbank wurde erfolgreich bereinigt.\nDie Dateigröße wurde von %1 auf %2 "
-                                      "reduziert.")
-                                       .arg(formatFileSize(m_compactSizeBefore), formatFileSize(m_compactSizeAfter)));
+            VDRPrompt::information(
+                tr("Datenbank bereinigen"),
+                tr("Die Datenbank wurde erfolgreich bereinigt.\nDie Dateigröße wurde von %1 auf %2 "
+                   "reduziert.")
+                    .arg(formatFileSize(m_compactSizeBefore), formatFileSize(m_compactSizeAfter)));
         else
-            VDRPrompt::information(tr("Datenbank bereinigen"), tr("Die Datenbank wurde erfolgreich bereinigt.\n"));
+            VDRPrompt::information(tr("Datenbank bereinigen"),
+                                   tr("Die Datenbank wurde erfolgreich bereinigt.\n"));
     }
     return 0;
 }

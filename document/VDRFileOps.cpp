@@ -20,7 +20,8 @@ const char* const kTemporaryInfix = ".save-";
 // After a rename the directory entry must reach the disk too, or a power cut can undo it.
 void syncDirectory(const QString& path)
 {
-    const int fd = ::open(QFile::encodeName(QFileInfo(path).absolutePath()).constData(), O_RDONLY | O_DIRECTORY);
+    const int fd =
+        ::open(QFile::encodeName(QFileInfo(path).absolutePath()).constData(), O_RDONLY | O_DIRECTORY);
     if (fd >= 0) {
         ::fsync(fd);
         ::close(fd);
@@ -33,7 +34,8 @@ bool copyContents(QFile& in, QFile& out)
     const qint64 size = in.size();
     qint64 done = 0;
     while (done < size) {
-        const ssize_t n = ::copy_file_range(in.handle(), nullptr, out.handle(), nullptr, size_t(size - done), 0);
+        const ssize_t n =
+            ::copy_file_range(in.handle(), nullptr, out.handle(), nullptr, size_t(size - done), 0);
         if (n <= 0)
             break;
         done += n;
@@ -179,8 +181,8 @@ QString VDRFileOps::emptyTemporaryBeside(const QString& target)
     if (shouldFail(Copy, target))
         return QString();
     const QFileInfo fi(target);
-    QTemporaryFile file(fi.absolutePath() + QLatin1Char('/') + fi.fileName() + QLatin1String(kTemporaryInfix) +
-                        QStringLiteral("XXXXXX.tmp"));
+    QTemporaryFile file(fi.absolutePath() + QLatin1Char('/') + fi.fileName() +
+                        QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
     if (!file.open())
         return QString();
     file.setAutoRemove(false);
@@ -219,8 +221,8 @@ bool VDRFileOps::copyDurably(const QString& source, const QString& target)
 void VDRFileOps::removeInBackground(const QString& path, const QString& neighbour)
 {
     const QFileInfo fi(neighbour);
-    QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() + QLatin1String(kTemporaryInfix) +
-                        QStringLiteral("XXXXXX.tmp"));
+    QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() +
+                        QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
     if (!name.open()) {
         QFile::remove(path);
         return;

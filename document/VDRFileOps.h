@@ -10,7 +10,15 @@
 class VDRFileOps
 {
 public:
-    enum Op { Copy, Rename, Remove, Write, CheckWritable, Link };
+    enum Op
+    {
+        Copy,
+        Rename,
+        Remove,
+        Write,
+        CheckWritable,
+        Link
+    };
 
     static bool copy(const QString& source, const QString& target);
     static bool rename(const QString& source, const QString& target);

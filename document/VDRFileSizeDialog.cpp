@@ -23,12 +23,13 @@ VDRFileSizeDialog::Result VDRFileSizeDialog::exec()
     if (megabytes < 0)
         return NotDue;
     bool notAgain = false;
-    const int choice = VDRPrompt::instance()->choose(
-        VDRPrompt::Information, tr("Datei-Information"),
-        tr("Diese Datei hat eine Größe von %1 MB.\nSie können eine Folgedatei anlegen, indem Sie die Stammdaten "
-           "exportieren.")
-            .arg(megabytes),
-        {tr("OK"), tr("Abbrechen")}, 0, 1, tr("für diese Datei nicht mehr anzeigen"), &notAgain);
+    const int choice = VDRPrompt::instance()->choose(VDRPrompt::Information, tr("Datei-Information"),
+                                                     tr("Diese Datei hat eine Größe von %1 MB.\nSie können "
+                                                        "eine Folgedatei anlegen, indem Sie die Stammdaten "
+                                                        "exportieren.")
+                                                         .arg(megabytes),
+                                                     {tr("OK"), tr("Abbrechen")}, 0, 1,
+                                                     tr("für diese Datei nicht mehr anzeigen"), &notAgain);
     if (notAgain && m_document->setNoFileSizeWarning())
         m_document->saveDocument(QString());
     return choice == 0 ? ExportRequested : Dismissed;

@@ -10,7 +10,12 @@ class VDRFileSizeDialog
 {
     Q_DECLARE_TR_FUNCTIONS(VDRFileSizeDialog)
 public:
-    enum Result { NotDue, Dismissed, ExportRequested };
+    enum Result
+    {
+        NotDue,
+        Dismissed,
+        ExportRequested
+    };
 
     static QString fileSizeSettingsKey() { return QStringLiteral("file/FileSize"); }
     static int defaultFileSize() { return 100; }

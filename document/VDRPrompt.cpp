@@ -8,7 +8,10 @@ namespace {
 class LoggingPrompt : public VDRPrompt
 {
 public:
-    void message(Kind, const QString& title, const QString& text) override { qWarning().noquote() << title + ": " + text; }
+    void message(Kind, const QString& title, const QString& text) override
+    {
+        qWarning().noquote() << title + ": " + text;
+    }
     StandardButton question(Kind, const QString& title, const QString& text, StandardButtons, StandardButton,
                             StandardButton escape) override
     {

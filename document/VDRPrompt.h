@@ -10,7 +10,8 @@ class VDRPrompt
 {
 public:
     // Values match QMessageBox::StandardButton so the window's implementation can pass them on.
-    enum StandardButton {
+    enum StandardButton
+    {
         NoButton = 0x00000000,
         Ok = 0x00000400,
         Save = 0x00000800,
@@ -26,7 +27,13 @@ public:
     };
     Q_DECLARE_FLAGS(StandardButtons, StandardButton)
 
-    enum Kind { Information, Warning, Critical, Question };
+    enum Kind
+    {
+        Information,
+        Warning,
+        Critical,
+        Question
+    };
 
     virtual ~VDRPrompt();
 
@@ -39,11 +46,13 @@ public:
 
     // A question with standard buttons; returns the button chosen. 'escape' is the cancelling
     // answer, 'defaultButton' the affirmative default.
-    virtual StandardButton question(Kind kind, const QString& title, const QString& text, StandardButtons buttons,
-                                    StandardButton defaultButton, StandardButton escape) = 0;
+    virtual StandardButton question(Kind kind, const QString& title, const QString& text,
+                                    StandardButtons buttons, StandardButton defaultButton,
+                                    StandardButton escape) = 0;
 
     // A question with named buttons and an optional check box; returns the index of the button chosen.
-    // 'checked' (may be null) carries the check box state in and out; no check box when checkBoxText is empty.
+    // 'checked' (may be null) carries the check box state in and out; no check box when checkBoxText is
+    // empty.
     virtual int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons,
                        int defaultIndex, int escapeIndex, const QString& checkBoxText = QString(),
                        bool* checked = nullptr) = 0;
@@ -60,9 +69,18 @@ public:
     virtual void setBusy(bool busy) = 0;
 
     // Shorthands.
-    static void information(const QString& title, const QString& text) { instance()->message(Information, title, text); }
-    static void warning(const QString& title, const QString& text) { instance()->message(Warning, title, text); }
-    static void critical(const QString& title, const QString& text) { instance()->message(Critical, title, text); }
+    static void information(const QString& title, const QString& text)
+    {
+        instance()->message(Information, title, text);
+    }
+    static void warning(const QString& title, const QString& text)
+    {
+        instance()->message(Warning, title, text);
+    }
+    static void critical(const QString& title, const QString& text)
+    {
+        instance()->message(Critical, title, text);
+    }
 };
 
 Q_DECLARE_OPERATORS_FOR_FLAGS(VDRPrompt::StandardButtons)

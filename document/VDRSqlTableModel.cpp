@@ -168,7 +168,8 @@ int VDRSqlTableModel::last_id()
     if (column < 0)
         return result;
     for (int row = 0; row < rowCount(); ++row)
-        result = std::max(result, QSqlTableModel::data(QSqlTableModel::index(row, column), Qt::EditRole).toInt());
+        result =
+            std::max(result, QSqlTableModel::data(QSqlTableModel::index(row, column), Qt::EditRole).toInt());
     return result;
 }
 
@@ -180,7 +181,8 @@ int VDRSqlTableModel::maxPos()
     if (column < 0)
         return result;
     for (int row = 0; row < rowCount(); ++row)
-        result = std::max(result, QSqlTableModel::data(QSqlTableModel::index(row, column), Qt::EditRole).toInt());
+        result =
+            std::max(result, QSqlTableModel::data(QSqlTableModel::index(row, column), Qt::EditRole).toInt());
     return result;
 }
 
@@ -297,7 +299,8 @@ QStringList VDRSqlTableModel::distinctTexts(const QString& field)
     if (sqlTableName(m_tableName) != QLatin1String("entry_constructionmeasure"))
         return result;
     QSqlQuery q(database());
-    if (!q.exec(QStringLiteral("SELECT DISTINCT %1 FROM entry_constructionmeasure WHERE %1 IS NOT NULL ORDER BY %1")
+    if (!q.exec(QStringLiteral(
+                    "SELECT DISTINCT %1 FROM entry_constructionmeasure WHERE %1 IS NOT NULL ORDER BY %1")
                     .arg(field)))
         return result;
     while (q.next()) {

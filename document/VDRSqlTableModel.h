@@ -13,7 +13,8 @@ class VDRSqlTableModel : public QSqlTableModel
 {
     Q_OBJECT
 public:
-    enum TABLE_NAMES {
+    enum TABLE_NAMES
+    {
         TN_WORKFORCE = 0,
         TN_DELAY,
         TN_OBSTRUCTION,
@@ -46,14 +47,15 @@ public:
     Q_ENUM(TABLE_NAMES)
 
     // How the display role of a column is formatted; check-box columns also become user-checkable.
-    enum DISPLAYROLE_TYPE {
+    enum DISPLAYROLE_TYPE
+    {
         DRT_DEFAULT = 0,
-        DRT_DATE,      // dd.MM.yyyy
-        DRT_TIME,      // hh:mm
-        DRT_HOURS,     // decimal hours, two places
-        DRT_CHECKBOX,  // 0/1 shown as a check box
-        DRT_IMAGE,     // image id shown as thumbnail by the views
-        DRT_COMPANY,   // company id shown in an output format by the views
+        DRT_DATE,     // dd.MM.yyyy
+        DRT_TIME,     // hh:mm
+        DRT_HOURS,    // decimal hours, two places
+        DRT_CHECKBOX, // 0/1 shown as a check box
+        DRT_IMAGE,    // image id shown as thumbnail by the views
+        DRT_COMPANY,  // company id shown in an output format by the views
     };
     Q_ENUM(DISPLAYROLE_TYPE)
 

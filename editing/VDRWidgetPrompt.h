@@ -16,8 +16,8 @@ public:
     void message(Kind kind, const QString& title, const QString& text) override;
     StandardButton question(Kind kind, const QString& title, const QString& text, StandardButtons buttons,
                             StandardButton defaultButton, StandardButton escape) override;
-    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons, int defaultIndex,
-               int escapeIndex, const QString& checkBoxText, bool* checked) override;
+    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons,
+               int defaultIndex, int escapeIndex, const QString& checkBoxText, bool* checked) override;
     QString openFileName(const QString& title, const QString& dir, const QString& filter) override;
     QString saveFileName(const QString& title, const QString& dir, const QString& filter) override;
     QString existingDirectory(const QString& title, const QString& dir) override;

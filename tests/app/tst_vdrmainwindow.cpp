@@ -3,8 +3,8 @@
 #include "app/KeyPressEater.h"
 #include "app/VDRMainWindow.h"
 #include "app/VDRStartup.h"
-#include "editing/VDRCompleter.h"
 #include "document/VDRDocument.h"
+#include "editing/VDRCompleter.h"
 
 #include <QAction>
 #include <QDir>
@@ -93,24 +93,26 @@ void TestVDRMainWindow::menusAndToolBarInOrder()
     QStringList titles;
     for (QAction* a : m_window->menuBar()->actions())
         titles << a->text();
-    QCOMPARE(titles, QStringList({"Datei", "Drucken", "Synchronisation", "Stammdaten", "Baubericht", "Einstellungen",
-                                  "Ansicht", "Hilfe"}));
+    QCOMPARE(titles, QStringList({"Datei", "Drucken", "Synchronisation", "Stammdaten", "Baubericht",
+                                  "Einstellungen", "Ansicht", "Hilfe"}));
     QStringList file;
     for (QAction* a : m_window->ui().menu(QStringLiteral("menuFile"))->actions())
-        file << (a->isSeparator() ? QStringLiteral("-") : a->menu() ? a->menu()->objectName() : a->objectName());
+        file << (a->isSeparator() ? QStringLiteral("-")
+                 : a->menu()      ? a->menu()->objectName()
+                                  : a->objectName());
     QCOMPARE(file, QStringList({"actionFileNew", "actionFileOpen", "menuFileRecent", "actionOpenDemoProject",
-                                "menuSyncFiles", "-", "actionFileSave", "actionFileSaveAs", "-", "actionCompactDB", "-",
-                                "actionImagesExport", "actionDictationManager", "actionDataExport", "-",
-                                "actionFileExit"}));
+                                "menuSyncFiles", "-", "actionFileSave", "actionFileSaveAs", "-",
+                                "actionCompactDB", "-", "actionImagesExport", "actionDictationManager",
+                                "actionDataExport", "-", "actionFileExit"}));
     QCOMPARE(m_window->ui().action(QStringLiteral("actionStartSpellChecking"))->text(),
              QStringLiteral("Rechtschreibprüfung aus"));
     QStringList tools;
     for (QAction* a : m_window->ui().mainToolBar->actions())
         tools << (a->isSeparator() ? QStringLiteral("-") : a->objectName());
-    QCOMPARE(tools.mid(0, 11), QStringList({"actionFileNew", "actionFileOpen", "actionFileSave", "-",
-                                            "actionFilePreviewEntry", "actionFilePDFCurEntry",
-                                            "actionFilePrintEntries", "actionFilePrintCurEntry",
-                                            "actionFilePrintEmptyEntry", "actionToolbarPrintCompanyList", "-"}));
+    QCOMPARE(tools.mid(0, 11),
+             QStringList({"actionFileNew", "actionFileOpen", "actionFileSave", "-", "actionFilePreviewEntry",
+                          "actionFilePDFCurEntry", "actionFilePrintEntries", "actionFilePrintCurEntry",
+                          "actionFilePrintEmptyEntry", "actionToolbarPrintCompanyList", "-"}));
     QCOMPARE(tools.last(), QStringLiteral("actionHelpShowHelp"));
     // Commands of later features are there but not yet usable, and say so.
     QAction* later = m_window->ui().action(QStringLiteral("actionMangelListe"));
@@ -166,8 +168,10 @@ void TestVDRMainWindow::recentFilesHoldOneEntryPerFile()
     // The same file again, by a relative path.
     const QString relative = QDir::current().relativeFilePath(a);
     QCOMPARE(m_window->openDocument(relative, false, true), 0);
-    QCOMPARE(m_window->recentFiles(), QStringList({QFileInfo(a).absoluteFilePath(), QFileInfo(b).absoluteFilePath()}));
-    QCOMPARE(QSettings().value(VDRMainWindow::recentFileListSettingsKey()).toStringList(), m_window->recentFiles());
+    QCOMPARE(m_window->recentFiles(),
+             QStringList({QFileInfo(a).absoluteFilePath(), QFileInfo(b).absoluteFilePath()}));
+    QCOMPARE(QSettings().value(VDRMainWindow::recentFileListSettingsKey()).toStringList(),
+             m_window->recentFiles());
     QCOMPARE(m_window->ui().menuFileRecent->actions().first()->text(), QStringLiteral("a.vd2"));
 
     // A recent file that has gone is dropped from the list when it fails to open.
@@ -210,8 +214,8 @@ void TestVDRMainWindow::closingWithUnsavedChanges()
     QVERIFY(doc->modelVdr()->submitAll());
     VDRDocument::setGlobalModified(true);
 
-    m_prompt.expect(QStringLiteral("Dokument geändert"), QStringLiteral("Möchten Sie die Änderungen speichern?"),
-                    answer);
+    m_prompt.expect(QStringLiteral("Dokument geändert"),
+                    QStringLiteral("Möchten Sie die Änderungen speichern?"), answer);
     QCOMPARE(m_window->close(), closed);
     QCOMPARE(doc->isStateValid(), !closed);
     if (!closed) {
@@ -249,7 +253,8 @@ void TestVDRMainWindow::sessionEndKeepsUnsavedWorkForNextOpening()
     const QString path = diary(QStringLiteral("abmelden.vd2"));
     QCOMPARE(m_window->openDocument(path, false, true), 0);
     if (modified) {
-        QVERIFY(m_window->document()->modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("Nicht gespeichert")));
+        QVERIFY(m_window->document()->modelVdr()->setData(0, QStringLiteral("name"),
+                                                          QStringLiteral("Nicht gespeichert")));
         QVERIFY(m_window->document()->modelVdr()->submitAll());
         VDRDocument::setGlobalModified(true);
     }
@@ -281,7 +286,8 @@ void TestVDRMainWindow::terminationSignalEndsCleanly()
 
     QProcess check;
     check.setProcessEnvironment(env);
-    check.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"), {QStringLiteral("check"), path});
+    check.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"),
+                {QStringLiteral("check"), path});
     QVERIFY(check.waitForFinished(30000));
     QCOMPARE(check.exitCode(), 4);
 
@@ -299,12 +305,14 @@ void TestVDRMainWindow::firstDocumentRules_data()
     QTest::addColumn<QString>("reopen");
     QTest::addColumn<QStringList>("arguments");
     QTest::addColumn<QString>("expected");
-    QTest::newRow("desktop file first") << "finder.vd2" << "reopen.vd2" << QStringList{"arg.vd2"} << "finder.vd2";
+    QTest::newRow("desktop file first") << "finder.vd2"
+                                        << "reopen.vd2" << QStringList{"arg.vd2"} << "finder.vd2";
     QTest::newRow("re-open key next") << QString() << "reopen.vd2" << QStringList{"arg.vd2"} << "reopen.vd2";
     QTest::newRow("one argument") << QString() << QString() << QStringList{"arg.vd2"} << "arg.vd2";
-    QTest::newRow("-file") << QString() << QString() << QStringList{"-style", "x", "-file", "f.vd2"} << "f.vd2";
-    QTest::newRow("first -file wins") << QString() << QString() << QStringList{"-file", "a.vd2", "-file", "b.vd2"}
-                                      << "a.vd2";
+    QTest::newRow("-file") << QString() << QString() << QStringList{"-style", "x", "-file", "f.vd2"}
+                           << "f.vd2";
+    QTest::newRow("first -file wins")
+        << QString() << QString() << QStringList{"-file", "a.vd2", "-file", "b.vd2"} << "a.vd2";
     QTest::newRow("-file without path") << QString() << QString() << QStringList{"-x", "-file"} << QString();
     QTest::newRow("nothing") << QString() << QString() << QStringList() << QString();
 }
@@ -379,10 +387,12 @@ void TestVDRMainWindow::demoProjectCannotBeSaved()
     QVERIFY(m_window->recentFiles().isEmpty()); // not a recent file
     QVERIFY(m_window->windowTitle().contains(QStringLiteral("Musterprojekt")));
     for (const char* command : {"actionFileSave", "actionFileSaveAs"}) {
-        m_prompt.expect(QStringLiteral("Speichern"), QStringLiteral("Das Musterprojekt kann nicht gespeichert werden."));
+        m_prompt.expect(QStringLiteral("Speichern"),
+                        QStringLiteral("Das Musterprojekt kann nicht gespeichert werden."));
         m_window->ui().action(QLatin1String(command))->trigger();
     }
-    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("für das Musterprojekt nicht möglich"));
+    m_prompt.expect(QStringLiteral("Datenbank bereinigen"),
+                    QStringLiteral("für das Musterprojekt nicht möglich"));
     m_window->ui().action(QStringLiteral("actionCompactDB"))->trigger();
     QVERIFY(m_window->closeDocument(false));
 }

@@ -161,13 +161,14 @@ void TestCli::infoListsReports()
     const QString path = m_dir.filePath(QStringLiteral("info.vd2"));
     if (!QFile::exists(path)) {
         QVERIFY(createDiary(path));
-        QVERIFY(execSql(path, {"UPDATE vdr SET name = 'Kita Sonnenschein'",
-                               "UPDATE entry SET user_id = 'AB', inspection_date = '2026-11-30'",
-                               "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
-                               "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, "
-                               "env_temperature, env_humidity, progress, deficiencies, construction_material_sample, "
-                               "print_notice, print_telephone_notice, user_id) VALUES (2, 1, '002', '2026-12-01', "
-                               "'08:00', '12:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, '')"}));
+        QVERIFY(execSql(
+            path, {"UPDATE vdr SET name = 'Kita Sonnenschein'",
+                   "UPDATE entry SET user_id = 'AB', inspection_date = '2026-11-30'",
+                   "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+                   "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, "
+                   "env_temperature, env_humidity, progress, deficiencies, construction_material_sample, "
+                   "print_notice, print_telephone_notice, user_id) VALUES (2, 1, '002', '2026-12-01', "
+                   "'08:00', '12:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, '')"}));
     }
     QStringList args{QStringLiteral("info"), path};
     if (json)
@@ -200,7 +201,7 @@ void TestCli::infoUpgradesOnlyTheWorkingCopy()
     const Run r = cli({QStringLiteral("info"), path});
     QCOMPARE(r.exitCode, 0);
     QVERIFY(r.err.startsWith(QStringLiteral("Datei-Warnung: Sie öffnen ein Dokument, das mit einer früheren "
-                                           "Programmversion erstellt wurde.")));
+                                            "Programmversion erstellt wurde.")));
     QVERIFY(r.out.contains(QLatin1String("Dateiversion: 0.3\n")));
     QVERIFY(r.out.contains(QLatin1String("001\t02.03.2009\tgesperrt\n")));
     QCOMPARE(fileHash(path), before);
@@ -266,9 +267,10 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
                                     QDate::currentDate().toString());
     const Run info = cli({QStringLiteral("info"), path, QStringLiteral("--yes")});
     QCOMPARE(info.exitCode, 2);
-    QVERIFY2(info.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: Die Datei konnte nicht geöffnet werden, da "
-                                                "sie in Bearbeitung ist von\n") +
-                                 holder),
+    QVERIFY2(info.err.startsWith(
+                 QStringLiteral("Datenbank in Bearbeitung: Die Datei konnte nicht geöffnet werden, da "
+                                "sie in Bearbeitung ist von\n") +
+                 holder),
              qPrintable(info.err));
     QVERIFY(!info.err.contains(QLatin1String("Fehler:"))); // no second, general message
 
@@ -315,7 +317,8 @@ void TestCli::saveRunRepeatedlyRotatesBackups()
     QStringList found;
     for (const QString& name : QDir(folder).entryList(QDir::Files, QDir::Name))
         found << name + QStringLiteral(": ") +
-                     queryValue(folder + QLatin1Char('/') + name, QStringLiteral("SELECT name FROM vdr")).toString();
+                     queryValue(folder + QLatin1Char('/') + name, QStringLiteral("SELECT name FROM vdr"))
+                         .toString();
     QCOMPARE(found, expected);
     QSettings().remove(QStringLiteral("file/NumberOfBackups"));
 }
@@ -327,14 +330,17 @@ void TestCli::saveOfOlderStructureNeedsYes()
     const QByteArray before = fileHash(path);
     const Run cancelled = cli({QStringLiteral("save"), path});
     QCOMPARE(cancelled.exitCode, 3);
-    QVERIFY(cancelled.err.contains(QStringLiteral("Datei-Warnung: Das Dokument wurde mit einer früheren Programmversion "
-                                                  "erstellt.")));
+    QVERIFY(cancelled.err.contains(
+        QStringLiteral("Datei-Warnung: Das Dokument wurde mit einer früheren Programmversion "
+                       "erstellt.")));
     QCOMPARE(fileHash(path), before);
 
     const Run saved = cli({QStringLiteral("save"), path, QStringLiteral("--yes")});
     QCOMPARE(saved.exitCode, 0);
-    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'fileversion'").toString(), QStringLiteral("0.4"));
-    QCOMPARE(queryValue(path + QStringLiteral(".bak"), "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
+    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
+             QStringLiteral("0.4"));
+    QCOMPARE(queryValue(path + QStringLiteral(".bak"), "SELECT value FROM meta WHERE key = 'fileversion'")
+                 .toString(),
              QStringLiteral("0.3"));
     QCOMPARE(cli({QStringLiteral("info"), path}).err, QString()); // nothing left to upgrade
 }
@@ -378,9 +384,10 @@ void TestCli::compactReportsSizes()
 {
     const QString path = m_dir.filePath(QStringLiteral("kompakt.vd2"));
     QVERIFY(createDiary(path));
-    QVERIFY(execSql(path, {"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
-                           "thumbnail_width, thumbnail_height) VALUES (zeroblob(2000000), 'image/jpeg', 1, 1, "
-                           "zeroblob(10), 'image/jpeg', 1, 1)"}));
+    QVERIFY(execSql(
+        path, {"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
+               "thumbnail_width, thumbnail_height) VALUES (zeroblob(2000000), 'image/jpeg', 1, 1, "
+               "zeroblob(10), 'image/jpeg', 1, 1)"}));
     const Run r = cli({QStringLiteral("compact"), path});
     QCOMPARE(r.exitCode, 0);
     const QStringList lines = r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);

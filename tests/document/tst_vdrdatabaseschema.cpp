@@ -79,7 +79,8 @@ QString TestVDRDatabaseSchema::openUpgradedWorkingCopy(const QString& path)
 {
     VDRDocument doc;
     bool showError = true;
-    m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("Die Struktur des Dokuments wird jetzt erweitert"));
+    m_prompt.expect(QStringLiteral("Datei-Warnung"),
+                    QStringLiteral("Die Struktur des Dokuments wird jetzt erweitert"));
     if (!doc.openDocument(path, showError))
         return QString();
     const QString copy = path + QStringLiteral(".upgraded");
@@ -95,14 +96,22 @@ void TestVDRDatabaseSchema::versionComparison_data()
     QTest::addColumn<QString>("a");
     QTest::addColumn<QString>("b");
     QTest::addColumn<int>("expected");
-    QTest::newRow("equal") << "0.4" << "0.4" << 0;
-    QTest::newRow("older minor") << "0.3" << "0.4" << -1;
-    QTest::newRow("newer minor") << "0.5" << "0.4" << 1;
-    QTest::newRow("minor compares as number") << "0.10" << "0.4" << 1;
-    QTest::newRow("major wins") << "1.0" << "0.9" << 1;
-    QTest::newRow("oldest") << "0.0" << "0.1" << -1;
-    QTest::newRow("missing minor") << "1" << "1.0" << 0;
-    QTest::newRow("empty is oldest") << "" << "0.1" << -1;
+    QTest::newRow("equal") << "0.4"
+                           << "0.4" << 0;
+    QTest::newRow("older minor") << "0.3"
+                                 << "0.4" << -1;
+    QTest::newRow("newer minor") << "0.5"
+                                 << "0.4" << 1;
+    QTest::newRow("minor compares as number") << "0.10"
+                                              << "0.4" << 1;
+    QTest::newRow("major wins") << "1.0"
+                                << "0.9" << 1;
+    QTest::newRow("oldest") << "0.0"
+                            << "0.1" << -1;
+    QTest::newRow("missing minor") << "1"
+                                   << "1.0" << 0;
+    QTest::newRow("empty is oldest") << ""
+                                     << "0.1" << -1;
 }
 
 void TestVDRDatabaseSchema::versionComparison()
@@ -120,24 +129,57 @@ void TestVDRDatabaseSchema::newDiaryColumns_data()
     QTest::addColumn<QString>("column");
     QTest::addColumn<QString>("layout"); // name type notnull default pk
 
-    QTest::newRow("image id") << "image" << "id" << "id INTEGER 1 - 1";
-    QTest::newRow("image blob") << "image" << "image" << "image BLOB 1 - 0";
-    QTest::newRow("vdr name") << "vdr" << "name" << "name VARCHAR (64) 1 - 0";
-    QTest::newRow("vdr logo2") << "vdr" << "logo2_image_id" << "logo2_image_id INTEGER 1 0 0";
-    QTest::newRow("vdr address1") << "vdr" << "address1" << "address1 INTEGER 0 -1 0";
-    QTest::newRow("vdr show_address1") << "vdr" << "show_address1" << "show_address1 INTEGER 0 0 0";
-    QTest::newRow("company plz") << "company" << "plz" << "plz VARCHAR (16) 1 - 0";
-    QTest::newRow("entry number") << "entry" << "number" << "number TEXT 1 - 0";
-    QTest::newRow("entry notice") << "entry" << "notice" << "notice TEXT 0 - 0";
-    QTest::newRow("entry inspection_date") << "entry" << "inspection_date" << "inspection_date DATE 1 - 0";
-    QTest::newRow("progress date nullable") << "entry_progress" << "date" << "date DATE 0 - 0";
-    QTest::newRow("photo date") << "entry_photo" << "date" << "date DATE 1 - 0";
-    QTest::newRow("time recording count") << "entry_time_recording" << "person_count"
+    QTest::newRow("image id") << "image"
+                              << "id"
+                              << "id INTEGER 1 - 1";
+    QTest::newRow("image blob") << "image"
+                                << "image"
+                                << "image BLOB 1 - 0";
+    QTest::newRow("vdr name") << "vdr"
+                              << "name"
+                              << "name VARCHAR (64) 1 - 0";
+    QTest::newRow("vdr logo2") << "vdr"
+                               << "logo2_image_id"
+                               << "logo2_image_id INTEGER 1 0 0";
+    QTest::newRow("vdr address1") << "vdr"
+                                  << "address1"
+                                  << "address1 INTEGER 0 -1 0";
+    QTest::newRow("vdr show_address1") << "vdr"
+                                       << "show_address1"
+                                       << "show_address1 INTEGER 0 0 0";
+    QTest::newRow("company plz") << "company"
+                                 << "plz"
+                                 << "plz VARCHAR (16) 1 - 0";
+    QTest::newRow("entry number") << "entry"
+                                  << "number"
+                                  << "number TEXT 1 - 0";
+    QTest::newRow("entry notice") << "entry"
+                                  << "notice"
+                                  << "notice TEXT 0 - 0";
+    QTest::newRow("entry inspection_date") << "entry"
+                                           << "inspection_date"
+                                           << "inspection_date DATE 1 - 0";
+    QTest::newRow("progress date nullable") << "entry_progress"
+                                            << "date"
+                                            << "date DATE 0 - 0";
+    QTest::newRow("photo date") << "entry_photo"
+                                << "date"
+                                << "date DATE 1 - 0";
+    QTest::newRow("time recording count") << "entry_time_recording"
+                                          << "person_count"
                                           << "person_count INTEGER 1 - 0";
-    QTest::newRow("material quantity") << "entry_constructionmaterial" << "quantity" << "quantity REAL 0 - 0";
-    QTest::newRow("id_generator key") << "id_generator" << "id_table" << "id_table TEXT 0 - 1";
-    QTest::newRow("external number") << "external_entry_number" << "filepath" << "filepath TEXT 1 - 0";
-    QTest::newRow("audio status") << "audio" << "recording_status" << "recording_status INTEGER 1 - 0";
+    QTest::newRow("material quantity") << "entry_constructionmaterial"
+                                       << "quantity"
+                                       << "quantity REAL 0 - 0";
+    QTest::newRow("id_generator key") << "id_generator"
+                                      << "id_table"
+                                      << "id_table TEXT 0 - 1";
+    QTest::newRow("external number") << "external_entry_number"
+                                     << "filepath"
+                                     << "filepath TEXT 1 - 0";
+    QTest::newRow("audio status") << "audio"
+                                  << "recording_status"
+                                  << "recording_status INTEGER 1 - 0";
 }
 
 void TestVDRDatabaseSchema::newDiaryColumns()
@@ -162,17 +204,20 @@ void TestVDRDatabaseSchema::newDiaryContents()
     QCOMPARE(tableNames(path).size(), 22);
     QCOMPARE(queryTexts(path, "SELECT key, value FROM meta ORDER BY key"),
              QStringList({"documentImport|noAction", "fileversion|0.4"}));
-    QCOMPARE(queryTexts(path, "SELECT id, name, logo_image_id, logo_align, logo2_image_id, headline_left, "
-                              "headline_center, footer_left, footer_center, entrycounter, display_empty_categories, "
-                              "address1, show_projectname FROM vdr"),
+    QCOMPARE(queryTexts(
+                 path, "SELECT id, name, logo_image_id, logo_align, logo2_image_id, headline_left, "
+                       "headline_center, footer_left, footer_center, entrycounter, display_empty_categories, "
+                       "address1, show_projectname FROM vdr"),
              QStringList({"1|Neues Varduna|NULL|2|0|Neues Varduna||Korvant|Varduna|1|0|-1|0"}));
     QCOMPARE(queryValue(path, "SELECT date(createdate) FROM vdr").toString(),
              QDate::currentDate().toString(Qt::ISODate));
     QCOMPARE(queryTexts(path, "SELECT category, type, firstname, company, pos FROM company ORDER BY pos"),
              QStringList({"1|Bauherr|||1", "1|Bauleitung|||2", "1|Architekt|||3"}));
-    QCOMPARE(queryTexts(path, "SELECT number, locked, inspection_date, print_notice, progress_audio_id, creation_date, "
-                              "user_id, exported_by_app FROM entry"),
-             QStringList({"001 (Entwurf)|0|" + QDate::currentDate().toString(Qt::ISODate) + "|1|0|NULL||0"}));
+    QCOMPARE(
+        queryTexts(path,
+                   "SELECT number, locked, inspection_date, print_notice, progress_audio_id, creation_date, "
+                   "user_id, exported_by_app FROM entry"),
+        QStringList({"001 (Entwurf)|0|" + QDate::currentDate().toString(Qt::ISODate) + "|1|0|NULL||0"}));
     QCOMPARE(queryValue(path, "SELECT id_counter FROM id_generator WHERE id_table = 'company'").toInt(), 3);
     QCOMPARE(queryValue(path, "SELECT count(*) FROM meta WHERE key = 'dummy'").toInt(), 0);
     QVERIFY(!QFile::exists(path + ".workingcopy"));
@@ -213,32 +258,42 @@ void TestVDRDatabaseSchema::upgradeConvertsOldData()
                             "entry_workforce ORDER BY id"),
              QStringList({"4|1|4|Kolonne A|5|Maurer, Polier|0", "5|1|5|Kolonne B|5|Elektriker, Helfer|1",
                           "6|2|2|leer|0||0"}));
-    QCOMPARE(queryTexts(db, "SELECT id, entry_id, workforce_id, person_count, person_type FROM entry_time_recording "
-                            "ORDER BY id"),
+    QCOMPARE(queryTexts(
+                 db, "SELECT id, entry_id, workforce_id, person_count, person_type FROM entry_time_recording "
+                     "ORDER BY id"),
              QStringList({"1|1|4|2|Maurer", "2|1|4|3|Polier", "3|1|5|1|Elektriker", "4|1|5|0|Helfer",
                           "5|1|5|4|Elektriker"}));
-    QCOMPARE(queryValue(db, "SELECT id_counter FROM id_generator WHERE id_table = 'entry_time_recording'").toInt(), 5);
+    QCOMPARE(
+        queryValue(db, "SELECT id_counter FROM id_generator WHERE id_table = 'entry_time_recording'").toInt(),
+        5);
 
     // The OK flags of materials are folded into their texts.
-    QCOMPARE(queryTexts(db, "SELECT material, quantity, unit, conditions, workflow, note, material_temperature, pos "
-                            "FROM entry_constructionmaterial"),
+    QCOMPARE(queryTexts(
+                 db, "SELECT material, quantity, unit, conditions, workflow, note, material_temperature, pos "
+                     "FROM entry_constructionmaterial"),
              QStringList({"Beton C25/30|NULL||OK, trocken|zügig|Probe genommen|5|0"}));
 
     // Progress rows keep their data; the date may now be empty.
-    QCOMPARE(queryTexts(db, "SELECT id, type, description, company_id, date, roomname, roombook_number, pos FROM "
-                            "entry_progress ORDER BY id"),
+    QCOMPARE(queryTexts(db,
+                        "SELECT id, type, description, company_id, date, roomname, roombook_number, pos FROM "
+                        "entry_progress ORDER BY id"),
              QStringList({"1|1|Lieferung verspätet|4|2009-03-02|||0", "2|4|Riss in Wand|5|2009-03-02|||0"}));
-    QVERIFY(execSql(db, {"INSERT INTO entry_progress (id, entry_id, pos, type, description, roomname, roombook_number) "
-                         "VALUES (9, 1, 3, 1, 'ohne Datum', '', '')"}));
+    QVERIFY(execSql(
+        db, {"INSERT INTO entry_progress (id, entry_id, pos, type, description, roomname, roombook_number) "
+             "VALUES (9, 1, 3, 1, 'ohne Datum', '', '')"}));
 
-    QCOMPARE(queryTexts(db, "SELECT number, print_notice, print_telephone_notice, user_id, exported_by_app FROM entry "
-                            "ORDER BY id"),
-             QStringList({"001|1|1|NULL|0", "002 (Entwurf)|1|1|NULL|0"}));
+    QCOMPARE(
+        queryTexts(db,
+                   "SELECT number, print_notice, print_telephone_notice, user_id, exported_by_app FROM entry "
+                   "ORDER BY id"),
+        QStringList({"001|1|1|NULL|0", "002 (Entwurf)|1|1|NULL|0"}));
     QCOMPARE(queryTexts(db, "SELECT name, address1, show_address1, logo2_image_id FROM vdr"),
              QStringList({"Altbau Schillerstraße|-1|0|0"}));
-    QCOMPARE(queryValue(db, "SELECT group_concat(pos) FROM company WHERE category > 0 ORDER BY id").toString(),
-             QStringLiteral("1,2,3"));
-    QCOMPARE(queryValue(db, "SELECT value FROM meta WHERE key = 'fileversion'").toString(), QStringLiteral("0.1"));
+    QCOMPARE(
+        queryValue(db, "SELECT group_concat(pos) FROM company WHERE category > 0 ORDER BY id").toString(),
+        QStringLiteral("1,2,3"));
+    QCOMPARE(queryValue(db, "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
+             QStringLiteral("0.1"));
 }
 
 void TestVDRDatabaseSchema::upgradeLeavesCurrentFileAlone()
@@ -258,9 +313,10 @@ void TestVDRDatabaseSchema::failingUpgradeStepEndsOpening()
     // A progress table without a description cannot be rebuilt: the step fails with SQL Error.
     const QString path = m_dir.filePath(QStringLiteral("kaputt.vd2"));
     QVERIFY(createOldestLayoutDiary(path));
-    QVERIFY(execSql(path, {"DROP TABLE entry_progress",
-                           "CREATE TABLE entry_progress (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
-                           "type INTEGER NOT NULL, date DATE NOT NULL)"}));
+    QVERIFY(execSql(
+        path, {"DROP TABLE entry_progress",
+               "CREATE TABLE entry_progress (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
+               "type INTEGER NOT NULL, date DATE NOT NULL)"}));
     const QByteArray before = fileHash(path);
 
     VDRDocument doc;

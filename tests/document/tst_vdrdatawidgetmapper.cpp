@@ -336,11 +336,12 @@ void TestVDRDataWidgetMapper::nullDoesNotCarryOverFromPreviousRow()
     // A number field on a column that is NULL in the next row must not keep, and later write, the
     // previous row's value.
     exec(QStringLiteral("UPDATE entry SET progress_audio_id = 7"));
-    exec(QStringLiteral("INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
-                        "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, env_temperature, "
-                        "env_humidity, progress, deficiencies, construction_material_sample, print_notice, "
-                        "print_telephone_notice, progress_audio_id) VALUES (2, 0, '002 (Entwurf)', '2026-12-02', "
-                        "'08:00', '09:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, NULL)"));
+    exec(QStringLiteral(
+        "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+        "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, env_temperature, "
+        "env_humidity, progress, deficiencies, construction_material_sample, print_notice, "
+        "print_telephone_notice, progress_audio_id) VALUES (2, 0, '002 (Entwurf)', '2026-12-02', "
+        "'08:00', '09:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, NULL)"));
     VDRSqlTableModel* model = m_doc->modelEntryAll();
     QVERIFY(model->select());
     QWidget window;

@@ -182,15 +182,29 @@ void TestVDRDocument::refusedFilesStayUntouched_data()
     QTest::addColumn<QString>("text");
     QTest::addColumn<bool>("showError");
 
-    QTest::newRow("missing") << "missing" << "Dateifehler" << "existiert nicht." << false;
-    QTest::newRow("folder") << "folder" << "Dateifehler" << "ist keine Datei." << false;
-    QTest::newRow("empty file") << "empty" << "Dateifehler" << "ist keine Varduna-Datei." << false;
-    QTest::newRow("text file") << "text" << "Dateifehler" << "ist keine Varduna-Datei." << false;
-    QTest::newRow("version 0.5") << "0.5" << "Datei öffnen" << "mit einer neueren Programmversion erstellt" << false;
-    QTest::newRow("version 0.10") << "0.10" << "Datei öffnen" << "mit einer neueren Programmversion erstellt"
-                                  << false;
-    QTest::newRow("other database") << "foreign" << "Datenbankfehler" << "Tabelle vdr fehlt" << true;
-    QTest::newRow("damaged, cancelled") << "damaged" << "Beschädigte Datenbank-Datei"
+    QTest::newRow("missing") << "missing"
+                             << "Dateifehler"
+                             << "existiert nicht." << false;
+    QTest::newRow("folder") << "folder"
+                            << "Dateifehler"
+                            << "ist keine Datei." << false;
+    QTest::newRow("empty file") << "empty"
+                                << "Dateifehler"
+                                << "ist keine Varduna-Datei." << false;
+    QTest::newRow("text file") << "text"
+                               << "Dateifehler"
+                               << "ist keine Varduna-Datei." << false;
+    QTest::newRow("version 0.5") << "0.5"
+                                 << "Datei öffnen"
+                                 << "mit einer neueren Programmversion erstellt" << false;
+    QTest::newRow("version 0.10") << "0.10"
+                                  << "Datei öffnen"
+                                  << "mit einer neueren Programmversion erstellt" << false;
+    QTest::newRow("other database") << "foreign"
+                                    << "Datenbankfehler"
+                                    << "Tabelle vdr fehlt" << true;
+    QTest::newRow("damaged, cancelled") << "damaged"
+                                        << "Beschädigte Datenbank-Datei"
                                         << "Es existieren keine Backup-Dateien." << false;
 }
 
@@ -212,7 +226,8 @@ void TestVDRDocument::refusedFilesStayUntouched()
             f.write("Dies ist kein Bautagebuch, sondern ein Einkaufszettel.\n");
     } else if (kind.startsWith(QLatin1String("0."))) {
         QVERIFY(createDiary(path));
-        QVERIFY(execSql(path, {QStringLiteral("UPDATE meta SET value = '%1' WHERE key = 'fileversion'").arg(kind)}));
+        QVERIFY(execSql(
+            path, {QStringLiteral("UPDATE meta SET value = '%1' WHERE key = 'fileversion'").arg(kind)}));
     } else if (kind == QLatin1String("foreign")) {
         QVERIFY(execSql(path, {"CREATE TABLE meta (key TEXT PRIMARY KEY, value TEXT NOT NULL)",
                                "CREATE TABLE kunden (id INTEGER, name TEXT)"}));
@@ -306,7 +321,8 @@ void TestVDRDocument::leftoverWorkingCopy()
                         QStringLiteral("Die letzte Bearbeitung der Varduna-Datei wurde nicht ordnungsgemäß "
                                        "abgeschlossen.\nDer letzte Bearbeitungsstand wird geöffnet."));
     QVERIFY(doc.openDocument(path, showError));
-    QCOMPARE(doc.projectName(), resumed ? QStringLiteral("Ungespeicherter Stand") : QStringLiteral("Neues Varduna"));
+    QCOMPARE(doc.projectName(),
+             resumed ? QStringLiteral("Ungespeicherter Stand") : QStringLiteral("Neues Varduna"));
     QCOMPARE(doc.isStateModified(), resumed);
     QCOMPARE(VDRDocument::readLockInfo(lockInfo).value(0), VDRDocument::currentUserName());
     QVERIFY(doc.closeDocument());
@@ -333,9 +349,10 @@ void TestVDRDocument::fileHeldByAnotherProcess()
     VDRDocument doc;
     bool showError = true;
     if (withLockInfo)
-        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
-                        QStringLiteral("da sie in Bearbeitung ist von\nUser: kollegin\nComputer: %1\nseit dem %2 ")
-                            .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString()));
+        m_prompt.expect(
+            QStringLiteral("Datenbank in Bearbeitung"),
+            QStringLiteral("da sie in Bearbeitung ist von\nUser: kollegin\nComputer: %1\nseit dem %2 ")
+                .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString()));
     else
         m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
                         QStringLiteral("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist."));
@@ -374,7 +391,8 @@ void TestVDRDocument::crashedInstanceIsResumedOnlyBySameUser()
     if (resumed)
         m_prompt.expect(QStringLiteral("Datei öffnen"), QStringLiteral("nicht ordnungsgemäß abgeschlossen"));
     QVERIFY(doc.openDocument(path, showError));
-    QCOMPARE(doc.projectName(), resumed ? QStringLiteral("Geändert im Holder") : QStringLiteral("Neues Varduna"));
+    QCOMPARE(doc.projectName(),
+             resumed ? QStringLiteral("Geändert im Holder") : QStringLiteral("Neues Varduna"));
     QVERIFY(doc.closeDocument());
 }
 
@@ -383,12 +401,14 @@ void TestVDRDocument::readOnlyDiaryWarns()
     const QString path = newDiary(QStringLiteral("schreibgeschuetzt.vd2"));
     const QString absolute = QFileInfo(path).absoluteFilePath();
     // Root may write anything, so the refusal is simulated where the program asks.
-    VDRFileOps::setFailurePredicate(
-        [absolute](VDRFileOps::Op op, const QString& p) { return op == VDRFileOps::CheckWritable && p == absolute; });
+    VDRFileOps::setFailurePredicate([absolute](VDRFileOps::Op op, const QString& p) {
+        return op == VDRFileOps::CheckWritable && p == absolute;
+    });
     VDRDocument doc;
     bool showError = true;
     m_prompt.expect(QStringLiteral("Datei-Warnung"),
-                    QStringLiteral("Sie haben keine Schreibrechte für die Datei %1.\n").arg(QDir::toNativeSeparators(absolute)));
+                    QStringLiteral("Sie haben keine Schreibrechte für die Datei %1.\n")
+                        .arg(QDir::toNativeSeparators(absolute)));
     QVERIFY(doc.openDocument(path, showError));
     QVERIFY(doc.isStateValid());
     QVERIFY(doc.closeDocument());
@@ -403,7 +423,8 @@ void TestVDRDocument::demoProjectFromReadOnlyFolder()
     VDRFileOps::setFailurePredicate([absoluteFolder](VDRFileOps::Op op, const QString& p) {
         return p.startsWith(absoluteFolder + QLatin1Char('/')) && op != VDRFileOps::Remove;
     });
-    QVERIFY(QFile::setPermissions(folder, QFile::ReadOwner | QFile::ExeOwner | QFile::ReadUser | QFile::ExeUser));
+    QVERIFY(
+        QFile::setPermissions(folder, QFile::ReadOwner | QFile::ExeOwner | QFile::ReadUser | QFile::ExeUser));
 
     VDRDocument doc;
     bool showError = true;

@@ -90,8 +90,9 @@ void TestVDRDocumentSave::cleanup()
 
 QString TestVDRDocumentSave::diary(const QString& name)
 {
-    const QString folder = m_dir.filePath(QString::fromLatin1(QTest::currentTestFunction()) + QLatin1Char('-') +
-                                          QString::fromLatin1(QTest::currentDataTag()).replace(QLatin1Char(' '), '_'));
+    const QString folder =
+        m_dir.filePath(QString::fromLatin1(QTest::currentTestFunction()) + QLatin1Char('-') +
+                       QString::fromLatin1(QTest::currentDataTag()).replace(QLatin1Char(' '), '_'));
     QDir(folder).removeRecursively();
     QDir().mkpath(folder);
     const QString path = folder + QLatin1Char('/') + name;
@@ -118,15 +119,15 @@ void TestVDRDocumentSave::backupsRotateOncePerOpening_data()
     QTest::newRow("three openings") << 4 << 3 << 1
                                     << QStringList{"d.vd2: Stand 3.1", "d.vd2.01.bak: Stand 1.1",
                                                    "d.vd2.02.bak: Neues Varduna", "d.vd2.bak: Stand 2.1"};
-    QTest::newRow("five saves in one opening") << 4 << 1 << 5
-                                               << QStringList{"d.vd2: Stand 1.5", "d.vd2.bak: Stand 1.4"};
+    QTest::newRow("five saves in one opening")
+        << 4 << 1 << 5 << QStringList{"d.vd2: Stand 1.5", "d.vd2.bak: Stand 1.4"};
     QTest::newRow("none kept") << 0 << 3 << 2 << QStringList{"d.vd2: Stand 3.2"};
     QTest::newRow("twelve kept: the long name form")
         << 12 << 12 << 1
-        << QStringList{"d.vd2: Stand 12.1",        "d.vd2.01.bak: Stand 10.1", "d.vd2.02.bak: Stand 9.1",
-                       "d.vd2.03.bak: Stand 8.1",  "d.vd2.04.bak: Stand 7.1",  "d.vd2.05.bak: Stand 6.1",
-                       "d.vd2.06.bak: Stand 5.1",  "d.vd2.07.bak: Stand 4.1",  "d.vd2.08.bak: Stand 3.1",
-                       "d.vd2.09.bak: Stand 2.1",  "d.vd2.10.bak: Stand 1.1",  "d.vd2.11.bak: Neues Varduna",
+        << QStringList{"d.vd2: Stand 12.1",       "d.vd2.01.bak: Stand 10.1", "d.vd2.02.bak: Stand 9.1",
+                       "d.vd2.03.bak: Stand 8.1", "d.vd2.04.bak: Stand 7.1",  "d.vd2.05.bak: Stand 6.1",
+                       "d.vd2.06.bak: Stand 5.1", "d.vd2.07.bak: Stand 4.1",  "d.vd2.08.bak: Stand 3.1",
+                       "d.vd2.09.bak: Stand 2.1", "d.vd2.10.bak: Stand 1.1",  "d.vd2.11.bak: Neues Varduna",
                        "d.vd2.bak: Stand 11.1"};
 }
 
@@ -220,8 +221,9 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete()
 
     // The diary is complete and holds the old or the new state; backups are intact; nothing else lies around.
     QVERIFY(intact(path));
-    QCOMPARE(projectNameIn(path), failed ? (firstSave ? QStringLiteral("Generation 4") : QStringLiteral("Zwischenstand"))
-                                         : QStringLiteral("Neuer Stand"));
+    QCOMPARE(projectNameIn(path),
+             failed ? (firstSave ? QStringLiteral("Generation 4") : QStringLiteral("Zwischenstand"))
+                    : QStringLiteral("Neuer Stand"));
     QStringList after;
     for (const QString& name : filesBeside(path)) {
         const QString file = QFileInfo(path).dir().filePath(name);
@@ -278,7 +280,8 @@ void TestVDRDocumentSave::saveAsMovesWorkingCopyAndLock()
     QVERIFY(QFile::exists(target + QStringLiteral(".workingcopy")));
     QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
     QVERIFY(!QFile::exists(VDRDocument::lockInfoPathFor(path)));
-    QCOMPARE(VDRDocument::readLockInfo(VDRDocument::lockInfoPathFor(target)).value(0), VDRDocument::currentUserName());
+    QCOMPARE(VDRDocument::readLockInfo(VDRDocument::lockInfoPathFor(target)).value(0),
+             VDRDocument::currentUserName());
     QCOMPARE(projectNameIn(path), QStringLiteral("Neues Varduna"));
     QCOMPARE(projectNameIn(target), QStringLiteral("Unter neuem Namen"));
 
@@ -341,7 +344,8 @@ void TestVDRDocumentSave::saveAsNeverOverwritesADiaryInUse()
         VDRDocument doc;
         bool showError = true;
         QVERIFY(doc.openDocument(path, showError));
-        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"), QStringLiteral("kann nicht überschrieben werden"));
+        m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
+                        QStringLiteral("kann nicht überschrieben werden"));
         QCOMPARE(doc.saveDocument(target), 2);
         QVERIFY(doc.isStateValid());
         QCOMPARE(doc.getFilepath(), QFileInfo(path).absoluteFilePath());
@@ -367,7 +371,8 @@ void TestVDRDocumentSave::olderStructureAsksAndWritesCurrentVersion()
     QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
     VDRDocument doc;
     bool showError = true;
-    m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("Die Struktur des Dokuments wird jetzt erweitert"));
+    m_prompt.expect(QStringLiteral("Datei-Warnung"),
+                    QStringLiteral("Die Struktur des Dokuments wird jetzt erweitert"));
     QVERIFY(doc.openDocument(path, showError));
     m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("Vorgang fortsetzen?"), answer);
     const int result = doc.saveDocument();
@@ -386,8 +391,12 @@ void TestVDRDocumentSave::refusals_data()
     QTest::addColumn<QString>("kind");
     QTest::addColumn<QString>("title");
     QTest::addColumn<QString>("text");
-    QTest::newRow("demo project") << "demo" << "Speichern" << "Das Musterprojekt kann nicht gespeichert werden.";
-    QTest::newRow("read-only file") << "readonly" << "Speicher-Fehler" << "da sie keine Schreibrechte besitzen";
+    QTest::newRow("demo project") << "demo"
+                                  << "Speichern"
+                                  << "Das Musterprojekt kann nicht gespeichert werden.";
+    QTest::newRow("read-only file") << "readonly"
+                                    << "Speicher-Fehler"
+                                    << "da sie keine Schreibrechte besitzen";
 }
 
 void TestVDRDocumentSave::refusals()
@@ -403,8 +412,9 @@ void TestVDRDocumentSave::refusals()
     QVERIFY(doc.openDocument(path, showError));
     if (kind == QLatin1String("readonly")) {
         const QString absolute = QFileInfo(path).absoluteFilePath();
-        VDRFileOps::setFailurePredicate(
-            [absolute](VDRFileOps::Op op, const QString& p) { return op == VDRFileOps::CheckWritable && p == absolute; });
+        VDRFileOps::setFailurePredicate([absolute](VDRFileOps::Op op, const QString& p) {
+            return op == VDRFileOps::CheckWritable && p == absolute;
+        });
     }
     rename(doc, QStringLiteral("Geändert"));
     m_prompt.expect(title, text);
@@ -421,10 +431,12 @@ void TestVDRDocumentSave::damagedDiaryIsRestoredFromNewestIntactBackup_data()
     QTest::addColumn<QString>("text");
     QTest::addColumn<QString>("restoredFrom");
 
-    QTest::newRow("newest backup intact") << QStringList{"d.vd2"} << 0 << "Das neueste unbeschädigte Backup stammt vom"
-                                          << "Stand 3";
+    QTest::newRow("newest backup intact")
+        << QStringList{"d.vd2"} << 0 << "Das neueste unbeschädigte Backup stammt vom"
+        << "Stand 3";
     QTest::newRow("newest backup damaged too")
-        << QStringList{"d.vd2", "d.vd2.bak"} << 0 << "Das neueste unbeschädigte Backup stammt vom" << "Stand 2";
+        << QStringList{"d.vd2", "d.vd2.bak"} << 0 << "Das neueste unbeschädigte Backup stammt vom"
+        << "Stand 2";
     QTest::newRow("all backups damaged")
         << QStringList{"d.vd2", "d.vd2.bak", "d.vd2.01.bak", "d.vd2.02.bak", "d.vd2.03.bak"} << 0
         << "Die Backup-Dateien sind ebenfalls beschädigt. Wenn sie über Sicherungskopien" << QString();
@@ -457,10 +469,11 @@ void TestVDRDocumentSave::damagedDiaryIsRestoredFromNewestIntactBackup()
         QVERIFY(!showError);
         return;
     }
-    m_prompt.expect(QStringLiteral("Backup wiederherstellen"),
-                    QStringLiteral("Die Datei wurde erfolgreich wiederhergestellt und wird jetzt geöffnet.\nDie "
-                                   "beschädigte Datei wurde umbenannt in %1.")
-                        .arg(QDir::toNativeSeparators(QFileInfo(path).absolutePath() + "/dERROR.01.vd2")));
+    m_prompt.expect(
+        QStringLiteral("Backup wiederherstellen"),
+        QStringLiteral("Die Datei wurde erfolgreich wiederhergestellt und wird jetzt geöffnet.\nDie "
+                       "beschädigte Datei wurde umbenannt in %1.")
+            .arg(QDir::toNativeSeparators(QFileInfo(path).absolutePath() + "/dERROR.01.vd2")));
     QVERIFY(doc.openDocument(path, showError));
     QCOMPARE(doc.projectName(), restoredFrom);
     QVERIFY(doc.closeDocument());
@@ -473,11 +486,13 @@ void TestVDRDocumentSave::compactionRemovesUnreferencedImages()
     const QByteArray blob(400000, 'x');
     QStringList statements;
     for (int i = 1; i <= 6; ++i)
-        statements << QStringLiteral("INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
-                                     "thumbnail_ct, thumbnail_width, thumbnail_height) VALUES (zeroblob(400000), "
-                                     "'image/jpeg', 10, 10, zeroblob(1000), 'image/jpeg', 1, 1)");
+        statements << QStringLiteral(
+            "INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
+            "thumbnail_ct, thumbnail_width, thumbnail_height) VALUES (zeroblob(400000), "
+            "'image/jpeg', 10, 10, zeroblob(1000), 'image/jpeg', 1, 1)");
     statements << "UPDATE vdr SET logo_image_id = 1"
-               << "INSERT INTO entry_photo (id, entry_id, pos, type, photo_image_id, caption, comment, date, relation_id) "
+               << "INSERT INTO entry_photo (id, entry_id, pos, type, photo_image_id, caption, comment, date, "
+                  "relation_id) "
                   "VALUES (1, 1, 0, 1, 4, 'Foto', '', '2026-12-01', -1)";
     QVERIFY(execSql(path, statements));
     const qint64 before = QFileInfo(path).size();
@@ -485,24 +500,28 @@ void TestVDRDocumentSave::compactionRemovesUnreferencedImages()
     VDRDocument doc;
     bool showError = true;
     QVERIFY(doc.openDocument(path, showError));
-    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("Die Datenbank wird jetzt bereinigt."));
     m_prompt.expect(QStringLiteral("Datenbank bereinigen"),
-                    QStringLiteral("Die Datenbank wurde erfolgreich bereinigt.\nDie Dateigröße wurde von %1 auf ")
-                        .arg(VDRDocument::formatFileSize(before)));
+                    QStringLiteral("Die Datenbank wird jetzt bereinigt."));
+    m_prompt.expect(
+        QStringLiteral("Datenbank bereinigen"),
+        QStringLiteral("Die Datenbank wurde erfolgreich bereinigt.\nDie Dateigröße wurde von %1 auf ")
+            .arg(VDRDocument::formatFileSize(before)));
     QCOMPARE(doc.compactDB(true), 0);
     QVERIFY(doc.isStateValid());
     QCOMPARE(doc.modelVdr()->rowCount(), 1);
     QVERIFY(doc.closeDocument());
 
     QCOMPARE(queryTexts(path, "SELECT id FROM image ORDER BY id"), QStringList({"1", "4"}));
-    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'imageDeletion'").toString(), QStringLiteral("done"));
+    QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'imageDeletion'").toString(),
+             QStringLiteral("done"));
     QVERIFY(QFileInfo(path).size() < before - 4 * 400000);
     QVERIFY(intact(path));
 
     // A second compaction finds the marker already there.
     QVERIFY(doc.openDocument(path, showError));
     m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("wird jetzt bereinigt"));
-    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("Die Datenbank wurde erfolgreich bereinigt.\n"));
+    m_prompt.expect(QStringLiteral("Datenbank bereinigen"),
+                    QStringLiteral("Die Datenbank wurde erfolgreich bereinigt.\n"));
     QCOMPARE(doc.compactDB(true), 0);
     QVERIFY(doc.closeDocument());
 }
@@ -517,7 +536,8 @@ void TestVDRDocumentSave::manyDeletedImagesOfferCompaction()
         doc.decrementCompactDbImageCnt();
     QCOMPARE(doc.saveDocument(), 0); // four are not many
     doc.decrementCompactDbImageCnt();
-    m_prompt.expect(QStringLiteral("Speichern"), QStringLiteral("Es wurden mehrere Bilder gelöscht.\n\nDas Löschen"), 0);
+    m_prompt.expect(QStringLiteral("Speichern"),
+                    QStringLiteral("Es wurden mehrere Bilder gelöscht.\n\nDas Löschen"), 0);
     QCOMPARE(doc.saveDocument(), 0);
     QCOMPARE(doc.saveDocument(), 0); // compacted: counted anew
     QVERIFY(doc.closeDocument());
@@ -531,11 +551,16 @@ void TestVDRDocumentSave::fileSizeCheckAfterOpening_data()
     QTest::addColumn<bool>("notAgain");
     QTest::addColumn<int>("result");
     QTest::newRow("below the limit") << 2 << QString() << -1 << false << int(VDRFileSizeDialog::NotDue);
-    QTest::newRow("over the limit, export") << 0 << QString() << 0 << false << int(VDRFileSizeDialog::ExportRequested);
-    QTest::newRow("over the limit, cancel") << 0 << QString() << 1 << false << int(VDRFileSizeDialog::Dismissed);
-    QTest::newRow("not again for this file") << 0 << QString() << 1 << true << int(VDRFileSizeDialog::Dismissed);
-    QTest::newRow("warning switched off") << 0 << "NoFileSizeWarning" << -1 << false << int(VDRFileSizeDialog::NotDue);
-    QTest::newRow("master data exported") << 0 << "exportedTo" << -1 << false << int(VDRFileSizeDialog::NotDue);
+    QTest::newRow("over the limit, export")
+        << 0 << QString() << 0 << false << int(VDRFileSizeDialog::ExportRequested);
+    QTest::newRow("over the limit, cancel")
+        << 0 << QString() << 1 << false << int(VDRFileSizeDialog::Dismissed);
+    QTest::newRow("not again for this file")
+        << 0 << QString() << 1 << true << int(VDRFileSizeDialog::Dismissed);
+    QTest::newRow("warning switched off")
+        << 0 << "NoFileSizeWarning" << -1 << false << int(VDRFileSizeDialog::NotDue);
+    QTest::newRow("master data exported")
+        << 0 << "exportedTo" << -1 << false << int(VDRFileSizeDialog::NotDue);
 }
 
 void TestVDRDocumentSave::fileSizeCheckAfterOpening()
@@ -547,9 +572,10 @@ void TestVDRDocumentSave::fileSizeCheckAfterOpening()
     QFETCH(int, result);
     const QString path = diary(QStringLiteral("gross.vd2"));
     // A little over one MB (bytes / 1,024,000).
-    QStringList statements{"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
-                           "thumbnail_width, thumbnail_height) VALUES (zeroblob(1100000), 'image/jpeg', 1, 1, "
-                           "zeroblob(10), 'image/jpeg', 1, 1)"};
+    QStringList statements{
+        "INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
+        "thumbnail_width, thumbnail_height) VALUES (zeroblob(1100000), 'image/jpeg', 1, 1, "
+        "zeroblob(10), 'image/jpeg', 1, 1)"};
     if (!meta.isEmpty())
         statements << QStringLiteral("INSERT INTO meta (key, value) VALUES ('%1', '1')").arg(meta);
     QVERIFY(execSql(path, statements));
@@ -561,8 +587,8 @@ void TestVDRDocumentSave::fileSizeCheckAfterOpening()
     if (notAgain)
         m_prompt.expectTicked(QStringLiteral("Datei-Information"), QStringLiteral("Größe von 1 MB"), answer);
     else if (answer >= 0)
-        m_prompt.expect(QStringLiteral("Datei-Information"), QStringLiteral("Diese Datei hat eine Größe von 1 MB.\n"),
-                        answer);
+        m_prompt.expect(QStringLiteral("Datei-Information"),
+                        QStringLiteral("Diese Datei hat eine Größe von 1 MB.\n"), answer);
     VDRFileSizeDialog dialog(&doc);
     QCOMPARE(int(dialog.exec()), result);
     QVERIFY(doc.closeDocument());

@@ -36,8 +36,10 @@ void TestSettingsDialogs::storesOnlyOnOk_data()
     QTest::addColumn<int>("defaultValue");
     QTest::addColumn<int>("maximum");
     QTest::addColumn<int>("step");
-    QTest::newRow("backups") << "backup" << "file/NumberOfBackups" << 4 << 25 << 1;
-    QTest::newRow("file size") << "filesize" << "file/FileSize" << 100 << 2000 << 10;
+    QTest::newRow("backups") << "backup"
+                             << "file/NumberOfBackups" << 4 << 25 << 1;
+    QTest::newRow("file size") << "filesize"
+                               << "file/FileSize" << 100 << 2000 << 10;
 }
 
 void TestSettingsDialogs::storesOnlyOnOk()
@@ -52,7 +54,9 @@ void TestSettingsDialogs::storesOnlyOnOk()
             return std::make_unique<VDRBackupConfigDialog>();
         return std::make_unique<VDRFileSizeConfigDialog>();
     };
-    auto click = [](QDialog* d, const char* name) { d->findChild<QPushButton*>(QLatin1String(name))->click(); };
+    auto click = [](QDialog* d, const char* name) {
+        d->findChild<QPushButton*>(QLatin1String(name))->click();
+    };
 
     QSettings().remove(key);
     std::unique_ptr<QDialog> d = make();

@@ -6,11 +6,11 @@
 #include <QCryptographicHash>
 #include <QDebug>
 #include <QDir>
-#include <QSqlRecord>
 #include <QFile>
 #include <QSettings>
 #include <QSqlError>
 #include <QSqlQuery>
+#include <QSqlRecord>
 #include <QStandardPaths>
 #include <QUuid>
 
@@ -120,9 +120,9 @@ QStringList tableLayout(const QString& path, const QString& table)
 QStringList tableNames(const QString& path)
 {
     QStringList result;
-    for (const QVariantList& row :
-         queryRows(path, QStringLiteral("SELECT name FROM sqlite_master WHERE type = 'table' AND name NOT LIKE "
-                                        "'sqlite_%' ORDER BY name")))
+    for (const QVariantList& row : queryRows(
+             path, QStringLiteral("SELECT name FROM sqlite_master WHERE type = 'table' AND name NOT LIKE "
+                                  "'sqlite_%' ORDER BY name")))
         result << row[0].toString();
     return result;
 }
@@ -154,75 +154,112 @@ bool damageFile(const QString& path)
 bool createOldestLayoutDiary(const QString& path, const QString& fileVersion)
 {
     QFile::remove(path);
-    return execSql(path, {
-        "CREATE TABLE id_generator (id_table TEXT PRIMARY KEY, id_counter INTEGER NOT NULL)",
-        "CREATE TABLE meta (key TEXT PRIMARY KEY, value TEXT NOT NULL)",
-        "CREATE TABLE image (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, image BLOB NOT NULL, image_ct TEXT NOT "
-        "NULL, image_width INT NOT NULL, image_height INT NOT NULL, thumbnail BLOB NOT NULL, thumbnail_ct TEXT NOT "
-        "NULL, thumbnail_width INT NOT NULL, thumbnail_height INT NOT NULL)",
-        "CREATE TABLE vdr (id INTEGER NOT NULL PRIMARY KEY, name VARCHAR (64) NOT NULL, logo_image_id INTEGER, "
-        "logo_align INTEGER NOT NULL, headline_left TEXT NOT NULL, headline_center TEXT NOT NULL, headline_right TEXT "
-        "NOT NULL, footer_left TEXT NOT NULL, footer_center TEXT NOT NULL, footer_right TEXT NOT NULL, createdate "
-        "DATETIME NOT NULL, entrycounter INTEGER NOT NULL, email_subject TEXT NOT NULL, email_body TEXT NOT NULL, "
-        "display_empty_categories INTEGER NOT NULL)",
-        "CREATE TABLE company (id INTEGER NOT NULL PRIMARY KEY, category INTEGER NOT NULL, type VARCHAR (64) NOT NULL, "
-        "firstname VARCHAR (64) NOT NULL, lastname VARCHAR (64) NOT NULL, company VARCHAR (128) NOT NULL, street "
-        "VARCHAR (128) NOT NULL, plz VARCHAR (16) NOT NULL, city VARCHAR (64) NOT NULL, telephone VARCHAR (64) NOT "
-        "NULL, telefax VARCHAR (64) NOT NULL, mobile VARCHAR (64) NOT NULL, email VARCHAR (128) NOT NULL)",
-        "CREATE TABLE entry (id INTEGER NOT NULL PRIMARY KEY, locked INTEGER NOT NULL, persistent_document BLOB, "
-        "persistent_document_ct TEXT, number TEXT NOT NULL, inspection_date DATE NOT NULL, inspection_time_from TIME "
-        "NOT NULL, inspection_time_to TIME NOT NULL, env_time TIME NOT NULL, env_weather1 TEXT NOT NULL, env_weather2 "
-        "TEXT NOT NULL, env_weather3 TEXT NOT NULL, env_temperature TEXT NOT NULL, env_humidity TEXT NOT NULL, "
-        "progress TEXT NOT NULL, deficiencies TEXT NOT NULL, tests TEXT, interventions TEXT, special_incidents TEXT, "
-        "construction_material_sample INTEGER NOT NULL)",
-        "CREATE TABLE entry_attendee (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, company_id INTEGER, "
-        "comment TEXT NOT NULL)",
-        "CREATE TABLE entry_workforce (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, company_id INTEGER, "
-        "comment TEXT NOT NULL, count1 INTEGER, type1 TEXT, count2 INTEGER, type2 TEXT, count3 INTEGER, type3 TEXT)",
-        "CREATE TABLE entry_progress (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, type INTEGER NOT "
-        "NULL, description TEXT NOT NULL, company_id INTEGER, date DATE NOT NULL)",
-        "CREATE TABLE entry_photo (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, pos INTEGER NOT NULL, "
-        "type INTEGER NOT NULL, photo_image_id INTEGER, caption TEXT NOT NULL, comment TEXT NOT NULL, date DATE NOT "
-        "NULL)",
-        "CREATE TABLE entry_task (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, type INTEGER NOT NULL, "
-        "description TEXT NOT NULL, company_id INTEGER)",
-        "CREATE TABLE entry_constructionmeasure (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
-        "description TEXT NOT NULL, timefrom TIME NOT NULL, timeto TIME NOT NULL, company_id INTEGER)",
-        "CREATE TABLE entry_constructionmaterial (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, material "
-        "TEXT NOT NULL, process TEXT NOT NULL, company_id INTEGER, material_temperature INTEGER NOT NULL, conditions "
-        "TEXT NOT NULL, conditions_ok INTEGER, workflow TEXT NOT NULL, workflow_ok INTEGER, note TEXT NOT NULL)",
-        "CREATE TABLE entry_scheduleddelivery (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
-        "deliverynumber TEXT NOT NULL, deliveryindex TEXT NOT NULL, deliverydate DATE NOT NULL, company_id INTEGER, "
-        "comment TEXT NOT NULL)",
-        "CREATE TABLE addresslist (id INTEGER NOT NULL PRIMARY KEY, name TEXT NOT NULL)",
-        "CREATE TABLE addresslist_item (id INTEGER NOT NULL PRIMARY KEY, addresslist_id INTEGER NOT NULL, active "
-        "INTEGER NOT NULL, bcc INTEGER NOT NULL, type VARCHAR (64) NOT NULL, lastname VARCHAR (64) NOT NULL, company "
-        "VARCHAR (128) NOT NULL, email VARCHAR (128) NOT NULL)",
-        QStringLiteral("INSERT INTO meta VALUES ('fileversion', '%1')").arg(fileVersion),
-        "INSERT INTO vdr VALUES (1, 'Altbau Schillerstraße', NULL, 2, 'Altbau', '', '', 'Korvant', 'Varduna', '', "
-        "'2009-03-01T08:00:00', 2, '', '', 0)",
-        "INSERT INTO company VALUES (1, 1, 'Bauherr', 'Anna', 'Müller', '', '', '', '', '', '', '', '')",
-        "INSERT INTO company VALUES (2, 2, 'Rohbau', '', '', 'Bau GmbH', '', '', '', '', '', '', '')",
-        "INSERT INTO company VALUES (3, 2, 'Elektro', '', '', 'Strom AG', '', '', '', '', '', '', '')",
-        "INSERT INTO entry VALUES (1, 1, NULL, NULL, '001', '2009-03-02', '08:00:00', '16:00:00', '08:00:00', "
-        "'sonnig', '', '', '12', '', 'Rohbau', '', NULL, NULL, NULL, 0)",
-        "INSERT INTO entry VALUES (2, 0, NULL, NULL, '002 (Entwurf)', '2009-03-03', '08:00:00', '16:00:00', "
-        "'08:00:00', 'Regen', '', '', '8', '', '', '', NULL, NULL, NULL, 0)",
-        "INSERT INTO entry_attendee VALUES (1, 1, 1, 'anwesend')",
-        "INSERT INTO entry_workforce VALUES (4, 1, 2, 'Kolonne A', 2, 'Maurer', 3, 'Polier', 0, '')",
-        "INSERT INTO entry_workforce VALUES (5, 1, 3, 'Kolonne B', 1, 'Elektriker', 0, 'Helfer', 4, 'Elektriker')",
-        "INSERT INTO entry_workforce VALUES (6, 2, 2, 'leer', 0, '', 0, '', 0, '')",
-        "INSERT INTO entry_progress VALUES (1, 1, 1, 'Lieferung verspätet', 2, '2009-03-02')",
-        "INSERT INTO entry_progress VALUES (2, 1, 4, 'Riss in Wand', 3, '2009-03-02')",
-        "INSERT INTO entry_task VALUES (1, 1, 1, 'Gerüst prüfen', 2)",
-        "INSERT INTO entry_constructionmeasure VALUES (1, 1, 'Betonieren', '08:00:00', '12:00:00', 2)",
-        "INSERT INTO entry_constructionmaterial VALUES (1, 1, 'Beton C25/30', 'Einbau', 2, 5, 'trocken', 1, "
-        "'zügig', 0, 'Probe genommen')",
-        "INSERT INTO entry_scheduleddelivery VALUES (1, 1, 'P-100', 'a', '2009-03-02', 2, 'Grundriss')",
-        "INSERT INTO id_generator VALUES ('entry', 2)",
-        "INSERT INTO id_generator VALUES ('entry_workforce', 6)",
-        "INSERT INTO id_generator VALUES ('company', 3)",
-    });
+    return execSql(
+        path,
+        {
+            "CREATE TABLE id_generator (id_table TEXT PRIMARY KEY, id_counter INTEGER NOT NULL)",
+            "CREATE TABLE meta (key TEXT PRIMARY KEY, value TEXT NOT NULL)",
+            "CREATE TABLE image (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, image BLOB NOT NULL, "
+            "image_ct TEXT NOT "
+            "NULL, image_width INT NOT NULL, image_height INT NOT NULL, thumbnail BLOB NOT NULL, "
+            "thumbnail_ct TEXT NOT "
+            "NULL, thumbnail_width INT NOT NULL, thumbnail_height INT NOT NULL)",
+            "CREATE TABLE vdr (id INTEGER NOT NULL PRIMARY KEY, name VARCHAR (64) NOT NULL, logo_image_id "
+            "INTEGER, "
+            "logo_align INTEGER NOT NULL, headline_left TEXT NOT NULL, headline_center TEXT NOT NULL, "
+            "headline_right TEXT "
+            "NOT NULL, footer_left TEXT NOT NULL, footer_center TEXT NOT NULL, footer_right TEXT NOT NULL, "
+            "createdate "
+            "DATETIME NOT NULL, entrycounter INTEGER NOT NULL, email_subject TEXT NOT NULL, email_body TEXT "
+            "NOT NULL, "
+            "display_empty_categories INTEGER NOT NULL)",
+            "CREATE TABLE company (id INTEGER NOT NULL PRIMARY KEY, category INTEGER NOT NULL, type VARCHAR "
+            "(64) NOT NULL, "
+            "firstname VARCHAR (64) NOT NULL, lastname VARCHAR (64) NOT NULL, company VARCHAR (128) NOT "
+            "NULL, street "
+            "VARCHAR (128) NOT NULL, plz VARCHAR (16) NOT NULL, city VARCHAR (64) NOT NULL, telephone "
+            "VARCHAR (64) NOT "
+            "NULL, telefax VARCHAR (64) NOT NULL, mobile VARCHAR (64) NOT NULL, email VARCHAR (128) NOT "
+            "NULL)",
+            "CREATE TABLE entry (id INTEGER NOT NULL PRIMARY KEY, locked INTEGER NOT NULL, "
+            "persistent_document BLOB, "
+            "persistent_document_ct TEXT, number TEXT NOT NULL, inspection_date DATE NOT NULL, "
+            "inspection_time_from TIME "
+            "NOT NULL, inspection_time_to TIME NOT NULL, env_time TIME NOT NULL, env_weather1 TEXT NOT NULL, "
+            "env_weather2 "
+            "TEXT NOT NULL, env_weather3 TEXT NOT NULL, env_temperature TEXT NOT NULL, env_humidity TEXT NOT "
+            "NULL, "
+            "progress TEXT NOT NULL, deficiencies TEXT NOT NULL, tests TEXT, interventions TEXT, "
+            "special_incidents TEXT, "
+            "construction_material_sample INTEGER NOT NULL)",
+            "CREATE TABLE entry_attendee (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
+            "company_id INTEGER, "
+            "comment TEXT NOT NULL)",
+            "CREATE TABLE entry_workforce (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
+            "company_id INTEGER, "
+            "comment TEXT NOT NULL, count1 INTEGER, type1 TEXT, count2 INTEGER, type2 TEXT, count3 INTEGER, "
+            "type3 TEXT)",
+            "CREATE TABLE entry_progress (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, type "
+            "INTEGER NOT "
+            "NULL, description TEXT NOT NULL, company_id INTEGER, date DATE NOT NULL)",
+            "CREATE TABLE entry_photo (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, pos "
+            "INTEGER NOT NULL, "
+            "type INTEGER NOT NULL, photo_image_id INTEGER, caption TEXT NOT NULL, comment TEXT NOT NULL, "
+            "date DATE NOT "
+            "NULL)",
+            "CREATE TABLE entry_task (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, type "
+            "INTEGER NOT NULL, "
+            "description TEXT NOT NULL, company_id INTEGER)",
+            "CREATE TABLE entry_constructionmeasure (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
+            "NULL, "
+            "description TEXT NOT NULL, timefrom TIME NOT NULL, timeto TIME NOT NULL, company_id INTEGER)",
+            "CREATE TABLE entry_constructionmaterial (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
+            "NULL, material "
+            "TEXT NOT NULL, process TEXT NOT NULL, company_id INTEGER, material_temperature INTEGER NOT "
+            "NULL, conditions "
+            "TEXT NOT NULL, conditions_ok INTEGER, workflow TEXT NOT NULL, workflow_ok INTEGER, note TEXT "
+            "NOT NULL)",
+            "CREATE TABLE entry_scheduleddelivery (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
+            "NULL, "
+            "deliverynumber TEXT NOT NULL, deliveryindex TEXT NOT NULL, deliverydate DATE NOT NULL, "
+            "company_id INTEGER, "
+            "comment TEXT NOT NULL)",
+            "CREATE TABLE addresslist (id INTEGER NOT NULL PRIMARY KEY, name TEXT NOT NULL)",
+            "CREATE TABLE addresslist_item (id INTEGER NOT NULL PRIMARY KEY, addresslist_id INTEGER NOT "
+            "NULL, active "
+            "INTEGER NOT NULL, bcc INTEGER NOT NULL, type VARCHAR (64) NOT NULL, lastname VARCHAR (64) NOT "
+            "NULL, company "
+            "VARCHAR (128) NOT NULL, email VARCHAR (128) NOT NULL)",
+            QStringLiteral("INSERT INTO meta VALUES ('fileversion', '%1')").arg(fileVersion),
+            "INSERT INTO vdr VALUES (1, 'Altbau Schillerstraße', NULL, 2, 'Altbau', '', '', 'Korvant', "
+            "'Varduna', '', "
+            "'2009-03-01T08:00:00', 2, '', '', 0)",
+            "INSERT INTO company VALUES (1, 1, 'Bauherr', 'Anna', 'Müller', '', '', '', '', '', '', '', '')",
+            "INSERT INTO company VALUES (2, 2, 'Rohbau', '', '', 'Bau GmbH', '', '', '', '', '', '', '')",
+            "INSERT INTO company VALUES (3, 2, 'Elektro', '', '', 'Strom AG', '', '', '', '', '', '', '')",
+            "INSERT INTO entry VALUES (1, 1, NULL, NULL, '001', '2009-03-02', '08:00:00', '16:00:00', "
+            "'08:00:00', "
+            "'sonnig', '', '', '12', '', 'Rohbau', '', NULL, NULL, NULL, 0)",
+            "INSERT INTO entry VALUES (2, 0, NULL, NULL, '002 (Entwurf)', '2009-03-03', '08:00:00', "
+            "'16:00:00', "
+            "'08:00:00', 'Regen', '', '', '8', '', '', '', NULL, NULL, NULL, 0)",
+            "INSERT INTO entry_attendee VALUES (1, 1, 1, 'anwesend')",
+            "INSERT INTO entry_workforce VALUES (4, 1, 2, 'Kolonne A', 2, 'Maurer', 3, 'Polier', 0, '')",
+            "INSERT INTO entry_workforce VALUES (5, 1, 3, 'Kolonne B', 1, 'Elektriker', 0, 'Helfer', 4, "
+            "'Elektriker')",
+            "INSERT INTO entry_workforce VALUES (6, 2, 2, 'leer', 0, '', 0, '', 0, '')",
+            "INSERT INTO entry_progress VALUES (1, 1, 1, 'Lieferung verspätet', 2, '2009-03-02')",
+            "INSERT INTO entry_progress VALUES (2, 1, 4, 'Riss in Wand', 3, '2009-03-02')",
+            "INSERT INTO entry_task VALUES (1, 1, 1, 'Gerüst prüfen', 2)",
+            "INSERT INTO entry_constructionmeasure VALUES (1, 1, 'Betonieren', '08:00:00', '12:00:00', 2)",
+            "INSERT INTO entry_constructionmaterial VALUES (1, 1, 'Beton C25/30', 'Einbau', 2, 5, 'trocken', "
+            "1, "
+            "'zügig', 0, 'Probe genommen')",
+            "INSERT INTO entry_scheduleddelivery VALUES (1, 1, 'P-100', 'a', '2009-03-02', 2, 'Grundriss')",
+            "INSERT INTO id_generator VALUES ('entry', 2)",
+            "INSERT INTO id_generator VALUES ('entry_workforce', 6)",
+            "INSERT INTO id_generator VALUES ('company', 3)",
+        });
 }
 
 } // namespace VDRTestFixtures

@@ -41,7 +41,8 @@ bool VDRTestPrompt::verify(QString* report) const
 {
     QStringList problems = m_unexpected;
     for (const Expectation& e : m_expected)
-        problems << QStringLiteral("expected message \"%1\" (containing \"%2\") never came").arg(e.title, e.textPart);
+        problems << QStringLiteral("expected message \"%1\" (containing \"%2\") never came")
+                        .arg(e.title, e.textPart);
     if (report)
         *report = problems.join(QLatin1Char('\n'));
     return problems.isEmpty();
@@ -70,8 +71,8 @@ VDRPrompt::StandardButton VDRTestPrompt::question(Kind kind, const QString& titl
     return StandardButton(answer);
 }
 
-int VDRTestPrompt::choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons, int,
-                          int escapeIndex, const QString& checkBoxText, bool* checked)
+int VDRTestPrompt::choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons,
+                          int, int escapeIndex, const QString& checkBoxText, bool* checked)
 {
     int answer = -1;
     bool tick = false;

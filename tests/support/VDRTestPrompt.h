@@ -37,8 +37,8 @@ public:
     void message(Kind kind, const QString& title, const QString& text) override;
     StandardButton question(Kind kind, const QString& title, const QString& text, StandardButtons buttons,
                             StandardButton defaultButton, StandardButton escape) override;
-    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons, int defaultIndex,
-               int escapeIndex, const QString& checkBoxText, bool* checked) override;
+    int choose(Kind kind, const QString& title, const QString& text, const QStringList& buttons,
+               int defaultIndex, int escapeIndex, const QString& checkBoxText, bool* checked) override;
     QString openFileName(const QString& title, const QString&, const QString&) override;
     QString saveFileName(const QString& title, const QString&, const QString&) override;
     QString existingDirectory(const QString& title, const QString&) override;
@@ -65,8 +65,8 @@ private:
     VDRPrompt* m_previous;
 };
 
-#define VDR_VERIFY_PROMPT(prompt)                                                                                     \
-    do {                                                                                                              \
-        QString vdrPromptReport;                                                                                      \
-        QVERIFY2((prompt).verify(&vdrPromptReport), qPrintable(vdrPromptReport));                                    \
+#define VDR_VERIFY_PROMPT(prompt)                                                                            \
+    do {                                                                                                     \
+        QString vdrPromptReport;                                                                             \
+        QVERIFY2((prompt).verify(&vdrPromptReport), qPrintable(vdrPromptReport));                            \
     } while (false)
