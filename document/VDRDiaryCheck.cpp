@@ -2,6 +2,7 @@
 
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
+#include "document/VDRScopedConnection.h"
 
 #include <QDir>
 #include <QFileInfo>
@@ -25,30 +26,24 @@ struct ReadOnlyLook
 ReadOnlyLook look(const QString& path, bool integrity)
 {
     ReadOnlyLook result;
-    {
-        QSqlDatabase db =
-            QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QLatin1String(kCheckConnection));
-        db.setDatabaseName(path);
-        db.setConnectOptions(QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"));
-        result.opened = db.open();
-        if (result.opened) {
-            QSqlQuery q(db);
-            if (!q.exec(QStringLiteral("SELECT count(*) FROM sqlite_master"))) {
-                const QString code = q.lastError().nativeErrorCode();
-                result.busy = code == QLatin1String("5") || code == QLatin1String("6");
-                result.integrity = q.lastError().databaseText();
-            } else {
-                q.finish();
-                if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")) && q.next())
-                    result.version = q.value(0).toString();
-                q.finish();
-                if (integrity)
-                    result.integrity = VDRDocument::checkDbIntegrity(db);
-            }
-        }
-        db.close();
+    VDRScopedConnection connection(QLatin1String(kCheckConnection), path,
+                                   QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"), false);
+    result.opened = connection.isOpen();
+    if (!result.opened)
+        return result;
+    QSqlQuery q(connection.db());
+    if (!q.exec(QStringLiteral("SELECT count(*) FROM sqlite_master"))) {
+        const QString code = q.lastError().nativeErrorCode();
+        result.busy = code == QLatin1String("5") || code == QLatin1String("6");
+        result.integrity = q.lastError().databaseText();
+        return result;
     }
-    QSqlDatabase::removeDatabase(QLatin1String(kCheckConnection));
+    q.finish();
+    if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")) && q.next())
+        result.version = q.value(0).toString();
+    q.finish();
+    if (integrity)
+        result.integrity = VDRDocument::checkDbIntegrity(connection.db());
     return result;
 }
 

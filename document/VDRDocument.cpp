@@ -6,6 +6,7 @@
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
 #include "document/VDRPrompt.h"
+#include "document/VDRScopedConnection.h"
 
 #include <QCoreApplication>
 #include <QDate>
@@ -38,37 +39,6 @@ QString nativePath(const QString& path)
 {
     return QDir::toNativeSeparators(path);
 }
-
-// Opens a named connection for one short look at a file and removes it when done.
-class ScopedConnection
-{
-public:
-    ScopedConnection(const QString& name, const QString& path, const QString& options = QString())
-        : m_name(name)
-    {
-        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), name);
-        db.setDatabaseName(path);
-        db.setConnectOptions(options);
-        m_open = db.open();
-        m_error = db.lastError();
-    }
-    ~ScopedConnection()
-    {
-        {
-            QSqlDatabase db = QSqlDatabase::database(m_name, false);
-            db.close();
-        }
-        QSqlDatabase::removeDatabase(m_name);
-    }
-    bool isOpen() const { return m_open; }
-    QSqlError lastError() const { return m_error; }
-    QSqlDatabase db() const { return QSqlDatabase::database(m_name, false); }
-
-private:
-    QString m_name;
-    bool m_open = false;
-    QSqlError m_error;
-};
 
 bool hasSqliteHeader(const QString& path)
 {
@@ -365,8 +335,8 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     if (!QFileInfo::exists(workingCopy))
         return WorkingCopyAbsent;
     // A short wait covers another instance's momentary read; a held lock is held for good.
-    ScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy,
-                          QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"));
+    VDRScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy,
+                             QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"), false);
     if (!lock.isOpen()) {
         VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(lock.lastError()));
         failed = true;
@@ -495,13 +465,12 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
 
     // 4: demo project?
     {
-        ScopedConnection demo(QString::fromLatin1(kDemoConnection), diaryPath);
+        VDRScopedConnection demo(QString::fromLatin1(kDemoConnection), diaryPath);
         if (!demo.isOpen()) {
             VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(demo.lastError()));
             return false;
         }
         QSqlQuery q(demo.db());
-        q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = '%1'").arg(QStringLiteral("isdp"))) &&
             q.next())
             m_demo = q.value(0).toInt() == 42;
@@ -513,13 +482,12 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
     if (!hasSqliteHeader(diaryPath)) {
         integrity = QStringLiteral("not a database");
     } else {
-        ScopedConnection version(QString::fromLatin1(kVersionConnection), diaryPath);
+        VDRScopedConnection version(QString::fromLatin1(kVersionConnection), diaryPath);
         if (!version.isOpen()) {
             VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(version.lastError()));
             return false;
         }
         QSqlQuery q(version.db());
-        q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")) && q.next())
             fileVersion = q.value(0).toString();
         q.finish();

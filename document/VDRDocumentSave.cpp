@@ -7,6 +7,7 @@
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
 #include "document/VDRPrompt.h"
+#include "document/VDRScopedConnection.h"
 
 #include <QCoreApplication>
 #include <QDebug>
@@ -261,21 +262,18 @@ QString VDRDocument::vacuumInto(const QString& target)
     bool ok;
     QSqlError error;
     {
-        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("COMPACT"));
-        db.setDatabaseName(m_workingCopyPath);
-        ok = db.open();
+        VDRScopedConnection connection(QStringLiteral("COMPACT"), m_workingCopyPath, QString(), false);
+        ok = connection.isOpen();
         if (ok) {
-            QSqlQuery q(db);
+            QSqlQuery q(connection.db());
             q.prepare(QStringLiteral("VACUUM INTO ?"));
             q.addBindValue(temporary);
             ok = q.exec();
             error = q.lastError();
         } else {
-            error = db.lastError();
+            error = connection.lastError();
         }
-        db.close();
     }
-    QSqlDatabase::removeDatabase(QStringLiteral("COMPACT"));
     if (ok && !VDRFileOps::flush(temporary))
         ok = false;
     if (!ok) {
@@ -426,18 +424,11 @@ QString VDRDocument::getBackupFile4Restore(const QString& path, int& count)
             continue;
         QString integrity;
         {
-            QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), QStringLiteral("BCKTEST"));
-            db.setDatabaseName(backup);
-            db.setConnectOptions(QStringLiteral("QSQLITE_OPEN_READONLY"));
-            if (db.open()) {
-                QSqlQuery q(db);
-                q.exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
-                q.finish();
-                integrity = checkDbIntegrity(db);
-            }
-            db.close();
+            VDRScopedConnection connection(QStringLiteral("BCKTEST"), backup,
+                                           QStringLiteral("QSQLITE_OPEN_READONLY"));
+            if (connection.isOpen())
+                integrity = checkDbIntegrity(connection.db());
         }
-        QSqlDatabase::removeDatabase(QStringLiteral("BCKTEST"));
         if (integrity == QLatin1String("ok"))
             found = backup;
     }

@@ -4,6 +4,7 @@
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 #include "document/VDRPrompt.h"
+#include "document/VDRScopedConnection.h"
 
 #include <QCoreApplication>
 #include <QDebug>
@@ -37,60 +38,12 @@ QString nativePath(const QString& path)
     return QDir::toNativeSeparators(path);
 }
 
-// A named connection opened for one operation and removed on every way out. Declared before any
-// query so that the queries are gone when it removes the connection.
-class ScopedConnection
-{
-public:
-    ScopedConnection(const QString& name, const QString& path, const QString& options = QString())
-        : m_name(name)
-    {
-        if (QSqlDatabase::contains(name)) {
-            // Someone holds it open; adding it again would pull it from under them.
-            m_error = QSqlError(QString(), QStringLiteral("connection %1 is in use").arg(name),
-                                QSqlError::ConnectionError);
-            return;
-        }
-        m_added = true;
-        QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), name);
-        db.setDatabaseName(path);
-        db.setConnectOptions(options);
-        m_open = db.open();
-        if (m_open)
-            QSqlQuery(db).exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
-        else
-            m_error = db.lastError();
-    }
-    ~ScopedConnection()
-    {
-        if (!m_added)
-            return;
-        {
-            QSqlDatabase db = QSqlDatabase::database(m_name, false);
-            db.close();
-        }
-        QSqlDatabase::removeDatabase(m_name);
-    }
-    ScopedConnection(const ScopedConnection&) = delete;
-    ScopedConnection& operator=(const ScopedConnection&) = delete;
-
-    bool isOpen() const { return m_open; }
-    QSqlError lastError() const { return m_error; }
-    QSqlDatabase db() const { return QSqlDatabase::database(m_name, false); }
-
-private:
-    QString m_name;
-    bool m_added = false;
-    bool m_open = false;
-    QSqlError m_error;
-};
-
 // The connection "DOCUMENTS" on an existing documents database.
-class DocumentsConnection : public ScopedConnection
+class DocumentsConnection : public VDRScopedConnection
 {
 public:
     explicit DocumentsConnection(const QString& diaryPath)
-        : ScopedConnection(VDRDocumentsDb::connectionName(), VDRDocument::documentsDbPathFor(diaryPath))
+        : VDRScopedConnection(VDRDocumentsDb::connectionName(), VDRDocument::documentsDbPathFor(diaryPath))
     {
     }
 };
@@ -207,7 +160,7 @@ bool VDRDocumentsDb::createDocumentsDb(const QString& diaryPath)
     const QString errorTitle = tr("Datenbankfehler Dokumente-DB");
     bool ok = false;
     {
-        ScopedConnection connection(connectionName(), path);
+        VDRScopedConnection connection(connectionName(), path);
         if (!connection.isOpen()) {
             VDRPrompt::critical(errorTitle, CVdShared::sqlErrorText(connection.lastError()));
         } else {
@@ -551,8 +504,8 @@ bool VDRDocumentsDb::compactDocumentDB(const QString& diaryPath, bool showMessag
             QFileInfo(workingCopy.databaseName()) == QFileInfo(VDRDocument::workingCopyPathFor(diaryPath))) {
             removeDeadRecordsInDocumentDB(connection.db(), workingCopy);
         } else if (QFileInfo::exists(diaryPath)) {
-            ScopedConnection diary(QString::fromLatin1(kDiaryConnection), diaryPath,
-                                   QStringLiteral("QSQLITE_OPEN_READONLY"));
+            VDRScopedConnection diary(QString::fromLatin1(kDiaryConnection), diaryPath,
+                                      QStringLiteral("QSQLITE_OPEN_READONLY"));
             if (diary.isOpen())
                 removeDeadRecordsInDocumentDB(connection.db(), diary.db());
         }

@@ -1,0 +1,28 @@
+#pragma once
+
+#include <QSqlDatabase>
+#include <QSqlError>
+#include <QString>
+
+// A named SQLite connection opened for one operation and removed on every way out. Declare it
+// before any query on it, so that the queries are gone when it removes the connection.
+class VDRScopedConnection
+{
+public:
+    // 'exclusive' sets "PRAGMA locking_mode = EXCLUSIVE", as every file other than the working copy gets.
+    VDRScopedConnection(const QString& name, const QString& path, const QString& options = QString(),
+                        bool exclusive = true);
+    ~VDRScopedConnection();
+    VDRScopedConnection(const VDRScopedConnection&) = delete;
+    VDRScopedConnection& operator=(const VDRScopedConnection&) = delete;
+
+    bool isOpen() const { return m_open; }
+    QSqlError lastError() const { return m_error; }
+    QSqlDatabase db() const { return QSqlDatabase::database(m_name, false); }
+
+private:
+    QString m_name;
+    bool m_added = false;
+    bool m_open = false;
+    QSqlError m_error;
+};
