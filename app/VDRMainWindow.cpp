@@ -266,8 +266,9 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
         if (QFileInfo(target).suffix().isEmpty())
             target += QStringLiteral(".vd2");
     }
+    const int shown = VDRPrompt::messagesShown();
     const int result = m_document->saveDocument(target);
-    if (result == 2)
+    if (result == 2 && VDRPrompt::messagesShown() == shown)
         VDRPrompt::critical(tr("Fehler"), tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
     // A failed or refused save must stop whatever wanted to close the document.
     if (result != 0)

@@ -3,6 +3,7 @@
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
+#include "document/VDRFileOps.h"
 
 #include <QCoreApplication>
 #include <QDate>
@@ -34,6 +35,7 @@ enum CheckExit
     CheckDamaged = 3,
     CheckHeld = 4,
     CheckNewer = 5,
+    CheckRefused = 6,
 };
 
 const char* const kHelp =
@@ -50,7 +52,8 @@ const char* const kHelp =
     "                      one line per report (number with author, date, locked), then close\n"
     "                      without saving.\n"
     "  check FILE          Read-only: integrity, structure version, working copy and its holder,\n"
-    "                      backups. Touches nothing.\n"
+    "                      backups, and whether opening would succeed (tried on private copies).\n"
+    "                      Touches nothing.\n"
     "  save FILE           Open FILE as the application does (upgrading an older structure after\n"
     "                      its question) and save it over itself, turning the previous file into\n"
     "                      the newest backup (one backup generation per run).\n"
@@ -87,7 +90,9 @@ const char* const kHelp =
     "  2  missing (no such file, or not a file)\n"
     "  3  damaged (failed integrity check, or not a diary)\n"
     "  4  held by a running instance\n"
-    "  5  made by a newer program version\n";
+    "  5  made by a newer program version\n"
+    "  6  opening would refuse it for another reason (printed as Reason:), for example a\n"
+    "     missing table, or a folder where the working copy cannot be created\n";
 
 QTextStream& out()
 {
@@ -112,11 +117,20 @@ int cmdNew(const QString& file)
     VDRDocument doc;
     if (!doc.createDocument(true))
         return ExitRefused;
+    // Documents of an earlier diary of this name do not belong to the new one.
+    const QString documents = VDRDocument::documentsDbPathFor(QFileInfo(file).absoluteFilePath());
+    if (QFileInfo::exists(documents) && !VDRFileOps::removeDatabase(documents)) {
+        VDRPrompt::critical(QObject::tr("Dateifehler"),
+                            VDRFileOps::withReason(QObject::tr("Löschen der Datei\n%1\n fehlgeschlagen.")
+                                                       .arg(QDir::toNativeSeparators(documents))));
+        doc.closeDocument();
+        return ExitRefused;
+    }
     const bool written = doc.writeWorkingCopyTo(QFileInfo(file).absoluteFilePath());
     doc.closeDocument();
     if (!written) {
         VDRPrompt::critical(QObject::tr("Dateifehler"),
-                            QObject::tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(file));
+                            VDRFileOps::withReason(QObject::tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(file)));
         return ExitRefused;
     }
     out() << QFileInfo(file).absoluteFilePath() << "\n";
@@ -126,6 +140,8 @@ int cmdNew(const QString& file)
 int cmdInfo(const QString& file, bool json)
 {
     VDRDocument doc;
+    // Looking must not change anything: a crashed session's working copy stays for its owner.
+    doc.setInspecting(true);
     bool showError = true;
     if (!doc.openDocument(file, showError)) {
         if (showError)
@@ -197,8 +213,9 @@ int cmdSave(const QString& file)
     VDRDocument doc;
     if (!openForCommand(doc, file))
         return ExitRefused;
+    const int shown = VDRPrompt::messagesShown();
     const int result = doc.saveDocument(QString());
-    if (result == 2)
+    if (result == 2 && VDRPrompt::messagesShown() == shown)
         VDRPrompt::critical(QObject::tr("Fehler"),
                             QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
     doc.closeDocument();
@@ -264,9 +281,13 @@ int cmdRestore(const QString& file)
 int cmdCheck(const QString& file, bool json)
 {
     const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
-    static const char* const statusNames[] = {"can be opened", "missing", "damaged",
-                                              "held by a running instance", "made by a newer version"};
-    static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged, CheckHeld, CheckNewer};
+    static const char* const statusNames[] = {"can be opened",
+                                              "missing",
+                                              "damaged",
+                                              "held by a running instance",
+                                              "made by a newer version",
+                                              "cannot be opened"};
+    static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged, CheckHeld, CheckNewer, CheckRefused};
     if (json) {
         QJsonObject o;
         o.insert(QStringLiteral("status"), QLatin1String(statusNames[r.status]));
@@ -283,6 +304,8 @@ int cmdCheck(const QString& file, bool json)
             o.insert(QStringLiteral("lockInfo"), holder);
         }
         o.insert(QStringLiteral("backups"), QJsonArray::fromStringList(r.backups));
+        if (!r.reason.isEmpty())
+            o.insert(QStringLiteral("reason"), r.reason);
         out() << QJsonDocument(o).toJson(QJsonDocument::Indented);
         out().flush();
         return exitCodes[r.status];
@@ -293,13 +316,15 @@ int cmdCheck(const QString& file, bool json)
         return exitCodes[r.status];
     }
     out() << "Integrity: " << r.integrity << "\n";
+    if (!r.reason.isEmpty())
+        out() << "Reason: " << QString(r.reason).replace(QLatin1Char('\n'), QLatin1Char(' ')) << "\n";
     out() << "Dateiversion: " << (r.version.isEmpty() ? QStringLiteral("-") : r.version) << "\n";
     out() << "Working copy: "
           << (r.workingCopyExists ? (r.workingCopyHeld ? "held" : "present, not held") : "none") << "\n";
     if (r.workingCopyExists) {
         if (r.lockInfo.size() >= 4)
             out() << "Lock: User: " << r.lockInfo[0] << ", Computer: " << r.lockInfo[1] << ", seit dem "
-                  << r.lockInfo[2] << " " << r.lockInfo[3] << " Uhr\n";
+                  << VDRDocument::lockDateText(r.lockInfo[2]) << " " << r.lockInfo[3] << " Uhr\n";
         else
             out() << "Lock: no lock information\n";
     }

@@ -2,6 +2,8 @@
 
 #include <QThread>
 
+#include <functional>
+
 // Copies a large file off the GUI thread while the caller waits. The copy is flushed to disk;
 // with 'replace' it is renamed over the target, otherwise it stays under a temporary name beside
 // the target (temporaryFile()) for the caller to move into place.
@@ -16,7 +18,8 @@ public:
     QString temporaryFile() const { return m_temporary; }
 
     // Runs the copy and waits for its end, keeping timers and painting alive but not user input.
-    bool copyAndWait();
+    // 'meanwhile' runs on the calling thread while the copy runs.
+    bool copyAndWait(const std::function<void()>& meanwhile = nullptr);
 
 protected:
     void run() override;

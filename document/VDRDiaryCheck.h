@@ -14,7 +14,8 @@ public:
         Missing,
         Damaged,
         Held,
-        Newer
+        Newer,
+        Refused // opening would refuse it for another reason, given in 'reason'
     };
 
     struct Result
@@ -26,8 +27,10 @@ public:
         bool workingCopyHeld = false;
         QStringList lockInfo; // user, computer, date, time
         QStringList backups;  // newest first
+        QString reason;       // why opening would refuse it
     };
 
+    // Predicts what opening the diary would do, and leaves every file as it was.
     static Result inspect(const QString& path);
     // True when a running instance holds this working copy (read-only probe, no waiting).
     static bool isHeld(const QString& workingCopy);

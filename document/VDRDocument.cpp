@@ -3,6 +3,7 @@
 #include "document/CVdShared.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDatabaseSchema.h"
+#include "document/VDRDiaryCheck.h"
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRFileOps.h"
 #include "document/VDRPrompt.h"
@@ -25,6 +26,7 @@
 
 #include <cstdlib>
 #include <ctime>
+#include <pwd.h>
 #include <unistd.h>
 
 namespace {
@@ -46,6 +48,52 @@ bool hasSqliteHeader(const QString& path)
     if (!f.open(QIODevice::ReadOnly))
         return false;
     return f.read(16) == QByteArray("SQLite format 3\0", 16);
+}
+
+enum SqliteCode
+{
+    SqliteBusy = 5,
+    SqliteLocked = 6,
+    SqliteCorrupt = 11,
+    SqliteConstraint = 19,
+    SqliteNotADb = 26
+};
+
+bool provesDamage(const QSqlError& error)
+{
+    const int code = VDRScopedConnection::sqliteCode(error);
+    return code == SqliteCorrupt || code == SqliteNotADb;
+}
+
+// The write that makes SQLite take the lock: insert and delete the dummy row of meta. A dummy row
+// left by a process killed between the two statements is removed first.
+bool writeDummyRow(const QSqlDatabase& db, QSqlError& error)
+{
+    QSqlQuery q(db);
+    const QString insert = QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');");
+    const QString remove = QStringLiteral("DELETE FROM meta WHERE KEY='dummy';");
+    bool ok = q.exec(insert);
+    if (!ok && VDRScopedConnection::sqliteCode(q.lastError()) == SqliteConstraint)
+        ok = q.exec(remove) && q.exec(insert);
+    ok = ok && q.exec(remove);
+    if (!ok)
+        error = q.lastError();
+    return ok;
+}
+
+// "ok", the first problem quick_check found, or "NoResult" with the reason the check could not run.
+QString integrityOf(const QSqlDatabase& db, QSqlError* failure = nullptr)
+{
+    QSqlQuery q(db);
+    if (q.exec(QStringLiteral("PRAGMA quick_check;")) && q.next())
+        return q.value(0).toString();
+    const QSqlError error = q.lastError();
+    if (failure)
+        *failure = error;
+    qDebug() << "integrity check without result:" << error.text();
+    // A file SQLite cannot read at all has no result row; say why when SQLite told us.
+    const QString text = CVdShared::sqlErrorText(error).trimmed();
+    return text.isEmpty() ? QStringLiteral("NoResult") : QStringLiteral("NoResult: ") + text;
 }
 
 } // namespace
@@ -102,7 +150,12 @@ QString VDRDocument::documentsDbPathFor(const QString& diaryPath)
 
 QString VDRDocument::currentUserName()
 {
-    const QString user = qEnvironmentVariable("USER");
+    QString user = qEnvironmentVariable("USER");
+    if (user.isEmpty()) {
+        // Services and some terminals start programs without USER; the login name still exists.
+        if (const passwd* entry = ::getpwuid(::getuid()))
+            user = QString::fromLocal8Bit(entry->pw_name);
+    }
     return user.isEmpty() ? QStringLiteral("unbekannt") : user;
 }
 
@@ -168,17 +221,25 @@ QString VDRDocument::getFreeTempFile(const QString& suffix)
 
 QString VDRDocument::checkDbIntegrity(QSqlDatabase db)
 {
-    QSqlQuery q(db);
-    if (q.exec(QStringLiteral("PRAGMA quick_check;")) && q.next())
-        return q.value(0).toString();
-    const QString error = q.lastError().text();
-    qDebug() << "integrity check without result:" << error;
-    QSqlQuery probe(db);
-    if (probe.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")))
-        probe.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
-    qDebug() << "dummy row test:" << probe.lastError().text();
-    // A file SQLite cannot read at all has no result row; say why when SQLite told us.
-    return error.trimmed().isEmpty() ? QStringLiteral("NoResult") : QStringLiteral("NoResult: ") + error;
+    // Only reads: the connection may be one on the diary file itself, which only saving changes.
+    return integrityOf(db);
+}
+
+QString VDRDocument::lockDateText(const QString& stored)
+{
+    // The file keeps the date in Qt's fixed text form; the user reads it in the interface's form.
+    const QDate parsed = QDate::fromString(stored, Qt::TextDate);
+    return parsed.isValid() ? parsed.toString(QStringLiteral("dd.MM.yyyy")) : stored;
+}
+
+QString VDRDocument::lockHolderText(const QStringList& holder)
+{
+    if (holder.size() < 4)
+        return tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist.");
+    const QString date = lockDateText(holder[2]);
+    return tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist von\nUser: %1\nComputer: "
+              "%2\nseit dem %3 %4 Uhr.")
+        .arg(holder[0], holder[1], date, holder[3]);
 }
 
 void VDRDocument::beginTransaction()
@@ -214,6 +275,7 @@ void VDRDocument::clearState()
     m_workingCopyPath.clear();
     m_lockInfoPath.clear();
     m_fileVersion.clear();
+    m_inspecting = false;
     m_transactionDepth = 0;
     m_masterDataModified = false;
     m_deletedImages = 0;
@@ -334,32 +396,36 @@ VDRDocument::LockState VDRDocument::probeWorkingCopy(const QString& workingCopy,
     failed = false;
     if (!QFileInfo::exists(workingCopy))
         return WorkingCopyAbsent;
+    // Whatever else goes wrong here, the copy may hold the only state of unsaved work: it is
+    // discarded only when SQLite proves it damaged.
+    auto refuse = [&](const QSqlError& error) {
+        VDRPrompt::critical(tr("Datenbankfehler"),
+                            tr("Die Working Copy Datei\n%1\nkann nicht geöffnet werden:\n%2\nDie Datei "
+                               "bleibt erhalten, damit keine ungespeicherten Änderungen verloren gehen.")
+                                .arg(nativePath(workingCopy), CVdShared::sqlErrorText(error)));
+        failed = true;
+        return WorkingCopyAbsent;
+    };
     // A short wait covers another instance's momentary read; a held lock is held for good.
     VDRScopedConnection lock(QString::fromLatin1(kLockConnection), workingCopy,
                              QStringLiteral("QSQLITE_BUSY_TIMEOUT=1000"), false);
-    if (!lock.isOpen()) {
-        VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(lock.lastError()));
-        failed = true;
-        return WorkingCopyAbsent;
-    }
-    QSqlQuery insert(lock.db());
-    if (!insert.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');"))) {
-        const QSqlError error = insert.lastError();
-        insert.finish();
-        // Only a busy database (SQLITE_BUSY, SQLITE_LOCKED) means a running instance holds it;
-        // any other failure means the copy itself is broken.
-        if (error.nativeErrorCode() == QLatin1String("5") || error.nativeErrorCode() == QLatin1String("6"))
+    if (!lock.isOpen())
+        return refuse(lock.lastError());
+    QSqlError error;
+    if (!writeDummyRow(lock.db(), error)) {
+        const int code = VDRScopedConnection::sqliteCode(error);
+        if (code == SqliteBusy || code == SqliteLocked)
             return WorkingCopyLocked;
+        if (provesDamage(error))
+            return WorkingCopyCorrupt;
+        return refuse(error);
+    }
+    const QString integrity = integrityOf(lock.db(), &error);
+    if (integrity == QLatin1String("ok"))
+        return WorkingCopyFree;
+    if (!integrity.startsWith(QLatin1String("NoResult")) || provesDamage(error))
         return WorkingCopyCorrupt;
-    }
-    QSqlQuery remove(lock.db());
-    if (!remove.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"))) {
-        VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(remove.lastError()));
-        failed = true;
-        return WorkingCopyAbsent;
-    }
-    const QString integrity = checkDbIntegrity(lock.db());
-    return integrity == QLatin1String("ok") ? WorkingCopyFree : WorkingCopyCorrupt;
+    return refuse(error);
 }
 
 bool VDRDocument::discardWorkingCopy(const QString& workingCopy, const QString& lockInfo,
@@ -410,44 +476,64 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         showError = false;
         return false;
     }
+    const bool inspecting = m_inspecting;
     clearState();
+    m_inspecting = inspecting;
     const QString diaryPath = info.absoluteFilePath();
     const QString lockInfo = lockInfoPathFor(diaryPath);
     const QString workingCopy = workingCopyPathFor(diaryPath);
 
-    // 3: a working copy is already there.
+    // 3: a working copy is already there. An inspection probes a private copy of it, so that
+    // neither the copy nor its lock information changes.
     bool resume = false;
+    QString resumedCopy = workingCopy;
     {
+        QString probed = workingCopy;
+        if (m_inspecting && QFileInfo::exists(workingCopy)) {
+            if (VDRDiaryCheck::isHeld(workingCopy)) {
+                probed.clear();
+            } else {
+                probed = getFreeTempFile(QStringLiteral(".vd2"));
+                m_filesToRemove << probed + QStringLiteral("-journal");
+                if (!VDRFileOps::copy(workingCopy, probed)) {
+                    VDRPrompt::critical(tr("Dateifehler"),
+                                        VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
+                                                                   .arg(nativePath(workingCopy))));
+                    abandonOpening(false);
+                    showError = false;
+                    return false;
+                }
+                // An interrupted transaction is rolled back from its journal, as resuming would.
+                const QString journal = workingCopy + QStringLiteral("-journal");
+                if (QFileInfo::exists(journal))
+                    VDRFileOps::copy(journal, probed + QStringLiteral("-journal"));
+            }
+        }
         bool failed = false;
-        const LockState state = probeWorkingCopy(workingCopy, failed);
-        if (failed)
+        const LockState state = probed.isEmpty() ? WorkingCopyLocked : probeWorkingCopy(probed, failed);
+        if (failed) {
+            abandonOpening(false);
+            showError = false;
             return false;
+        }
         switch (state) {
         case WorkingCopyAbsent:
             break;
         case WorkingCopyCorrupt:
-            if (!discardWorkingCopy(workingCopy, QString(), diaryPath))
+            if (!m_inspecting && !discardWorkingCopy(workingCopy, QString(), diaryPath))
                 return false;
             break;
-        case WorkingCopyLocked: {
-            const QStringList holder = readLockInfo(lockInfo);
-            QString text;
-            if (holder.size() >= 4)
-                text = tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist von\nUser: "
-                          "%1\nComputer: "
-                          "%2\nseit dem %3 %4 Uhr.")
-                           .arg(holder[0], holder[1], holder[2], holder[3]);
-            else
-                text = tr("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist.");
-            VDRPrompt::warning(tr("Datenbank in Bearbeitung"), text);
+        case WorkingCopyLocked:
+            VDRPrompt::warning(tr("Datenbank in Bearbeitung"), lockHolderText(readLockInfo(lockInfo)));
+            abandonOpening(false);
             showError = false;
             return false;
-        }
         case WorkingCopyFree: {
             const QStringList holder = readLockInfo(lockInfo);
             if (holder.size() >= 2 && holder[0] == currentUserName() && holder[1] == currentComputerName()) {
                 resume = true;
-            } else if (!discardWorkingCopy(workingCopy, lockInfo, diaryPath)) {
+                resumedCopy = probed;
+            } else if (!m_inspecting && !discardWorkingCopy(workingCopy, lockInfo, diaryPath)) {
                 return false;
             }
             break;
@@ -455,7 +541,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         }
     }
     // Nobody holds the diary: what an interrupted save left beside it can go.
-    cleanUpInterruptedSave(diaryPath);
+    if (!m_inspecting)
+        cleanUpInterruptedSave(diaryPath);
     if (resume)
         VDRPrompt::information(
             tr("Datei öffnen"),
@@ -464,43 +551,86 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                "Stand behalten wollen."));
 
     // 4: demo project?
-    {
-        VDRScopedConnection demo(QString::fromLatin1(kDemoConnection), diaryPath);
-        if (!demo.isOpen()) {
-            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(demo.lastError()));
+    const bool isDatabase = hasSqliteHeader(diaryPath);
+    if (isDatabase) {
+        const auto demo = VDRScopedConnection::readOnlyLook(QString::fromLatin1(kDemoConnection), diaryPath);
+        if (!demo->isOpen()) {
+            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(demo->lastError()));
+            abandonOpening(false);
             return false;
         }
-        QSqlQuery q(demo.db());
+        QSqlQuery q(demo->db());
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = '%1'").arg(QStringLiteral("isdp"))) &&
             q.next())
             m_demo = q.value(0).toInt() == 42;
     }
 
-    // 5: version and integrity.
+    // 6: the working copy. It is made before the checks of step 5, which then read the fresh copy
+    // (still in memory) instead of reading the diary from disk twice.
+    m_filePath = diaryPath;
+    m_workingCopyPath = resume ? resumedCopy : workingCopy;
+    bool madeWorkingCopy = false;
+    auto makeWorkingCopy = [&]() {
+        if (m_inspecting) {
+            m_workingCopyPath = getFreeTempFile(QStringLiteral(".vd2"));
+            madeWorkingCopy = VDRFileOps::copy(diaryPath, m_workingCopyPath);
+        } else {
+            // A journal left without its copy (deleted by hand or by a sync client) would be rolled
+            // into the fresh copy as if it were its own.
+            m_workingCopyPath = workingCopy;
+            for (const char* companion : {"-journal", "-wal", "-shm"})
+                QFile::remove(workingCopy + QLatin1String(companion));
+            if (VDRFileOps::copy(diaryPath, workingCopy)) {
+                madeWorkingCopy = true;
+            } else if (m_demo) {
+                m_workingCopyPath = getFreeTempFile(QStringLiteral(".vd2"));
+                madeWorkingCopy = VDRFileOps::copy(diaryPath, m_workingCopyPath);
+            }
+        }
+        if (!madeWorkingCopy) {
+            VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(
+                                                       tr("Die Working Copy Datei konnte nicht erstellt werden.")));
+            abandonOpening(m_demo || m_inspecting);
+            showError = false;
+        }
+        return madeWorkingCopy;
+    };
+    if (!resume && isDatabase && !makeWorkingCopy())
+        return false;
+
+    // 5: version and integrity; when resuming, of the diary itself, read without touching it.
     QString fileVersion;
-    QString integrity;
-    if (!hasSqliteHeader(diaryPath)) {
-        integrity = QStringLiteral("not a database");
-    } else {
-        VDRScopedConnection version(QString::fromLatin1(kVersionConnection), diaryPath);
-        if (!version.isOpen()) {
-            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(version.lastError()));
+    QString integrity = QStringLiteral("not a database");
+    if (isDatabase) {
+        const auto version =
+            resume ? VDRScopedConnection::readOnlyLook(QString::fromLatin1(kVersionConnection), diaryPath)
+                   : std::make_unique<VDRScopedConnection>(QString::fromLatin1(kVersionConnection),
+                                                           m_workingCopyPath);
+        if (!version->isOpen()) {
+            VDRPrompt::critical(tr("Datenbankfehler"), CVdShared::sqlErrorText(version->lastError()));
+            abandonOpening(madeWorkingCopy);
             return false;
         }
-        QSqlQuery q(version.db());
+        QSqlQuery q(version->db());
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")) && q.next())
             fileVersion = q.value(0).toString();
         q.finish();
-        integrity = checkDbIntegrity(version.db());
+        integrity = integrityOf(version->db());
     }
     if (integrity != QLatin1String("ok")) {
         qWarning().noquote() << "integrity of" << diaryPath << ":" << integrity;
+        // The copy of a damaged file is made again should the user open it anyway.
+        if (madeWorkingCopy) {
+            VDRFileOps::removeDatabase(m_workingCopyPath);
+            madeWorkingCopy = false;
+        }
         int count = 0;
         const QString backup = getBackupFile4Restore(diaryPath, count);
-        if (count == 0 && !hasSqliteHeader(diaryPath)) {
+        if (count == 0 && !isDatabase) {
             // Not a database at all and nothing to restore from: nothing the user could open.
             VDRPrompt::critical(tr("Dateifehler"),
                                 tr("Die Datei\n%1\nist keine Varduna-Datei.").arg(nativePath(path)));
+            abandonOpening(false);
             showError = false;
             return false;
         }
@@ -517,6 +647,13 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                 VDRPrompt::Warning, tr("Beschädigte Datenbank-Datei"), text,
                 {tr("Backup wiederherstellen"), tr("Beschädigte Datei öffnen")}, 0, 1);
             if (choice == 0) {
+                const bool inspection = m_inspecting;
+                abandonOpening(false);
+                if (inspection) {
+                    // An inspection changes no file; it shows what the backup holds instead.
+                    m_inspecting = true;
+                    return openDocument(backup, showError);
+                }
                 QString newName;
                 QString error;
                 if (restoreBackupFile(diaryPath, backup, newName, error)) {
@@ -543,45 +680,29 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                 VDRPrompt::instance()->choose(VDRPrompt::Warning, tr("Beschädigte Datenbank-Datei"), text,
                                               {tr("Abbrechen"), tr("Beschädigte Datei öffnen")}, 1, 0);
             if (choice != 1) {
+                abandonOpening(false);
                 showError = false;
                 return false;
             }
         }
+        if (!resume && !makeWorkingCopy())
+            return false;
     } else if (VDRDatabaseSchema::isNewerThanCurrent(fileVersion)) {
         VDRPrompt::warning(tr("Datei öffnen"),
                            tr("Die Datei kann nicht geöffnet werden, da sie mit einer neueren "
                               "Programmversion erstellt wurde."));
+        abandonOpening(madeWorkingCopy);
         showError = false;
         return false;
     }
 
-    // 6: the working copy.
-    m_filePath = diaryPath;
-    m_lockInfoPath = lockInfo;
-    m_workingCopyPath = workingCopy;
-    bool madeWorkingCopy = false;
-    if (!resume) {
-        if (VDRFileOps::copy(diaryPath, workingCopy)) {
-            madeWorkingCopy = true;
-        } else if (m_demo) {
-            m_workingCopyPath = getFreeTempFile(QStringLiteral(".vd2"));
-            madeWorkingCopy = VDRFileOps::copy(diaryPath, m_workingCopyPath);
-        }
-        if (!madeWorkingCopy) {
-            VDRPrompt::critical(tr("Dateifehler"),
-                                tr("Die Working Copy Datei konnte nicht erstellt werden."));
-            const bool isDemo = m_demo;
-            abandonOpening(isDemo);
-            showError = false;
-            return false;
-        }
-    }
     // The lock-information file belongs beside a working copy beside the diary, not to a temporary one.
-    if (m_workingCopyPath != workingCopy)
-        m_lockInfoPath.clear();
+    if (m_workingCopyPath == workingCopy)
+        m_lockInfoPath = lockInfo;
 
-    // 7: write permission. The demo is never saved, so its shipped read-only mode stays.
-    if (!m_demo && !VDRFileOps::isWritable(diaryPath)) {
+    // 7: write permission. The demo is never saved, so its shipped read-only mode stays; an
+    // inspection neither saves nor changes modes.
+    if (!m_demo && !m_inspecting && !VDRFileOps::isWritable(diaryPath)) {
         QFile::setPermissions(diaryPath, QFile::permissions(diaryPath) | QFile::ReadOwner |
                                              QFile::WriteOwner | QFile::ReadUser | QFile::WriteUser);
         if (!VDRFileOps::isWritable(diaryPath) && !m_demo)
@@ -602,16 +723,17 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         QSqlQuery q(database());
         // The dummy write only takes the lock. Synced, it would force the whole fresh copy to disk
         // here; the user's first edit syncs it anyway, and a copy broken before that holds no edits.
-        q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
-        const bool locked =
-            q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")) &&
-            q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
-        const QSqlError error = q.lastError();
+        // A resumed copy holds exactly the unsaved edits and stays synced.
+        if (!resume)
+            q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
+        QSqlError error;
+        const bool locked = writeDummyRow(database(), error);
         q.exec(QStringLiteral("PRAGMA synchronous = FULL"));
+        q.finish();
         if (!locked) {
             VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(error));
-            q.finish();
             abandonOpening(madeWorkingCopy);
+            showError = false;
             return false;
         }
     }
@@ -660,8 +782,8 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         VDRPrompt::warning(tr("Datei-Warnung"), text);
     }
 
-    // 13
-    {
+    // 13: moves files into the documents database beside the diary, which an inspection leaves alone.
+    if (!m_inspecting) {
         QSqlQuery q(database());
         QString state;
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'documentImport'")) && q.next())
@@ -725,7 +847,7 @@ bool VDRDocument::closeDocument()
     removeTemporaryFiles();
     if (!lockInfo.isEmpty())
         QFile::remove(lockInfo);
-    if (!diaryPath.isEmpty()) {
+    if (!diaryPath.isEmpty() && !m_inspecting) {
         VDRDocumentsDb::resetChangesOnDocumentsDb(diaryPath);
         VDRDocumentsDb::checkDocumentDBsFreeSpace(diaryPath);
     }
@@ -754,12 +876,30 @@ bool VDRDocument::reopenWorkingCopyAfterError()
 {
     destroyModels();
     closeConnection();
+    // SQLite would make an empty database of a missing file, and the document would seem valid.
+    if (!QFileInfo(m_workingCopyPath).isFile()) {
+        VDRPrompt::critical(tr("Dateifehler"), tr("Die Working Copy Datei\n%1\nexistiert nicht mehr.")
+                                                   .arg(nativePath(m_workingCopyPath)));
+        return false;
+    }
     if (!openWorkingCopyConnection(true))
         return false;
-    QSqlQuery q(database());
-    if (q.exec(QStringLiteral("INSERT INTO meta (KEY, VALUE) VALUES('dummy', 'dummy');")))
-        q.exec(QStringLiteral("DELETE FROM meta WHERE KEY='dummy';"));
-    q.finish();
+    QSqlError error;
+    {
+        // The copy was flushed when it was written; the lock's write needs no second flush.
+        QSqlQuery q(database());
+        q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
+        const bool locked = writeDummyRow(database(), error);
+        q.exec(QStringLiteral("PRAGMA synchronous = FULL"));
+        if (!locked) {
+            q.finish();
+            VDRPrompt::critical(tr("Datenbankfehler"),
+                                tr("Die Working Copy Datei\n%1\nkann nicht wieder gesperrt werden:\n%2")
+                                    .arg(nativePath(m_workingCopyPath), CVdShared::sqlErrorText(error)));
+            closeConnection();
+            return false;
+        }
+    }
     initModels();
     m_valid = true;
     return true;

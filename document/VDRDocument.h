@@ -26,6 +26,11 @@ public:
     static QString connectionName() { return QStringLiteral("VDNDOC"); }
 
     bool createDocument(bool hideSyncButton);
+    // The next opening only looks: it works on private temporary copies, so that the diary, a
+    // working copy left by a crash, its lock information and everything beside the diary stay
+    // exactly as they are. Cleared by closing.
+    void setInspecting(bool inspecting) { m_inspecting = inspecting; }
+    bool isInspecting() const { return m_inspecting; }
     bool openDocument(const QString& path, bool& showError);
     bool closeDocument();
     // Ends without closing properly, as a crash would: the working copy and the lock information
@@ -66,6 +71,9 @@ public:
 
     // "ok" for an intact database, "NoResult" when the check yields nothing, else the first problem.
     static QString checkDbIntegrity(QSqlDatabase db);
+    // The message about a diary held by someone else, from its lock information.
+    static QString lockHolderText(const QStringList& holder);
+    static QString lockDateText(const QString& stored);
     bool reopenWorkingCopyAfterError();
     // Writes the committed working copy to 'target' (closing and reopening the connection around
     // the copy so the lock is never dropped by a stray file handle).
@@ -358,6 +366,7 @@ private:
     int reopenAfterSave(int result);
     bool replaceDiaryKeepingBackups(const QString& temporary);
     bool saveAs(const QString& target);
+    QString copyCheckedWorkingCopy(const QString& target, const QString& failureText);
 
     bool m_valid = false;
     bool m_new = false;
@@ -365,6 +374,7 @@ private:
     bool m_saved = false;
     bool m_structureExtended = false;
     bool m_demo = false;
+    bool m_inspecting = false;
     QString m_filePath;
     QString m_workingCopyPath;
     QString m_lockInfoPath;

@@ -10,6 +10,9 @@
 #include "document/VDRScopedConnection.h"
 
 #include <QCoreApplication>
+#include <QEventLoop>
+#include <QThread>
+#include <QTimer>
 #include <QDebug>
 #include <QDir>
 #include <QFileInfo>
@@ -99,8 +102,8 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (n < 1 || !QFileInfo::exists(diary)) {
         if (VDRFileOps::replaceFile(temporary, diary))
             return true;
-        VDRPrompt::critical(tr("Dateifehler"),
-                            tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
+                                                                        .arg(nativePath(diary))));
         return false;
     }
 
@@ -113,7 +116,8 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
         QFile::remove(dropped);
         if (!VDRFileOps::rename(backup, dropped)) {
             VDRPrompt::critical(tr("Dateifehler"),
-                                tr("Löschen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(backup)));
+                                VDRFileOps::withReason(
+                                    tr("Löschen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(backup))));
             dropped.clear();
             return false;
         }
@@ -131,9 +135,9 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
                 continue;
             const QString to = backupName(diary, k + 1);
             if (!VDRFileOps::rename(from, to)) {
-                VDRPrompt::critical(
-                    tr("Dateifehler"),
-                    tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(from)));
+                VDRPrompt::critical(tr("Dateifehler"),
+                                    VDRFileOps::withReason(tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.")
+                                                               .arg(nativePath(from))));
                 undo(done);
                 return false;
             }
@@ -152,16 +156,24 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (!linked) {
         renamed = VDRFileOps::rename(diary, newest);
         if (!renamed) {
-            VDRPrompt::critical(
-                tr("Dateifehler"),
-                tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+            VDRPrompt::critical(tr("Dateifehler"),
+                                VDRFileOps::withReason(tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.")
+                                                           .arg(nativePath(diary))));
             undo(done);
             return false;
         }
     }
-    if (!VDRFileOps::replaceFile(temporary, diary)) {
-        VDRPrompt::critical(tr("Dateifehler"),
-                            tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary)));
+    bool replaced = false;
+    if (!VDRFileOps::replaceFile(temporary, diary, &replaced)) {
+        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
+                                                                        .arg(nativePath(diary))));
+        if (replaced) {
+            // The new diary is in place but its folder could not be flushed: the save failed and
+            // says so, and every backup stays where the rotation put it.
+            if (!dropped.isEmpty())
+                VDRFileOps::removeInBackground(dropped, diary);
+            return false;
+        }
         if (renamed)
             QFile::rename(newest, diary);
         else
@@ -172,6 +184,34 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (!dropped.isEmpty())
         VDRFileOps::removeInBackground(dropped, diary);
     return true;
+}
+
+// Copies the closed working copy to a flushed temporary file beside 'target' and checks the working
+// copy's integrity while the copy runs: a damaged copy is never saved over a diary. Returns the
+// temporary file, empty after a failure (explained to the user).
+QString VDRDocument::copyCheckedWorkingCopy(const QString& target, const QString& failureText)
+{
+    CopyThread copy(m_workingCopyPath, target);
+    copy.setReplaceTarget(false);
+    QString integrity;
+    const bool copied = copy.copyAndWait([&] {
+        const auto check = VDRScopedConnection::readOnlyLook(QStringLiteral("SAVECHECK"), m_workingCopyPath);
+        integrity = check->isOpen() ? checkDbIntegrity(check->db())
+                                    : CVdShared::sqlErrorText(check->lastError());
+    });
+    if (!copied) {
+        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(failureText));
+        return QString();
+    }
+    if (integrity != QLatin1String("ok")) {
+        QFile::remove(copy.temporaryFile());
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Die Working Copy Datei\n%1\nist beschädigt und wird nicht gespeichert:\n%2\n"
+                               "Die Datei %3 bleibt unverändert.")
+                                .arg(nativePath(m_workingCopyPath), integrity, nativePath(target)));
+        return QString();
+    }
+    return copy.temporaryFile();
 }
 
 bool VDRDocument::saveAs(const QString& target)
@@ -191,15 +231,20 @@ bool VDRDocument::saveAs(const QString& target)
         return false;
     }
 
-    CopyThread copy(m_workingCopyPath, target);
-    if (!copy.copyAndWait()) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der Working Copy Datei."));
+    const QString copied = copyCheckedWorkingCopy(target, tr("Fehler beim Kopieren der Working Copy Datei."));
+    if (copied.isEmpty())
+        return false;
+    if (!VDRFileOps::replaceFile(copied, target)) {
+        QFile::remove(copied);
+        VDRPrompt::critical(tr("Dateifehler"),
+                            VDRFileOps::withReason(tr("Fehler beim Kopieren der Working Copy Datei.")));
         return false;
     }
     const QString documents = m_filePath.isEmpty() ? QString() : documentsDbPathFor(m_filePath);
     if (!documents.isEmpty() && QFileInfo::exists(documents)) {
         if (!VDRFileOps::copyDurably(documents, documentsDbPathFor(target))) {
-            VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der Dokumente Datenbank."));
+            VDRPrompt::critical(tr("Dateifehler"),
+                                VDRFileOps::withReason(tr("Fehler beim Kopieren der Dokumente Datenbank.")));
             return false;
         }
     } else {
@@ -207,13 +252,15 @@ bool VDRDocument::saveAs(const QString& target)
         VDRFileOps::removeDatabase(documentsDbPathFor(target));
     }
     if (!writeLockInfo(targetLockInfo)) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der User Data Datei."));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            VDRFileOps::withReason(tr("Fehler beim Kopieren der User Data Datei.")));
         return false;
     }
     VDRFileOps::removeDatabase(targetWorkingCopy);
     if (!VDRFileOps::move(m_workingCopyPath, targetWorkingCopy)) {
         QFile::remove(targetLockInfo);
-        VDRPrompt::critical(tr("Dateifehler"), tr("Fehler beim Kopieren der Working Copy Datei."));
+        VDRPrompt::critical(tr("Dateifehler"),
+                            VDRFileOps::withReason(tr("Fehler beim Kopieren der Working Copy Datei.")));
         return false;
     }
     VDRFileOps::removeDatabase(m_workingCopyPath);
@@ -259,26 +306,62 @@ QString VDRDocument::vacuumInto(const QString& target)
     const QString temporary = VDRFileOps::emptyTemporaryBeside(target);
     if (temporary.isEmpty())
         return QString();
-    bool ok;
+    bool ok = false;
     QSqlError error;
-    {
-        VDRScopedConnection connection(QStringLiteral("COMPACT"), m_workingCopyPath, QString(), false);
+    QString integrity;
+    // The rebuild runs on a thread of its own (with its own connection) so that the window keeps
+    // painting and shows how far it has come: the new file grows towards the size of the old one.
+    const QString source = m_workingCopyPath;
+    std::unique_ptr<QThread> worker(QThread::create([&] {
+        VDRScopedConnection connection(QStringLiteral("COMPACT"), source, QString(), false);
         ok = connection.isOpen();
-        if (ok) {
-            QSqlQuery q(connection.db());
-            q.prepare(QStringLiteral("VACUUM INTO ?"));
-            q.addBindValue(temporary);
-            ok = q.exec();
-            error = q.lastError();
-        } else {
+        if (!ok) {
             error = connection.lastError();
+            return;
         }
+        // A damaged copy is never compacted into a diary.
+        integrity = checkDbIntegrity(connection.db());
+        if (integrity != QLatin1String("ok")) {
+            ok = false;
+            return;
+        }
+        QSqlQuery q(connection.db());
+        q.prepare(QStringLiteral("VACUUM INTO ?"));
+        q.addBindValue(temporary);
+        ok = q.exec();
+        error = q.lastError();
+    }));
+    const qint64 sourceSize = std::max<qint64>(1, QFileInfo(source).size());
+    QEventLoop loop;
+    QTimer progress;
+    QObject::connect(&progress, &QTimer::timeout, [&] {
+        VDRPrompt::instance()->noticeProgress(int(std::min<qint64>(99, QFileInfo(temporary).size() * 100 / sourceSize)));
+    });
+    QObject::connect(worker.get(), &QThread::finished, &loop, &QEventLoop::quit);
+    progress.start(200);
+    worker->start();
+    if (!worker->isFinished())
+        loop.exec(QEventLoop::ExcludeUserInputEvents);
+    worker->wait();
+    progress.stop();
+    VDRPrompt::instance()->noticeProgress(100);
+    if (!integrity.isEmpty() && integrity != QLatin1String("ok")) {
+        QFile::remove(temporary);
+        VDRPrompt::critical(tr("Dateifehler"),
+                            tr("Die Working Copy Datei\n%1\nist beschädigt und wird nicht gespeichert:\n%2\n"
+                               "Die Datei %3 bleibt unverändert.")
+                                .arg(nativePath(source), integrity, nativePath(target)));
+        return QString();
     }
-    if (ok && !VDRFileOps::flush(temporary))
-        ok = false;
+    if (ok && !VDRFileOps::flush(temporary)) {
+        QFile::remove(temporary);
+        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
+                                                                        .arg(nativePath(target))));
+        return QString();
+    }
     if (!ok) {
         QFile::remove(temporary);
-        if (error.isValid())
+        if (error.type() != QSqlError::NoError)
             VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(error));
         VDRPrompt::warning(tr("Datenbank bereinigen"),
                            tr("Aufgrund eines SQL-Fehlers konnte die Datenbank nicht bereinigt werden."));
@@ -367,15 +450,10 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
             if (temporary.isEmpty())
                 return reopenAfterSave(2);
         } else {
-            CopyThread copy(m_workingCopyPath, m_filePath);
-            copy.setReplaceTarget(false);
-            if (!copy.copyAndWait()) {
-                VDRPrompt::critical(
-                    tr("Dateifehler"),
-                    tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+            temporary = copyCheckedWorkingCopy(
+                m_filePath, tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+            if (temporary.isEmpty())
                 return reopenAfterSave(2);
-            }
-            temporary = copy.temporaryFile();
         }
         if (!replaceDiaryKeepingBackups(temporary)) {
             QFile::remove(temporary);
@@ -503,9 +581,15 @@ bool VDRDocument::removeObsoleteImages()
                 break;
             }
         }
-        if (ok && !hasMetaKey(QStringLiteral("imageDeletion")))
+        // Asked of the file, not of the meta model, which does not see rows written past it.
+        bool marked = false;
+        if (ok && q.exec(QStringLiteral("SELECT 1 FROM meta WHERE key = 'imageDeletion'")))
+            marked = q.next();
+        if (ok && !marked)
             ok = q.exec(QStringLiteral("INSERT INTO meta (key, value) VALUES ( 'imageDeletion', 'done' )"));
         endTransaction();
+        if (ok && m_modelMeta)
+            m_modelMeta->select();
     }
     if (!ok) {
         VDRPrompt::warning(QStringLiteral("SQL Error"), CVdShared::sqlErrorText(q.lastError()));
@@ -564,8 +648,13 @@ int VDRDocument::compactDB(bool showReport)
     VDRDocumentsDb::compactDocumentDB(m_filePath);
     m_deletedImages = 0;
     m_deletedAudio = 0;
+    const int shown = VDRPrompt::messagesShown();
     const int saved = saveDocumentImpl(QString(), true);
     VDRPrompt::instance()->endNotice();
+    if (saved == 1)
+        return 1; // a question was answered with "cancel": nothing failed
+    if (saved != 0 && VDRPrompt::messagesShown() != shown)
+        return 2; // already explained
     if (saved != 0) {
         VDRPrompt::warning(tr("Datenbank bereinigen"),
                            tr("Beim Speichern der bereinigten Datenbank ist ein Fehler aufgetreten!"));

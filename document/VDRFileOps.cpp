@@ -1,5 +1,6 @@
 #include "document/VDRFileOps.h"
 
+#include <QCoreApplication>
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
@@ -8,51 +9,69 @@
 #include <QTemporaryFile>
 #include <QThreadPool>
 
+#include <atomic>
+#include <cerrno>
 #include <cstdio>
+#include <cstring>
 #include <fcntl.h>
 #include <unistd.h>
 
 namespace {
 VDRFileOps::FailurePredicate g_failure;
+int g_failureErrno = EIO;
+// Copies run on a worker thread while the caller waits, so the reason is kept process-wide.
+std::atomic<int> g_lastError{0};
 
 const char* const kTemporaryInfix = ".save-";
+// Its own name, so that a removal still running is never taken for a save's temporary file.
+const char* const kRemovalInfix = ".removing-";
 
-// After a rename the directory entry must reach the disk too, or a power cut can undo it.
-void syncDirectory(const QString& path)
+QThreadPool& removalPool()
 {
-    const int fd =
-        ::open(QFile::encodeName(QFileInfo(path).absolutePath()).constData(), O_RDONLY | O_DIRECTORY);
-    if (fd >= 0) {
-        ::fsync(fd);
-        ::close(fd);
-    }
+    static QThreadPool pool;
+    return pool;
 }
+
 // The kernel copies without the data passing through this process where it can (copy_file_range);
-// elsewhere, or when that fails at the start, a plain read and write loop does it.
-bool copyContents(QFile& in, QFile& out)
+// elsewhere, or when that fails at the start, a plain read and write loop does it. Returns 0 or
+// the errno of the failure.
+int copyContents(int in, int out, qint64 size)
 {
-    const qint64 size = in.size();
     qint64 done = 0;
     while (done < size) {
-        const ssize_t n =
-            ::copy_file_range(in.handle(), nullptr, out.handle(), nullptr, size_t(size - done), 0);
+        const ssize_t n = ::copy_file_range(in, nullptr, out, nullptr, size_t(size - done), 0);
+        if (n < 0 && errno != ENOSYS && errno != EXDEV && errno != EINVAL && errno != EOPNOTSUPP)
+            return errno;
         if (n <= 0)
             break;
         done += n;
     }
     if (done == size)
-        return true;
-    if (!in.seek(done) || !out.seek(done))
-        return false;
-    QByteArray buffer;
+        return 0;
+    if (::lseek(in, done, SEEK_SET) < 0 || ::lseek(out, done, SEEK_SET) < 0)
+        return errno;
+    std::vector<char> buffer(4 * 1024 * 1024);
     for (;;) {
-        buffer = in.read(4 * 1024 * 1024);
-        if (buffer.isEmpty())
+        const ssize_t n = ::read(in, buffer.data(), buffer.size());
+        if (n < 0) {
+            if (errno == EINTR)
+                continue;
+            return errno;
+        }
+        if (n == 0)
             break;
-        if (out.write(buffer) != buffer.size())
-            return false;
+        for (ssize_t written = 0; written < n;) {
+            const ssize_t w = ::write(out, buffer.data() + written, size_t(n - written));
+            if (w < 0) {
+                if (errno == EINTR)
+                    continue;
+                return errno;
+            }
+            written += w;
+        }
+        done += n;
     }
-    return in.error() == QFileDevice::NoError && out.flush() && out.size() == size;
+    return done == size ? 0 : EIO;
 }
 
 } // namespace
@@ -60,11 +79,86 @@ bool copyContents(QFile& in, QFile& out)
 void VDRFileOps::setFailurePredicate(FailurePredicate predicate)
 {
     g_failure = std::move(predicate);
+    g_failureErrno = EIO;
+}
+
+void VDRFileOps::setFailureErrno(int errorNumber)
+{
+    g_failureErrno = errorNumber;
 }
 
 bool VDRFileOps::shouldFail(Op op, const QString& path)
 {
-    return g_failure && g_failure(op, QFileInfo(path).absoluteFilePath());
+    if (!g_failure || !g_failure(op, QFileInfo(path).absoluteFilePath()))
+        return false;
+    setLastError(g_failureErrno);
+    return true;
+}
+
+void VDRFileOps::setLastError(int errorNumber)
+{
+    g_lastError = errorNumber;
+}
+
+QString VDRFileOps::reasonText(int errorNumber)
+{
+    // The C library speaks the process's locale, which need not be the interface's language.
+    switch (errorNumber) {
+    case 0:
+        return QString();
+    case ENOSPC:
+        return QCoreApplication::translate("VDRFileOps", "Auf dem Gerät ist kein Speicherplatz mehr verfügbar.");
+    case EDQUOT:
+        return QCoreApplication::translate("VDRFileOps", "Der zugewiesene Plattenplatz (Quota) ist überschritten.");
+    case EACCES:
+    case EPERM:
+        return QCoreApplication::translate("VDRFileOps", "Keine Berechtigung.");
+    case EROFS:
+        return QCoreApplication::translate("VDRFileOps", "Das Dateisystem ist nur lesbar.");
+    case EIO:
+        return QCoreApplication::translate("VDRFileOps", "Eingabe-/Ausgabefehler.");
+    case ENOENT:
+        return QCoreApplication::translate("VDRFileOps", "Datei oder Verzeichnis nicht gefunden.");
+    case EFBIG:
+        return QCoreApplication::translate("VDRFileOps", "Die Datei ist zu groß.");
+    case ENAMETOOLONG:
+        return QCoreApplication::translate("VDRFileOps", "Der Dateiname ist zu lang.");
+    case EBUSY:
+        return QCoreApplication::translate("VDRFileOps", "Das Gerät oder die Ressource ist belegt.");
+    default:
+        return QString::fromLocal8Bit(std::strerror(errorNumber));
+    }
+}
+
+QString VDRFileOps::lastErrorText()
+{
+    return reasonText(g_lastError);
+}
+
+QString VDRFileOps::withReason(const QString& text)
+{
+    const QString reason = lastErrorText();
+    if (reason.isEmpty())
+        return text;
+    return text.endsWith(QLatin1Char('\n')) ? text + reason : text + QLatin1Char('\n') + reason;
+}
+
+// After a rename the directory entry must reach the disk too, or a power cut can undo it.
+bool VDRFileOps::syncFolderOf(const QString& path)
+{
+    const QString folder = QFileInfo(path).absolutePath();
+    if (shouldFail(SyncFolder, folder))
+        return false;
+    const int fd = ::open(QFile::encodeName(folder).constData(), O_RDONLY | O_DIRECTORY);
+    if (fd < 0) {
+        setLastError(errno);
+        return false;
+    }
+    const bool ok = ::fsync(fd) == 0;
+    if (!ok)
+        setLastError(errno);
+    ::close(fd);
+    return ok;
 }
 
 bool VDRFileOps::copy(const QString& source, const QString& target)
@@ -85,17 +179,33 @@ bool VDRFileOps::rename(const QString& source, const QString& target)
 {
     if (shouldFail(Rename, target))
         return false;
-    if (!QFile::rename(source, target))
+    // Like QFile::rename, never over an existing file.
+    if (QFileInfo::exists(target)) {
+        setLastError(EEXIST);
         return false;
-    syncDirectory(target);
-    return true;
+    }
+    if (std::rename(QFile::encodeName(source).constData(), QFile::encodeName(target).constData()) != 0) {
+        const int error = errno;
+        if (error != EXDEV || !QFile::rename(source, target)) {
+            setLastError(error);
+            return false;
+        }
+    }
+    if (syncFolderOf(target))
+        return true;
+    // Not durable is not done: the caller undoes what it did before and reports the failure.
+    std::rename(QFile::encodeName(target).constData(), QFile::encodeName(source).constData());
+    return false;
 }
 
 bool VDRFileOps::remove(const QString& path)
 {
     if (shouldFail(Remove, path))
         return false;
-    return QFile::remove(path);
+    if (::unlink(QFile::encodeName(path).constData()) == 0)
+        return true;
+    setLastError(errno);
+    return false;
 }
 
 bool VDRFileOps::removeDatabase(const QString& path)
@@ -111,10 +221,14 @@ bool VDRFileOps::link(const QString& existing, const QString& newName)
 {
     if (shouldFail(Link, newName))
         return false;
-    if (::link(QFile::encodeName(existing).constData(), QFile::encodeName(newName).constData()) != 0)
+    if (::link(QFile::encodeName(existing).constData(), QFile::encodeName(newName).constData()) != 0) {
+        setLastError(errno);
         return false;
-    syncDirectory(newName);
-    return true;
+    }
+    if (syncFolderOf(newName))
+        return true;
+    QFile::remove(newName);
+    return false;
 }
 
 bool VDRFileOps::move(const QString& source, const QString& target)
@@ -122,8 +236,10 @@ bool VDRFileOps::move(const QString& source, const QString& target)
     if (shouldFail(Rename, target))
         return false;
     if (QFile::rename(source, target)) {
-        syncDirectory(target);
-        return true;
+        if (syncFolderOf(target))
+            return true;
+        QFile::rename(target, source);
+        return false;
     }
     if (!copyDurably(source, target))
         return false;
@@ -136,13 +252,20 @@ bool VDRFileOps::writeFileAtomically(const QString& path, const QByteArray& byte
     if (shouldFail(Write, path))
         return false;
     QSaveFile file(path);
-    if (!file.open(QIODevice::WriteOnly))
+    if (!file.open(QIODevice::WriteOnly)) {
+        setLastError(errno);
         return false;
+    }
     if (file.write(bytes) != bytes.size()) {
+        setLastError(errno);
         file.cancelWriting();
         return false;
     }
-    return file.commit();
+    if (!file.commit()) {
+        setLastError(errno);
+        return false;
+    }
+    return true;
 }
 
 bool VDRFileOps::isWritable(const QString& path)
@@ -162,15 +285,24 @@ QString VDRFileOps::writeDurableCopy(const QString& source, const QString& targe
 QString VDRFileOps::copyToTemporary(const QString& source, const QString& target, bool flush)
 {
     QFile in(source);
-    if (!in.open(QIODevice::ReadOnly))
+    if (!in.open(QIODevice::ReadOnly)) {
+        setLastError(errno);
         return QString();
+    }
     const QFileInfo targetInfo(target);
     QTemporaryFile out(targetInfo.absolutePath() + QLatin1Char('/') + targetInfo.fileName() +
                        QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
-    if (!out.open())
+    if (!out.open()) {
+        setLastError(errno);
         return QString();
-    if (!copyContents(in, out) || (flush && ::fsync(out.handle()) != 0))
+    }
+    int error = copyContents(in.handle(), out.handle(), in.size());
+    if (!error && flush && ::fsync(out.handle()) != 0)
+        error = errno;
+    if (error) {
+        setLastError(error);
         return QString();
+    }
     out.setPermissions(in.permissions() | QFileDevice::WriteOwner | QFileDevice::ReadOwner);
     out.setAutoRemove(false);
     return out.fileName();
@@ -183,8 +315,10 @@ QString VDRFileOps::emptyTemporaryBeside(const QString& target)
     const QFileInfo fi(target);
     QTemporaryFile file(fi.absolutePath() + QLatin1Char('/') + fi.fileName() +
                         QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
-    if (!file.open())
+    if (!file.open()) {
+        setLastError(errno);
         return QString();
+    }
     file.setAutoRemove(false);
     return file.fileName();
 }
@@ -192,18 +326,29 @@ QString VDRFileOps::emptyTemporaryBeside(const QString& target)
 bool VDRFileOps::flush(const QString& path)
 {
     QFile file(path);
-    return file.open(QIODevice::ReadWrite) && ::fsync(file.handle()) == 0;
+    if (file.open(QIODevice::ReadWrite) && ::fsync(file.handle()) == 0)
+        return true;
+    setLastError(errno);
+    return false;
 }
 
-bool VDRFileOps::replaceFile(const QString& temporary, const QString& target)
+bool VDRFileOps::replaceFile(const QString& temporary, const QString& target, bool* renamed)
 {
+    if (renamed)
+        *renamed = false;
     if (shouldFail(Rename, target))
         return false;
+    // The new file keeps what the user set on the old one.
+    if (QFileInfo::exists(target))
+        QFile::setPermissions(temporary, QFile::permissions(target));
     // rename(2) replaces the target atomically; QFile::rename would refuse an existing one.
-    if (std::rename(QFile::encodeName(temporary).constData(), QFile::encodeName(target).constData()) != 0)
+    if (std::rename(QFile::encodeName(temporary).constData(), QFile::encodeName(target).constData()) != 0) {
+        setLastError(errno);
         return false;
-    syncDirectory(target);
-    return true;
+    }
+    if (renamed)
+        *renamed = true;
+    return syncFolderOf(target);
 }
 
 bool VDRFileOps::copyDurably(const QString& source, const QString& target)
@@ -211,8 +356,10 @@ bool VDRFileOps::copyDurably(const QString& source, const QString& target)
     const QString temporary = writeDurableCopy(source, target);
     if (temporary.isEmpty())
         return false;
-    if (!replaceFile(temporary, target)) {
-        QFile::remove(temporary);
+    bool renamed = false;
+    if (!replaceFile(temporary, target, &renamed)) {
+        if (!renamed)
+            QFile::remove(temporary);
         return false;
     }
     return true;
@@ -222,7 +369,7 @@ void VDRFileOps::removeInBackground(const QString& path, const QString& neighbou
 {
     const QFileInfo fi(neighbour);
     QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() +
-                        QLatin1String(kTemporaryInfix) + QStringLiteral("XXXXXX.tmp"));
+                        QLatin1String(kRemovalInfix) + QStringLiteral("XXXXXX.tmp"));
     if (!name.open()) {
         QFile::remove(path);
         return;
@@ -235,15 +382,21 @@ void VDRFileOps::removeInBackground(const QString& path, const QString& neighbou
         QFile::remove(path);
         return;
     }
-    QThreadPool::globalInstance()->start([doomed] { QFile::remove(doomed); });
+    removalPool().start([doomed] { QFile::remove(doomed); });
+}
+
+void VDRFileOps::waitForBackgroundRemovals()
+{
+    removalPool().waitForDone();
 }
 
 QStringList VDRFileOps::leftoverTemporaries(const QString& target)
 {
     const QFileInfo fi(target);
-    const QRegularExpression pattern(QStringLiteral("^%1%2[A-Za-z0-9]{6}\\.tmp$")
+    const QRegularExpression pattern(QStringLiteral("^%1(%2|%3)[A-Za-z0-9]{6}\\.tmp$")
                                          .arg(QRegularExpression::escape(fi.fileName()),
-                                              QRegularExpression::escape(QLatin1String(kTemporaryInfix))));
+                                              QRegularExpression::escape(QLatin1String(kTemporaryInfix)),
+                                              QRegularExpression::escape(QLatin1String(kRemovalInfix))));
     QStringList result;
     const QDir dir = fi.absoluteDir();
     for (const QString& name : dir.entryList(QDir::Files | QDir::Hidden)) {

@@ -17,7 +17,8 @@ public:
         Remove,
         Write,
         CheckWritable,
-        Link
+        Link,
+        SyncFolder
     };
 
     static bool copy(const QString& source, const QString& target);
@@ -41,22 +42,38 @@ public:
     static QString emptyTemporaryBeside(const QString& target);
     // Flushes a finished file to disk.
     static bool flush(const QString& path);
-    // Renames 'temporary' over 'target' in one step and makes the rename itself durable.
-    static bool replaceFile(const QString& temporary, const QString& target);
+    // Renames 'temporary' over 'target' in one step, keeping the permissions of the file it
+    // replaces, and makes the rename itself durable. 'renamed' tells a caller that must not undo
+    // anything whether the rename happened even though flushing the folder failed.
+    static bool replaceFile(const QString& temporary, const QString& target, bool* renamed = nullptr);
     // writeDurableCopy and replaceFile: 'target' is at every instant absent/old or the complete copy.
     static bool copyDurably(const QString& source, const QString& target);
     // Deletes a file in the background: a large backup takes a while to free on some file systems,
     // and nobody waits for it. The file first gets a temporary name beside 'neighbour' so that a
     // crash leaves only a leftover the next opening removes.
     static void removeInBackground(const QString& path, const QString& neighbour);
-    // Temporary files a durable copy to 'target' left behind when it was interrupted.
+    // Waits until every removal started by removeInBackground has finished.
+    static void waitForBackgroundRemovals();
+    // Temporary files a durable copy or a background removal beside 'target' left behind when it
+    // was interrupted.
     static QStringList leftoverTemporaries(const QString& target);
+
+    // Why the last failed file operation failed, as the operating system says it in the
+    // user's language ("Auf dem Gerät ist kein Speicherplatz mehr verfügbar."); empty when unknown.
+    static QString lastErrorText();
+    static QString reasonText(int errorNumber);
+    // 'text' followed by the reason of the last failure on a line of its own, when there is one.
+    static QString withReason(const QString& text);
 
     // Test hook: return true to make the operation on 'path' fail. Null restores normal behaviour.
     using FailurePredicate = std::function<bool(Op op, const QString& path)>;
     static void setFailurePredicate(FailurePredicate predicate);
+    // The error an injected failure reports (EIO unless set).
+    static void setFailureErrno(int errorNumber);
 
 private:
     static bool shouldFail(Op op, const QString& path);
+    static bool syncFolderOf(const QString& path);
+    static void setLastError(int errorNumber);
     static QString copyToTemporary(const QString& source, const QString& target, bool flush);
 };

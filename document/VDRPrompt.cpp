@@ -37,6 +37,8 @@ VDRPrompt* g_prompt = nullptr;
 
 } // namespace
 
+int VDRPrompt::s_shown = 0;
+
 VDRPrompt::~VDRPrompt() = default;
 
 VDRPrompt* VDRPrompt::instance()

@@ -64,23 +64,27 @@ public:
     // A box without buttons shown during long work; endNotice() closes it.
     virtual void beginNotice(const QString& title, const QString& text) = 0;
     virtual void endNotice() = 0;
+    // How far the work of the open notice has come, 0 to 100.
+    virtual void noticeProgress(int percent) { Q_UNUSED(percent) }
 
     // Nesting busy cursor.
     virtual void setBusy(bool busy) = 0;
 
     // Shorthands.
-    static void information(const QString& title, const QString& text)
+    static void information(const QString& title, const QString& text) { shown(Information, title, text); }
+    static void warning(const QString& title, const QString& text) { shown(Warning, title, text); }
+    static void critical(const QString& title, const QString& text) { shown(Critical, title, text); }
+    // How many messages the shorthands have shown: a caller that reports a failure in general
+    // terms stays silent when the failing code already explained it (one problem, one message).
+    static int messagesShown() { return s_shown; }
+
+private:
+    static void shown(Kind kind, const QString& title, const QString& text)
     {
-        instance()->message(Information, title, text);
+        ++s_shown;
+        instance()->message(kind, title, text);
     }
-    static void warning(const QString& title, const QString& text)
-    {
-        instance()->message(Warning, title, text);
-    }
-    static void critical(const QString& title, const QString& text)
-    {
-        instance()->message(Critical, title, text);
-    }
+    static int s_shown;
 };
 
 Q_DECLARE_OPERATORS_FOR_FLAGS(VDRPrompt::StandardButtons)

@@ -1,6 +1,7 @@
 #include "document/VDRScopedConnection.h"
 
 #include <QSqlQuery>
+#include <QUrl>
 
 VDRScopedConnection::VDRScopedConnection(const QString& name, const QString& path, const QString& options,
                                          bool exclusive)
@@ -32,4 +33,17 @@ VDRScopedConnection::~VDRScopedConnection()
         db.close();
     }
     QSqlDatabase::removeDatabase(m_name);
+}
+
+std::unique_ptr<VDRScopedConnection> VDRScopedConnection::readOnlyLook(const QString& name, const QString& path)
+{
+    QUrl uri = QUrl::fromLocalFile(path);
+    uri.setQuery(QStringLiteral("immutable=1"));
+    return std::make_unique<VDRScopedConnection>(name, uri.toString(QUrl::FullyEncoded),
+                                   QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_OPEN_URI"), false);
+}
+
+int VDRScopedConnection::sqliteCode(const QSqlError& error)
+{
+    return error.nativeErrorCode().toInt() & 0xff;
 }

@@ -109,17 +109,33 @@ QString VDRWidgetPrompt::existingDirectory(const QString& title, const QString& 
 void VDRWidgetPrompt::beginNotice(const QString& title, const QString& text)
 {
     endNotice();
-    m_notice = new QMessageBox(QMessageBox::Information, title, text, QMessageBox::NoButton, m_parent);
-    m_notice->setAttribute(Qt::WA_DeleteOnClose);
-    m_notice->setStandardButtons(QMessageBox::NoButton);
+    // A progress box: a message box without buttons refuses to be closed.
+    m_notice = new QProgressDialog(text, QString(), 0, 0, m_parent);
+    m_notice->setWindowTitle(title);
+    m_notice->setCancelButton(nullptr);
+    m_notice->setWindowModality(Qt::WindowModal);
+    m_notice->setMinimumDuration(0);
+    m_notice->setAutoClose(false);
+    m_notice->setAutoReset(false);
     m_notice->show();
     QApplication::processEvents(QEventLoop::ExcludeUserInputEvents);
 }
 
+void VDRWidgetPrompt::noticeProgress(int percent)
+{
+    if (!m_notice)
+        return;
+    m_notice->setRange(0, 100);
+    m_notice->setValue(qBound(0, percent, 100));
+}
+
 void VDRWidgetPrompt::endNotice()
 {
-    if (m_notice)
-        m_notice->close();
+    if (!m_notice)
+        return;
+    m_notice->hide();
+    m_notice->deleteLater();
+    m_notice.clear();
 }
 
 void VDRWidgetPrompt::setBusy(bool busy)

@@ -3,6 +3,7 @@
 #include "document/VDRPrompt.h"
 
 #include <QPointer>
+#include <QProgressDialog>
 
 class QMessageBox;
 class QWidget;
@@ -23,9 +24,10 @@ public:
     QString existingDirectory(const QString& title, const QString& dir) override;
     void beginNotice(const QString& title, const QString& text) override;
     void endNotice() override;
+    void noticeProgress(int percent) override;
     void setBusy(bool busy) override;
 
 private:
     QPointer<QWidget> m_parent;
-    QPointer<QMessageBox> m_notice;
+    QPointer<QProgressDialog> m_notice;
 };

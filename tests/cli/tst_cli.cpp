@@ -264,7 +264,7 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
 
     const QString holder = QStringLiteral("User: %1\nComputer: %2\nseit dem %3 ")
                                .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName(),
-                                    QDate::currentDate().toString());
+                                    QDate::currentDate().toString(QStringLiteral("dd.MM.yyyy")));
     const Run info = cli({QStringLiteral("info"), path, QStringLiteral("--yes")});
     QCOMPARE(info.exitCode, 2);
     QVERIFY2(info.err.startsWith(

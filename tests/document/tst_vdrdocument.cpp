@@ -352,7 +352,7 @@ void TestVDRDocument::fileHeldByAnotherProcess()
         m_prompt.expect(
             QStringLiteral("Datenbank in Bearbeitung"),
             QStringLiteral("da sie in Bearbeitung ist von\nUser: kollegin\nComputer: %1\nseit dem %2 ")
-                .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString()));
+                .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString(QStringLiteral("dd.MM.yyyy"))));
     else
         m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
                         QStringLiteral("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist."));

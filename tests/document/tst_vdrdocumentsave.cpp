@@ -27,6 +27,8 @@ bool intact(const QString& path)
 // The names beside the diary, backups and leftovers included.
 QStringList filesBeside(const QString& path)
 {
+    // A dropped backup is removed in the background; the listing shows the state after it.
+    VDRFileOps::waitForBackgroundRemovals();
     QStringList names = QFileInfo(path).absoluteDir().entryList(QDir::Files);
     names.sort();
     return names;
@@ -162,8 +164,9 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete_data()
     QTest::addColumn<int>("failAt");
     QTest::addColumn<bool>("firstSave");
     // A first save touches: the copy, putting the oldest backup aside, three renames, the link,
-    // the final rename. Failing each in turn, and a few past the end (nothing fails then).
-    for (int n = 1; n <= 8; ++n) {
+    // the final rename, each rename and link followed by flushing the folder. Failing each in turn,
+    // and a few past the end (nothing fails then).
+    for (int n = 1; n <= 15; ++n) {
         QTest::newRow(qPrintable(QStringLiteral("first save, operation %1").arg(n))) << n << true;
         QTest::newRow(qPrintable(QStringLiteral("later save, operation %1").arg(n))) << n << false;
     }
@@ -199,10 +202,15 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete()
     rename(doc, QStringLiteral("Neuer Stand"));
     int count = 0;
     const QString folder = QFileInfo(path).absolutePath();
+    bool finalRenameDone = false;
+    bool finalFlushFailed = false;
     VDRFileOps::setFailurePredicate([&](VDRFileOps::Op op, const QString& p) {
         if (op == VDRFileOps::CheckWritable || !p.startsWith(folder))
             return false;
-        return ++count == failAt;
+        const bool fail = ++count == failAt;
+        finalFlushFailed |= fail && finalRenameDone && op == VDRFileOps::SyncFolder;
+        finalRenameDone |= op == VDRFileOps::Rename && p == QFileInfo(path).absoluteFilePath();
+        return fail;
     });
     const int result = doc.saveDocument();
     VDRFileOps::setFailurePredicate(nullptr);
@@ -219,11 +227,13 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete()
         QCOMPARE(result, 0);
     }
 
-    // The diary is complete and holds the old or the new state; backups are intact; nothing else lies around.
+    // The diary is complete and holds the old or the new state (the new one when only flushing the
+    // folder after the final rename failed); backups are intact; nothing else lies around.
     QVERIFY(intact(path));
     QCOMPARE(projectNameIn(path),
-             failed ? (firstSave ? QStringLiteral("Generation 4") : QStringLiteral("Zwischenstand"))
-                    : QStringLiteral("Neuer Stand"));
+             failed && !finalFlushFailed
+                 ? (firstSave ? QStringLiteral("Generation 4") : QStringLiteral("Zwischenstand"))
+                 : QStringLiteral("Neuer Stand"));
     QStringList after;
     for (const QString& name : filesBeside(path)) {
         const QString file = QFileInfo(path).dir().filePath(name);
@@ -237,7 +247,7 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete()
         if (!name.contains(QLatin1String(".workingcopy")) && !name.endsWith(QLatin1String(".udf")))
             after << name + QLatin1Char('=') + projectNameIn(file);
     }
-    if (failed)
+    if (failed && !finalFlushFailed)
         QCOMPARE(after, before);
 
     // The working copy stays open for further editing, and the next save goes through.
