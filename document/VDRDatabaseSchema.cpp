@@ -52,9 +52,16 @@ QList<ColumnInfo> columnInfo(QSqlDatabase db, const QString& table)
     return result;
 }
 
+// Column names come from the file: quoted, so any name the file holds can be written again.
+QString quotedName(const QString& name)
+{
+    return QLatin1Char('"') + QString(name).replace(QLatin1Char('"'), QLatin1String("\"\"")) +
+           QLatin1Char('"');
+}
+
 QString columnDefinition(const ColumnInfo& c)
 {
-    QString def = c.name + QLatin1Char(' ') + c.type;
+    QString def = quotedName(c.name) + QLatin1Char(' ') + c.type;
     if (c.notNull)
         def += QStringLiteral(" NOT NULL");
     if (c.primaryKey)
@@ -129,8 +136,52 @@ private:
     bool m_extended = false;
 };
 
-// Rebuilds entry_progress so that `date` may be NULL. Columns beyond the six of the old layout are
-// carried along, so no data is lost whatever layout the file had.
+// One column of a rebuilt table: its definition, and the expression that fills it from the old rows
+// (empty: the old column of the same name).
+struct NewColumn
+{
+    QString definition;
+    QString source;
+};
+
+// Rebuilds 'table' into 'layout' through a temporary "<table>_backup", inside the caller's
+// transaction. Old columns that the layout does not name and 'consumed' does not list are carried
+// along with their values: a file may hold columns this version does not know.
+void rebuildTable(Upgrader& u, const QString& table, const QList<NewColumn>& layout,
+                  const QStringList& consumed = {})
+{
+    if (u.failed())
+        return;
+    QStringList definitions;
+    QStringList names;
+    QStringList sources;
+    for (const NewColumn& c : layout) {
+        const QString name = c.definition.section(QLatin1Char(' '), 0, 0);
+        definitions << c.definition;
+        names << name;
+        sources << (c.source.isEmpty() ? name : c.source);
+    }
+    const QStringList known = names + consumed;
+    for (const ColumnInfo& c : columnInfo(u.db(), table)) {
+        if (known.contains(c.name, Qt::CaseInsensitive))
+            continue;
+        definitions << columnDefinition(c);
+        names << quotedName(c.name);
+        sources << quotedName(c.name);
+    }
+    const QString backup = table + QStringLiteral("_backup");
+    const QString allNames = names.join(QLatin1String(", "));
+    u.exec(
+        QStringLiteral("CREATE TEMPORARY TABLE %1 (%2)").arg(backup, definitions.join(QLatin1String(", "))));
+    u.exec(QStringLiteral("INSERT INTO %1 (%2) SELECT %3 FROM %4")
+               .arg(backup, allNames, sources.join(QLatin1String(", ")), table));
+    u.exec(QStringLiteral("DROP TABLE %1").arg(table));
+    u.exec(QStringLiteral("CREATE TABLE %1 (%2)").arg(table, definitions.join(QLatin1String(", "))));
+    u.exec(QStringLiteral("INSERT INTO %1 (%2) SELECT %2 FROM %3").arg(table, allNames, backup));
+    u.exec(QStringLiteral("DROP TABLE %1").arg(backup));
+}
+
+// Rebuilds entry_progress so that `date` may be NULL.
 void upgradeProgressDate(Upgrader& u)
 {
     const QList<ColumnInfo> cols = columnInfo(u.db(), QStringLiteral("entry_progress"));
@@ -145,44 +196,17 @@ void upgradeProgressDate(Upgrader& u)
     if (hasDate && !dateNotNull)
         return;
 
-    const QStringList base = {"id", "entry_id", "type", "description", "company_id", "date"};
-    QStringList extraDefs;
-    QStringList extraNames;
-    for (const ColumnInfo& c : cols) {
-        if (!base.contains(c.name, Qt::CaseInsensitive)) {
-            extraDefs << columnDefinition(c);
-            extraNames << c.name;
-        }
-    }
-    const QString baseDefs =
-        QStringLiteral("id INTEGER NOT NULL PRIMARY KEY,entry_id INTEGER NOT NULL,type INTEGER "
-                       "NOT NULL,description TEXT NOT NULL,company_id INTEGER,date DATE");
-    const QString allDefs =
-        extraDefs.isEmpty() ? baseDefs : baseDefs + QLatin1Char(',') + extraDefs.join(',');
-    const QString allNames = (base + extraNames).join(',');
-
     u.transaction([&] {
-        u.exec(QStringLiteral("CREATE TEMPORARY TABLE entry_progress_backup(%1)").arg(allDefs));
         if (!hasDate)
             u.exec(QStringLiteral("ALTER TABLE entry_progress ADD date DATE"));
-        u.exec(
-            QStringLiteral("INSERT INTO entry_progress_backup SELECT %1 FROM entry_progress").arg(allNames));
-        u.exec(QStringLiteral("DROP TABLE entry_progress"));
-        u.exec(QStringLiteral("CREATE TABLE entry_progress(%1)").arg(allDefs));
-        u.exec(
-            QStringLiteral("INSERT INTO entry_progress SELECT %1 FROM entry_progress_backup").arg(allNames));
-        u.exec(QStringLiteral("DROP TABLE entry_progress_backup"));
+        rebuildTable(u, QStringLiteral("entry_progress"),
+                     {{QStringLiteral("id INTEGER NOT NULL PRIMARY KEY"), {}},
+                      {QStringLiteral("entry_id INTEGER NOT NULL"), {}},
+                      {QStringLiteral("type INTEGER NOT NULL"), {}},
+                      {QStringLiteral("description TEXT NOT NULL"), {}},
+                      {QStringLiteral("company_id INTEGER"), {}},
+                      {QStringLiteral("date DATE"), {}}});
     });
-}
-
-QString joinTypes(const QString& t1, const QString& t2, const QString& t3)
-{
-    QString result = t1;
-    if (!t2.isEmpty() && t2 != t1)
-        result += QStringLiteral(", ") + t2;
-    if (!t3.isEmpty() && t3 != t1 && t3 != t2)
-        result += QStringLiteral(", ") + t3;
-    return result;
 }
 
 // Creates entry_time_recording and turns the three count/type pairs of the old workforce rows
@@ -202,29 +226,25 @@ void upgradeTimeRecording(Upgrader& u)
         const bool oldLayout = cols.contains(QLatin1String("count1"), Qt::CaseInsensitive);
         if (!oldLayout)
             return;
-        auto col = [&](const QString& name) {
-            return cols.contains(name, Qt::CaseInsensitive) ? name : QStringLiteral("NULL");
+        auto has = [&](const QString& name) { return cols.contains(name, Qt::CaseInsensitive); };
+        auto count = [&](int pair) {
+            const QString name = QStringLiteral("count%1").arg(pair);
+            return has(name) ? QStringLiteral("CAST(IFNULL(%1, 0) AS INTEGER)").arg(name)
+                             : QStringLiteral("0");
         };
-        const bool hasPos = cols.contains(QLatin1String("pos"), Qt::CaseInsensitive);
+        auto type = [&](int pair) {
+            const QString name = QStringLiteral("type%1").arg(pair);
+            return has(name) ? QStringLiteral("CAST(IFNULL(%1, '') AS TEXT)").arg(name)
+                             : QStringLiteral("''");
+        };
 
         QSqlQuery read(u.db());
         read.setForwardOnly(true);
-        const QString select =
-            QStringLiteral(
-                "SELECT id, entry_id, company_id, comment, %1, %2, %3, %4, %5, %6, %7 FROM entry_workforce")
-                .arg(col("count1"), col("type1"), col("count2"), col("type2"), col("count3"), col("type3"),
-                     hasPos ? QStringLiteral("pos") : QStringLiteral("NULL"));
-        if (!read.exec(select)) {
+        if (!read.exec(QStringLiteral("SELECT id, entry_id, %1, %2, %3, %4, %5, %6 FROM entry_workforce")
+                           .arg(count(1), type(1), count(2), type(2), count(3), type(3)))) {
             u.fail(read.lastError());
             return;
         }
-        struct Row
-        {
-            QVariant id, entryId, companyId, comment, pos;
-            int count = 0;
-            QString type;
-        };
-        QList<Row> rows;
         int counter = 0;
         {
             QSqlQuery maxId(u.db());
@@ -238,31 +258,21 @@ void upgradeTimeRecording(Upgrader& u)
             "INSERT INTO entry_time_recording (id, entry_id, workforce_id, person_count, "
             "person_type) VALUES (:id, :entry_id, :workforce_id, :person_count, :person_type)"));
         while (read.next()) {
-            Row row;
-            row.id = read.value(0);
-            row.entryId = read.value(1);
-            row.companyId = read.value(2);
-            row.comment = read.value(3).isNull() ? QStringLiteral(" ") : read.value(3).toString();
-            row.pos = read.value(10);
-            QString types[3];
             for (int i = 0; i < 3; ++i) {
-                const int count = read.value(4 + 2 * i).toInt();
-                types[i] = read.value(5 + 2 * i).toString();
-                if (count > 0 || !types[i].trimmed().isEmpty()) {
+                const int personCount = read.value(2 + 2 * i).toInt();
+                const QString personType = read.value(3 + 2 * i).toString();
+                if (personCount > 0 || !personType.trimmed().isEmpty()) {
                     insert.bindValue(QStringLiteral(":id"), ++counter);
-                    insert.bindValue(QStringLiteral(":entry_id"), row.entryId);
-                    insert.bindValue(QStringLiteral(":workforce_id"), row.id);
-                    insert.bindValue(QStringLiteral(":person_count"), count);
-                    insert.bindValue(QStringLiteral(":person_type"), types[i]);
+                    insert.bindValue(QStringLiteral(":entry_id"), read.value(1));
+                    insert.bindValue(QStringLiteral(":workforce_id"), read.value(0));
+                    insert.bindValue(QStringLiteral(":person_count"), personCount);
+                    insert.bindValue(QStringLiteral(":person_type"), personType);
                     if (!insert.exec()) {
                         u.fail(insert.lastError());
                         return;
                     }
                 }
-                row.count += count;
             }
-            row.type = joinTypes(types[0], types[1], types[2]);
-            rows.append(row);
         }
         read.finish();
         if (counter > 0) {
@@ -272,36 +282,28 @@ void upgradeTimeRecording(Upgrader& u)
                        .arg(counter));
         }
 
-        const QString posDef = hasPos ? QStringLiteral(", pos INTEGER NOT NULL DEFAULT 0") : QString();
-        const QString layout =
-            QStringLiteral("id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, company_id "
-                           "INTEGER, comment TEXT NOT NULL, person_count INTEGER NOT NULL, "
-                           "person_type TEXT NOT NULL, man_hours REAL") +
-            posDef;
-        // The old rows are held in memory while the table is rebuilt.
-        u.exec(QStringLiteral("DROP TABLE entry_workforce"));
-        u.exec(QStringLiteral("CREATE TABLE entry_workforce (%1)").arg(layout));
-        if (u.failed())
-            return;
-        QSqlQuery put(u.db());
-        put.prepare(hasPos ? QStringLiteral("INSERT INTO entry_workforce (id, entry_id, company_id, comment, "
-                                            "person_count, person_type, pos) VALUES (?, ?, ?, ?, ?, ?, ?)")
-                           : QStringLiteral("INSERT INTO entry_workforce (id, entry_id, company_id, comment, "
-                                            "person_count, person_type) VALUES (?, ?, ?, ?, ?, ?)"));
-        for (const Row& row : rows) {
-            put.addBindValue(row.id);
-            put.addBindValue(row.entryId);
-            put.addBindValue(row.companyId);
-            put.addBindValue(row.comment);
-            put.addBindValue(row.count);
-            put.addBindValue(row.type);
-            if (hasPos)
-                put.addBindValue(row.pos.isNull() ? row.id : row.pos);
-            if (!put.exec()) {
-                u.fail(put.lastError());
-                return;
-            }
-        }
+        // The type texts are joined with ", ", each only when it is not empty and not seen before.
+        const QString personType =
+            QStringLiteral("%1 || CASE WHEN %2 <> '' AND %2 <> %1 THEN ', ' || %2 ELSE '' END || CASE WHEN "
+                           "%3 <> '' AND %3 <> %1 AND %3 <> %2 THEN ', ' || %3 ELSE '' END")
+                .arg(type(1), type(2), type(3));
+        QList<NewColumn> layout{
+            {QStringLiteral("id INTEGER NOT NULL PRIMARY KEY"), {}},
+            {QStringLiteral("entry_id INTEGER NOT NULL"), {}},
+            {QStringLiteral("company_id INTEGER"), {}},
+            {QStringLiteral("comment TEXT NOT NULL"), QStringLiteral("IFNULL(comment, ' ')")},
+            {QStringLiteral("person_count INTEGER NOT NULL"),
+             QStringLiteral("%1 + %2 + %3").arg(count(1), count(2), count(3))},
+            {QStringLiteral("person_type TEXT NOT NULL"), personType},
+            {QStringLiteral("man_hours REAL"),
+             has(QStringLiteral("man_hours")) ? QString() : QStringLiteral("NULL")},
+        };
+        if (has(QStringLiteral("pos")))
+            layout.append(
+                {QStringLiteral("pos INTEGER NOT NULL DEFAULT 0"), QStringLiteral("IFNULL(pos, id)")});
+        rebuildTable(u, QStringLiteral("entry_workforce"), layout,
+                     {QStringLiteral("count1"), QStringLiteral("type1"), QStringLiteral("count2"),
+                      QStringLiteral("type2"), QStringLiteral("count3"), QStringLiteral("type3")});
     });
 }
 
@@ -321,33 +323,30 @@ void upgradeMaterial(Upgrader& u)
         return QStringLiteral("CASE WHEN %1 THEN 'OK, ' || %2 ELSE %2 END")
             .arg(QLatin1String(flagCol), text(textCol));
     };
-    const bool hasPos = has("pos");
-    const QString layout =
-        QStringLiteral(
-            "id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, material TEXT NOT NULL, quantity "
-            "REAL, unit TEXT, process TEXT NOT NULL, company_id INTEGER, material_temperature INTEGER NOT "
-            "NULL, conditions TEXT NOT NULL, workflow TEXT NOT NULL, note TEXT NOT NULL, document TEXT") +
-        (hasPos ? QStringLiteral(", pos INTEGER NOT NULL DEFAULT 0") : QString());
-    const QString names = QStringLiteral("id, entry_id, material, quantity, unit, process, company_id, "
-                                         "material_temperature, conditions, workflow, note, document") +
-                          (hasPos ? QStringLiteral(", pos") : QString());
-    const QString select =
-        QStringLiteral("SELECT id, entry_id, %1, NULL, '', %2, %3, IFNULL(%4, 0), %5, %6, %7, %8%9 FROM "
-                       "entry_constructionmaterial")
-            .arg(text("material"), text("process"), has("company_id") ? QStringLiteral("company_id") : "NULL",
-                 has("material_temperature") ? QStringLiteral("material_temperature") : "0",
-                 okText("conditions", "conditions_ok"), okText("workflow", "workflow_ok"), text("note"),
-                 has("document") ? QStringLiteral("document") : "NULL",
-                 hasPos ? QStringLiteral(", pos") : QString());
+    auto orElse = [&](const char* name, const char* fallback) {
+        return has(name) ? QString() : QString::fromLatin1(fallback);
+    };
+    QList<NewColumn> layout{
+        {QStringLiteral("id INTEGER NOT NULL PRIMARY KEY"), {}},
+        {QStringLiteral("entry_id INTEGER NOT NULL"), {}},
+        {QStringLiteral("material TEXT NOT NULL"), text("material")},
+        {QStringLiteral("quantity REAL"), QStringLiteral("NULL")},
+        {QStringLiteral("unit TEXT"), QStringLiteral("''")},
+        {QStringLiteral("process TEXT NOT NULL"), text("process")},
+        {QStringLiteral("company_id INTEGER"), orElse("company_id", "NULL")},
+        {QStringLiteral("material_temperature INTEGER NOT NULL"),
+         has("material_temperature") ? QStringLiteral("IFNULL(material_temperature, 0)")
+                                     : QStringLiteral("0")},
+        {QStringLiteral("conditions TEXT NOT NULL"), okText("conditions", "conditions_ok")},
+        {QStringLiteral("workflow TEXT NOT NULL"), okText("workflow", "workflow_ok")},
+        {QStringLiteral("note TEXT NOT NULL"), text("note")},
+        {QStringLiteral("document TEXT"), orElse("document", "NULL")},
+    };
+    if (has("pos"))
+        layout.append({QStringLiteral("pos INTEGER NOT NULL DEFAULT 0"), {}});
     u.transaction([&] {
-        u.exec(QStringLiteral("CREATE TEMPORARY TABLE entry_constructionmaterial_backup (%1)").arg(layout));
-        u.exec(QStringLiteral("INSERT INTO entry_constructionmaterial_backup (%1) %2").arg(names, select));
-        u.exec(QStringLiteral("DROP TABLE entry_constructionmaterial"));
-        u.exec(QStringLiteral("CREATE TABLE entry_constructionmaterial (%1)").arg(layout));
-        u.exec(QStringLiteral("INSERT INTO entry_constructionmaterial (%1) SELECT %1 FROM "
-                              "entry_constructionmaterial_backup")
-                   .arg(names));
-        u.exec(QStringLiteral("DROP TABLE entry_constructionmaterial_backup"));
+        rebuildTable(u, QStringLiteral("entry_constructionmaterial"), layout,
+                     {QStringLiteral("conditions_ok"), QStringLiteral("workflow_ok")});
     });
 }
 

@@ -2,6 +2,7 @@
 
 #include "document/VDRPrompt.h"
 #include "editing/CompleterEditor.h"
+#include "export/VDRCompleterExchange.h"
 
 #include <QAbstractItemView>
 #include <QDateTime>
@@ -39,6 +40,10 @@ VDRCompleter::VDRCompleter(int regIdx, QString title, int tableID, QString colum
     setModelSorting(QCompleter::UnsortedModel);
     CompleterEditor::resetToDefaults(true);
     readSettings();
+    // An imported Completer.xml must reach the live lists before they write theirs back.
+    static const bool importRefreshes =
+        (VDRCompleterExchange::setListsReplacedHandler(&VDRCompleter::updateAll), true);
+    Q_UNUSED(importRefreshes)
     registry().append(this);
 }
 

@@ -22,13 +22,16 @@ struct Language
 };
 
 // The exchange file's languages in its own order. "USA" shares English's locale number and thus its
-// lists, so it is written only once, as "English".
+// lists: they are written under both names, and read from "English", or from "USA" when the file has
+// no "English".
 const Language Languages[] = {
     {"German", QLocale::German},     {"English", QLocale::English}, {"Spanish", QLocale::Spanish},
-    {"Romanian", QLocale::Romanian}, {"Greek", QLocale::Greek},     {"Russian", QLocale::Russian},
-    {"Finnish", QLocale::Finnish},
+    {"Romanian", QLocale::Romanian}, {"USA", QLocale::English},     {"Greek", QLocale::Greek},
+    {"Russian", QLocale::Russian},   {"Finnish", QLocale::Finnish},
 };
 const char* const UsaFileGroup = "USA";
+
+void (*listsReplacedHandler)() = nullptr;
 
 // The file holds only text; restore the types the completers write, so a store that keeps types
 // (the macOS property list) looks as before.
@@ -119,6 +122,8 @@ bool VDRCompleterExchange::importSettingsFromXML(const QString& folder)
 
     QSettings settings;
     for (const Language& language : Languages) {
+        if (qstrcmp(language.fileGroup, UsaFileGroup) == 0)
+            continue;
         QSettings::SettingsMap keys = fileGroup(map, QLatin1String(language.fileGroup));
         if (keys.isEmpty() && language.locale == QLocale::English)
             keys = fileGroup(map, QLatin1String(UsaFileGroup));
@@ -134,7 +139,15 @@ bool VDRCompleterExchange::importSettingsFromXML(const QString& folder)
     }
     settings.sync();
     recordSyncDate(path);
+    // Live lists would otherwise write their old entries back over the imported ones.
+    if (listsReplacedHandler)
+        listsReplacedHandler();
     return true;
+}
+
+void VDRCompleterExchange::setListsReplacedHandler(void (*handler)())
+{
+    listsReplacedHandler = handler;
 }
 
 bool VDRCompleterExchange::createCompleterXMLFile(const QString& folder)

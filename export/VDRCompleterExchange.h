@@ -21,6 +21,8 @@ public:
     static bool importSettingsFromXML(const QString& folder);
     // Writes the file from the application settings only when it is missing.
     static bool createCompleterXMLFile(const QString& folder);
+    // Called after an import replaced lists, so that the window's live lists re-read them.
+    static void setListsReplacedHandler(void (*handler)());
 
     static QString completerFilePath(const QString& folder);
     static QString completerGroup(int localeLanguage);

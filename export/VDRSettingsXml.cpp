@@ -11,6 +11,22 @@ namespace {
 const QString RootElement = QStringLiteral("Settings");
 const QString NumberPrefix = QStringLiteral("value_");
 
+// Bounds for a file from outside. The lists need six levels below the root
+// (language/title/column/values/index/centry) and a few megabytes at most.
+constexpr int MaxDepth = 16;
+constexpr qint64 MaxFileMegabytes = 8;
+constexpr qint64 MaxFileSize = MaxFileMegabytes * 1024 * 1024;
+// Keys repeat the names of their parents, so nesting could make the result far larger than the
+// file; a real file's keys and values take about as many characters as the file itself.
+constexpr qint64 OutputPerInputCharacter = 4;
+constexpr qint64 OutputAllowance = 64 * 1024;
+
+QString tooLargeText()
+{
+    return QCoreApplication::translate("VDRSettingsXml", "Die Datei ist größer als %1 MB")
+        .arg(MaxFileMegabytes);
+}
+
 // Segments the mobile app knows under fixed names: a comma and "º" cannot stand in an element name.
 const QList<QPair<QString, QString>>& specialSegments()
 {
@@ -183,7 +199,13 @@ bool writeXmlFile(QIODevice& device, const QSettings::SettingsMap& map)
 bool readXmlSettings(QIODevice& device, QSettings::SettingsMap& map, QString* errorText)
 {
     map.clear();
+    if (!device.isSequential() && device.size() - device.pos() > MaxFileSize) {
+        if (errorText)
+            *errorText = tooLargeText();
+        return false;
+    }
     QXmlStreamReader xml(&device);
+    qint64 output = 0;
     struct Open
     {
         QString segment;
@@ -201,6 +223,12 @@ bool readXmlSettings(QIODevice& device, QSettings::SettingsMap& map, QString* er
                     xml.raiseError(
                         QCoreApplication::translate("VDRSettingsXml", "Wurzelelement \"%1\" erwartet")
                             .arg(RootElement));
+                break;
+            }
+            if (open.size() >= MaxDepth) {
+                xml.raiseError(QCoreApplication::translate(
+                                   "VDRSettingsXml", "Die Elemente sind tiefer als %1 Ebenen verschachtelt")
+                                   .arg(MaxDepth));
                 break;
             }
             if (!open.isEmpty())
@@ -221,13 +249,23 @@ bool readXmlSettings(QIODevice& device, QSettings::SettingsMap& map, QString* er
                     for (const Open& parent : qAsConst(open))
                         path << parent.segment;
                     path << element.segment;
-                    map.insert(path.join(QLatin1Char('/')), element.text);
+                    const QString key = path.join(QLatin1Char('/'));
+                    output += key.size() + element.text.size();
+                    if (output > OutputPerInputCharacter * xml.characterOffset() + OutputAllowance) {
+                        xml.raiseError(QCoreApplication::translate(
+                            "VDRSettingsXml", "Die Schlüssel und Texte der Datei sind zu umfangreich"));
+                        break;
+                    }
+                    map.insert(key, element.text);
                 }
             }
             break;
         default:
             break;
         }
+        // Devices of unknown size are bounded while they are read.
+        if (!xml.hasError() && xml.characterOffset() > MaxFileSize)
+            xml.raiseError(tooLargeText());
     }
     if (!xml.hasError())
         return true;

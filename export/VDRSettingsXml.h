@@ -15,7 +15,9 @@ bool writeXmlFile(QIODevice& device, const QSettings::SettingsMap& map);
 bool readXmlFile(QIODevice& device, QSettings::SettingsMap& map);
 
 // Parses 'device' like readXmlFile; on failure 'errorText' holds the reader's message followed by
-// " at line " and the line number, and 'map' is left empty.
+// " at line " and the line number, and 'map' is left empty. Files come from outside: one larger than
+// 8 MB, nested deeper than 16 elements below the root, or whose keys and values would take more than
+// four times its own characters is refused.
 bool readXmlSettings(QIODevice& device, QSettings::SettingsMap& map, QString* errorText);
 // The same for a file; an empty file is an empty map. A file that cannot be opened is an error too.
 bool readXmlSettingsFile(const QString& path, QSettings::SettingsMap& map, QString* errorText);

@@ -4,6 +4,7 @@
 #include "document/VDRDocument.h"
 
 #include <QFile>
+#include <QRegularExpression>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -37,6 +38,8 @@ private slots:
     void newDiaryContents();
     void upgradeBringsOldestLayoutToCurrentStructure();
     void upgradeConvertsOldData();
+    void upgradeRebuildsKeepUnknownColumns_data();
+    void upgradeRebuildsKeepUnknownColumns();
     void upgradeLeavesCurrentFileAlone();
     void failingUpgradeStepEndsOpening();
 
@@ -294,6 +297,56 @@ void TestVDRDatabaseSchema::upgradeConvertsOldData()
         QStringLiteral("1,2,3"));
     QCOMPARE(queryValue(db, "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
              QStringLiteral("0.1"));
+}
+
+void TestVDRDatabaseSchema::upgradeRebuildsKeepUnknownColumns_data()
+{
+    QTest::addColumn<QString>("table");
+    QTest::addColumn<QString>("column");
+    QTest::addColumn<QString>("type");
+    QTest::addColumn<QString>("value");
+
+    QTest::newRow("workforce") << "entry_workforce"
+                               << "lohn gruppe"
+                               << "INTEGER"
+                               << "id * 10";
+    QTest::newRow("material") << "entry_constructionmaterial"
+                              << "lieferant"
+                              << "TEXT NOT NULL DEFAULT 'unbekannt'"
+                              << "'Werk ' || id";
+    QTest::newRow("progress") << "entry_progress"
+                              << "gewerk"
+                              << "VARCHAR (32)"
+                              << "'Gewerk ' || id";
+}
+
+// A file written by another version may hold columns the upgrade does not know: a table rebuilt into
+// the current layout keeps them with their values.
+void TestVDRDatabaseSchema::upgradeRebuildsKeepUnknownColumns()
+{
+    QFETCH(QString, table);
+    QFETCH(QString, column);
+    QFETCH(QString, type);
+    QFETCH(QString, value);
+    const QString old = m_dir.filePath(QStringLiteral("fremd-%1.vd2").arg(table));
+    QVERIFY(createOldestLayoutDiary(old));
+    const QString quoted = '"' + column + '"';
+    QVERIFY(execSql(old, {QStringLiteral("ALTER TABLE %1 ADD %2 %3").arg(table, quoted, type),
+                          QStringLiteral("UPDATE %1 SET %2 = %3").arg(table, quoted, value)}));
+    const QString select = QStringLiteral("SELECT id, %1 FROM %2 ORDER BY id").arg(quoted, table);
+    const QStringList rows = queryTexts(old, select);
+    QVERIFY(rows.size() >= 1);
+    const auto layoutOf = [&](const QString& path) {
+        return tableLayout(path, table)
+            .filter(QRegularExpression('^' + QRegularExpression::escape(column) + ' '));
+    };
+    const QStringList layout = layoutOf(old);
+    QCOMPARE(layout.size(), 1);
+
+    const QString upgraded = openUpgradedWorkingCopy(old);
+    QVERIFY(!upgraded.isEmpty());
+    QCOMPARE(layoutOf(upgraded), layout);
+    QCOMPARE(queryTexts(upgraded, select), rows);
 }
 
 void TestVDRDatabaseSchema::upgradeLeavesCurrentFileAlone()

@@ -7,6 +7,7 @@
 #include "editing/VDRCompleterFactory.h"
 #include "editing/VDRCompleterLineEdit.h"
 #include "editing/VDRCompleterTextEdit.h"
+#include "export/VDRCompleterExchange.h"
 
 #include <QAbstractItemView>
 #include <QApplication>
@@ -80,6 +81,7 @@ private slots:
     void learns_data();
     void learns();
     void sharedListOffersNewTextFirst();
+    void importReachesLiveLists();
     void offers_data();
     void offers();
     void choosingInsertsFullEntry_data();
@@ -192,6 +194,26 @@ void TestVDRCompleter::sharedListOffersNewTextFirst()
     QTest::keyClicks(second.get(), QStringLiteral("zie"));
     QCOMPARE(popupRows(second->ownCompleter()), (QStringList{"Ziegel neu", "Ziegel alt"}));
     QCOMPARE(other->ownCompleter()->size(), 0);
+}
+
+// Completer.xml from another installation: the open fields must not write their old lists back.
+void TestVDRCompleter::importReachesLiveLists()
+{
+    auto edit = lineEdit(QStringLiteral("Import"));
+    edit->ownCompleter()->appendEntry(QStringLiteral("alt"));
+    QTemporaryDir cloud;
+    QFile file(VDRCompleterExchange::completerFilePath(cloud.path()));
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    file.write(
+        "<Settings><German><Import><tableID>9</tableID><simple><enabled>true</enabled><values>"
+        "<value_1><centry>neu</centry></value_1><value_2><centry>neuer</centry></value_2><size>2</size>"
+        "</values></simple></Import></German></Settings>");
+    file.close();
+
+    QVERIFY(VDRCompleterExchange::importSettingsFromXML(cloud.path()));
+    QCOMPARE(edit->ownCompleter()->entries(), (QStringList{"neu", "neuer"}));
+    VDRCompleter::writeAll();
+    QCOMPARE(lineEdit(QStringLiteral("Import"))->ownCompleter()->entries(), (QStringList{"neu", "neuer"}));
 }
 
 void TestVDRCompleter::offers_data()

@@ -250,6 +250,9 @@ void TestVDRSettingsXml::completerRoundTrip()
     QCOMPARE(file.value("Spanish/Equipo, máquina/Nº índice/values/1/centry").toString(),
              QStringLiteral("Grúa"));
     QCOMPARE(file.value("German/Baumaßnahmen/Beschreibung/values/size").toInt(), 13);
+    // Installations set to US English read their lists from "USA".
+    QCOMPARE(file.value("USA/Weather wind/simple/values/2/centry").toString(), QStringLiteral("gusty"));
+    QCOMPARE(file.value("English/Weather wind/simple/values/2/centry").toString(), QStringLiteral("gusty"));
 
     clearSettings();
     QVERIFY(completerSnapshot().isEmpty());
@@ -299,6 +302,15 @@ void TestVDRSettingsXml::malformedFileChangesNothing_data()
                                     << 3;
     QTest::newRow("garbage") << QByteArray("PK\x03\x04 this is no xml\n") << 1;
     QTest::newRow("other root") << QByteArray("<?xml version=\"1.0\"?>\n\n<plist>\n</plist>\n") << 3;
+    // Keys repeat their parents' names: nesting must not make the result grow with its square.
+    QTest::newRow("nested 10000 deep") << "<Settings>" + QByteArray("<a>x").repeated(10000) +
+                                              QByteArray("</a>").repeated(10000) + "</Settings>"
+                                       << 1;
+    const QByteArray longName(500, 'n');
+    QTest::newRow("long keys") << "<Settings>\n" + ("<" + longName + ">").repeated(15) +
+                                      QByteArray("<b>x</b>").repeated(1000) +
+                                      ("</" + longName + ">").repeated(15) + "</Settings>"
+                               << 2;
 }
 
 void TestVDRSettingsXml::malformedFileChangesNothing()
