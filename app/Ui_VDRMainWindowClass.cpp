@@ -1,9 +1,11 @@
 #include "app/Ui_VDRMainWindowClass.h"
 
 #include <QAction>
+#include <QKeySequence>
 #include <QMainWindow>
 #include <QMenu>
 #include <QMenuBar>
+#include <QSet>
 #include <QToolBar>
 
 namespace {
@@ -162,6 +164,41 @@ const Entry kToolBarOnly[] = {
     {"actionStartSpellCheckerDialog", QT_TRANSLATE_NOOP("VDRMainWindow", "Rechtschreibprüfung")},
 };
 
+// The report navigation belongs to the report form; the actions live in the window so that their
+// keys work wherever the focus is.
+const Entry kWindowOnly[] = {
+    {"actionEntryGotoFirst", QT_TRANSLATE_NOOP("VDRMainWindow", "Erster Baubericht")},
+    {"actionEntryGotoPrevious", QT_TRANSLATE_NOOP("VDRMainWindow", "Vorheriger Baubericht")},
+    {"actionEntryGotoNext", QT_TRANSLATE_NOOP("VDRMainWindow", "Nächster Baubericht")},
+    {"actionEntryGotoLast", QT_TRANSLATE_NOOP("VDRMainWindow", "Letzter Baubericht")},
+};
+
+// The platform's standard keys; the fixed one where the platform has none (Windows knows no
+// "save as" or "quit" key).
+struct ShortcutDef
+{
+    const char* action;
+    QKeySequence::StandardKey standard;
+    int fallback;
+};
+const ShortcutDef kShortcuts[] = {
+    {"actionFileNew", QKeySequence::New, Qt::CTRL | Qt::Key_N},
+    {"actionFileOpen", QKeySequence::Open, Qt::CTRL | Qt::Key_O},
+    {"actionFileSave", QKeySequence::Save, Qt::CTRL | Qt::Key_S},
+    {"actionFileSaveAs", QKeySequence::SaveAs, Qt::CTRL | Qt::SHIFT | Qt::Key_S},
+    {"actionFilePrintEntries", QKeySequence::Print, Qt::CTRL | Qt::Key_P},
+    {"actionFileExit", QKeySequence::Quit, Qt::CTRL | Qt::Key_Q},
+    {"actionHelpShowHelp", QKeySequence::HelpContents, Qt::Key_F1},
+    {"actionEntryGotoPrevious", QKeySequence::UnknownKey, Qt::CTRL | Qt::Key_PageUp},
+    {"actionEntryGotoNext", QKeySequence::UnknownKey, Qt::CTRL | Qt::Key_PageDown},
+    {"actionEntryGotoFirst", QKeySequence::UnknownKey, Qt::CTRL | Qt::SHIFT | Qt::Key_PageUp},
+    {"actionEntryGotoLast", QKeySequence::UnknownKey, Qt::CTRL | Qt::SHIFT | Qt::Key_PageDown},
+};
+
+// Toggles of the Ansicht menu that show a check mark.
+const char* const kCheckable[] = {"actionViewToolbar", "actionViewStatusbar", "actionViewEntryList",
+                                  "actionEntrySearchByDate"};
+
 const char* const kToolBar[] = {"actionFileNew",
                                 "actionFileOpen",
                                 "actionFileSave",
@@ -201,7 +238,51 @@ const MenuDef* findMenu(const QString& name)
     return nullptr;
 }
 
+// Where the mnemonic of 'text' goes: the first letter its siblings have not taken, preferring the
+// start of a word and plain letters that every keyboard has.
+int mnemonicPosition(const QString& text, const QSet<QChar>& taken)
+{
+    for (int pass = 0; pass < 3; ++pass) {
+        for (int i = 0; i < text.size(); ++i) {
+            const QChar c = text.at(i);
+            if (!c.isLetter() || taken.contains(c.toLower()))
+                continue;
+            const bool plain = c.unicode() < 128;
+            const bool wordStart = i == 0 || !text.at(i - 1).isLetterOrNumber();
+            if ((pass == 0 && plain && wordStart) || (pass == 1 && plain) || pass == 2)
+                return i;
+        }
+    }
+    return -1;
+}
+
 } // namespace
+
+QString Ui_VDRMainWindowClass::plainText(QString text)
+{
+    text.replace(QLatin1String("&&"), QString(QChar(0x1)));
+    text.remove(QLatin1Char('&'));
+    text.replace(QChar(0x1), QLatin1Char('&'));
+    return text;
+}
+
+void Ui_VDRMainWindowClass::assignMnemonics(const QList<QAction*>& actions)
+{
+    QSet<QChar> taken;
+    for (QAction* action : actions) {
+        if (action->isSeparator())
+            continue;
+        const QString text = plainText(action->text());
+        const auto escaped = [](QString part) { return part.replace(QLatin1Char('&'), QLatin1String("&&")); };
+        const int at = mnemonicPosition(text, taken);
+        if (at < 0) {
+            action->setText(escaped(text));
+            continue;
+        }
+        taken.insert(text.at(at).toLower());
+        action->setText(escaped(text.left(at)) + QLatin1Char('&') + escaped(text.mid(at)));
+    }
+}
 
 QAction* Ui_VDRMainWindowClass::makeAction(QMainWindow* window, const QString& name, const QString& label)
 {
@@ -227,6 +308,7 @@ QMenu* Ui_VDRMainWindowClass::buildMenu(QMainWindow* window, QMenu* parent, cons
         else
             menu->addAction(makeAction(window, entry, tr(e.label)));
     }
+    assignMnemonics(menu->actions());
     return menu;
 }
 
@@ -236,8 +318,19 @@ void Ui_VDRMainWindowClass::setupUi(QMainWindow* window)
         buildMenu(window, nullptr, QLatin1String(name));
     menuFileRecent = m_menus.value(QStringLiteral("menuFileRecent"));
     menuSyncFiles = m_menus.value(QStringLiteral("menuSyncFiles"));
+    assignMnemonics(window->menuBar()->actions());
     for (const Entry& e : kToolBarOnly)
         makeAction(window, QLatin1String(e.name), tr(e.label));
+    for (const Entry& e : kWindowOnly)
+        window->addAction(makeAction(window, QLatin1String(e.name), tr(e.label)));
+    for (const ShortcutDef& s : kShortcuts) {
+        QList<QKeySequence> keys = QKeySequence::keyBindings(s.standard);
+        if (keys.isEmpty())
+            keys << QKeySequence(s.fallback);
+        m_actions.value(QLatin1String(s.action))->setShortcuts(keys);
+    }
+    for (const char* name : kCheckable)
+        m_actions.value(QLatin1String(name))->setCheckable(true);
 
     mainToolBar = new QToolBar(tr("Symbolleiste"), window);
     mainToolBar->setObjectName(QStringLiteral("mainToolBar"));

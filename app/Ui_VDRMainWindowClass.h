@@ -20,6 +20,12 @@ public:
     QMenu* menu(const QString& objectName) const { return m_menus.value(objectName); }
     QList<QAction*> allActions() const { return m_actions.values(); }
 
+    // Gives each entry an '&' before a letter no sibling uses, so the texts stay as they are.
+    // Run again after a text changed.
+    static void assignMnemonics(const QList<QAction*>& actions);
+    // The text as the user reads it, without the mnemonic marks.
+    static QString plainText(QString text);
+
     QToolBar* mainToolBar = nullptr;
     QMenu* menuFileRecent = nullptr;
     QMenu* menuSyncFiles = nullptr;

@@ -4,23 +4,30 @@
 #include "document/VDRDocument.h"
 #include "document/VDRFileSizeDialog.h"
 #include "document/VDRPrompt.h"
+#include "document/VDRScopedConnection.h"
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
-#include "editing/VDRFileSizeConfigDialog.h"
 #include "editing/VDRSpellChecker.h"
 
 #include <QAction>
 #include <QCalendarWidget>
 #include <QCloseEvent>
 #include <QCoreApplication>
+#include <QDesktopServices>
 #include <QDir>
 #include <QDockWidget>
 #include <QFileInfo>
+#include <QGuiApplication>
 #include <QHeaderView>
 #include <QLabel>
 #include <QMenu>
+#include <QMenuBar>
+#include <QMessageBox>
+#include <QScreen>
 #include <QSettings>
+#include <QShortcut>
+#include <QSqlQuery>
 #include <QSqlRecord>
 #include <QStackedWidget>
 #include <QStatusBar>
@@ -28,18 +35,45 @@
 #include <QTextCharFormat>
 #include <QTimer>
 #include <QToolBar>
+#include <QUrl>
 
 VDRMainWindow* g_mainWindow = nullptr;
 
 namespace {
 // Actions whose commands are wired here; every other action waits for its feature.
-const char* const kWiredActions[] = {
-    "actionFileNew",         "actionFileOpen",           "actionFileSave",        "actionFileSaveAs",
-    "actionOpenDemoProject", "actionFileExit",           "actionViewToolbar",     "actionViewStatusbar",
-    "actionViewEntryList",   "actionEntrySearchByDate",  "actionNumberOfBackups", "actionFileSizeWarning",
-    "actionCompactDB",       "actionStartSpellChecking", "actionVorschlagtexte"};
+const char* const kWiredActions[] = {"actionFileNew",
+                                     "actionFileOpen",
+                                     "actionFileSave",
+                                     "actionFileSaveAs",
+                                     "actionOpenDemoProject",
+                                     "actionFileExit",
+                                     "actionViewToolbar",
+                                     "actionViewStatusbar",
+                                     "actionViewEntryList",
+                                     "actionEntrySearchByDate",
+                                     "actionNumberOfBackups",
+                                     "actionCompactDB",
+                                     "actionStartSpellChecking",
+                                     "actionVorschlagtexte",
+                                     "actionHelpShowHelp",
+                                     "actionHelpInfoDialog"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB"};
+// Commands the demo project refuses; disabled there rather than offered and refused.
+const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
+
+// Size of a window opened without saved geometry, and how far a further instance is moved aside.
+const QSize kDefaultSize(1200, 800);
+const int kInstanceOffset = 32;
+
+QString sqliteVersion()
+{
+    VDRScopedConnection about(QStringLiteral("ABOUT"), QStringLiteral(":memory:"), QString(), false);
+    if (!about.isOpen())
+        return QString();
+    QSqlQuery q(about.db());
+    return q.exec(QStringLiteral("SELECT sqlite_version()")) && q.next() ? q.value(0).toString() : QString();
+}
 } // namespace
 
 VDRMainWindow::VDRMainWindow(QWidget* parent)
@@ -112,7 +146,7 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     connect(m_document, &VDRDocument::recentFileMissing, this, &VDRMainWindow::removeRecentFile);
     connectActions();
     updateGui();
-    resize(1200, 800);
+    resize(kDefaultSize);
 }
 
 VDRMainWindow::~VDRMainWindow()
@@ -139,25 +173,152 @@ void VDRMainWindow::connectActions()
             wired |= action->objectName() == QLatin1String(name);
         if (!wired) {
             action->setEnabled(false);
-            action->setToolTip(tr("%1 (noch nicht verfügbar)").arg(action->text()));
+            action->setToolTip(
+                tr("%1 (noch nicht verfügbar)").arg(Ui_VDRMainWindowClass::plainText(action->text())));
         }
     }
     // Automatic connection by name (on_action..._triggered) needs the actions as children: they are.
     QMetaObject::connectSlotsByName(this);
-    connect(m_ui.action(QStringLiteral("actionViewEntryList")), &QAction::triggered, this, [this] {
-        m_dockEntryList->setVisible(!m_dockEntryList->isVisible());
-        QSettings().setValue(showEntryListSettingsKey(), m_dockEntryList->isVisible());
+    connect(m_ui.action(QStringLiteral("actionViewEntryList")), &QAction::triggered, this, [this](bool show) {
+        m_dockEntryList->setVisible(show);
+        QSettings().setValue(showEntryListSettingsKey(), show);
     });
-    connect(m_ui.action(QStringLiteral("actionEntrySearchByDate")), &QAction::triggered, this, [this] {
-        m_dockEntryDate->setVisible(!m_dockEntryDate->isVisible());
-        QSettings().setValue(showEntryDateSettingsKey(), m_dockEntryDate->isVisible());
-    });
+    connect(m_ui.action(QStringLiteral("actionEntrySearchByDate")), &QAction::triggered, this,
+            [this](bool show) {
+                m_dockEntryDate->setVisible(show);
+                QSettings().setValue(showEntryDateSettingsKey(), show);
+            });
+    // A dock closed by its own button, or a bar hidden from its context menu, loses its check mark.
+    connect(m_ui.menu(QStringLiteral("menuView")), &QMenu::aboutToShow, this,
+            &VDRMainWindow::updateViewActions);
+    updateViewActions();
+
+    // F10 reaches the menus, as in other desktop programs.
+    auto* menuKey = new QShortcut(QKeySequence(Qt::Key_F10), this);
+    menuKey->setObjectName(QStringLiteral("shortcutMenuBar"));
+    connect(menuKey, &QShortcut::activated, this,
+            [this] { menuBar()->setActiveAction(menuBar()->actions().value(0)); });
+}
+
+void VDRMainWindow::updateViewActions()
+{
+    const struct
+    {
+        const char* action;
+        const QWidget* widget;
+    } toggles[] = {{"actionViewToolbar", m_ui.mainToolBar},
+                   {"actionViewStatusbar", statusBar()},
+                   {"actionViewEntryList", m_dockEntryList},
+                   {"actionEntrySearchByDate", m_dockEntryDate}};
+    // isHidden, not isVisible: before the window is shown everything is invisible, but not hidden.
+    for (const auto& toggle : toggles)
+        m_ui.action(QLatin1String(toggle.action))->setChecked(!toggle.widget->isHidden());
 }
 
 QString VDRMainWindow::demoProjectPath()
 {
     return QDir(QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects"))
         .absoluteFilePath(QStringLiteral("Ejemplo.vd2"));
+}
+
+QString VDRMainWindow::helpPagePath()
+{
+    return QDir(QCoreApplication::applicationDirPath() + QStringLiteral("/../Help"))
+        .absoluteFilePath(QStringLiteral("Varduna-Hilfe.html"));
+}
+
+void VDRMainWindow::showHelp()
+{
+    const QString page = helpPagePath();
+    if (!QFileInfo::exists(page)) {
+        VDRPrompt::warning(tr("Hilfe"),
+                           tr("Die Hilfe-Datei\n%1\nexistiert nicht.").arg(QDir::toNativeSeparators(page)));
+        return;
+    }
+    if (!QDesktopServices::openUrl(QUrl::fromLocalFile(page)))
+        VDRPrompt::warning(tr("Hilfe"),
+                           tr("Die Hilfe konnte nicht im Browser geöffnet werden.\nSie finden sie in der "
+                              "Datei\n%1")
+                               .arg(QDir::toNativeSeparators(page)));
+}
+
+std::unique_ptr<QMessageBox> VDRMainWindow::createAboutBox()
+{
+    const QString version = QCoreApplication::applicationVersion().isEmpty()
+                                ? QStringLiteral(VARDUNA_VERSION)
+                                : QCoreApplication::applicationVersion();
+    const QString sqlite = sqliteVersion();
+    const QString text =
+        tr("<h3>Varduna %1</h3>"
+           "<p>Das Bautagebuch für die Baustelle.<br>© Korvant - Software</p>"
+           "<p>Qt %2 (erstellt mit Qt %3)%4</p>"
+           "<p><b>Mitgelieferte Bibliotheken und ihre Lizenzen</b></p>"
+           "<table cellspacing=\"2\">"
+           "<tr><td>Qt 5</td><td>GNU LGPL 3</td></tr>"
+           "<tr><td>Qt-Übersetzungen</td><td>GNU GPL 3 mit Qt-Ausnahme 1.0</td></tr>"
+           "<tr><td>SQLite</td><td>gemeinfrei (Public Domain)</td></tr>"
+           "<tr><td>Hunspell</td><td>MPL 1.1 / GNU GPL 2 / GNU LGPL 2.1</td></tr>"
+           "<tr><td>libexif</td><td>GNU LGPL 2.1</td></tr>"
+           "<tr><td>Wörterbuch Deutsch (igerman98)</td><td>GNU GPL 2</td></tr>"
+           "<tr><td>Wörterbuch Englisch (SCOWL)</td><td>BSD-artig</td></tr>"
+           "<tr><td>Wörterbuch Spanisch</td><td>MPL 2.0</td></tr>"
+           "</table>"
+           "<p>Die Bibliotheken werden dynamisch eingebunden und können ersetzt werden; die "
+           "Lizenztexte liefert das Betriebssystem mit (unter Debian in /usr/share/doc).</p>")
+            .arg(version.toHtmlEscaped(), QString::fromLatin1(qVersion()), QStringLiteral(QT_VERSION_STR),
+                 sqlite.isEmpty() ? QString() : tr(", SQLite %1").arg(sqlite.toHtmlEscaped()));
+    auto box = std::make_unique<QMessageBox>(QMessageBox::Information, tr("Info über Varduna"), text,
+                                             QMessageBox::Ok, this);
+    box->setObjectName(QStringLiteral("aboutBox"));
+    box->setTextFormat(Qt::RichText);
+    // A message box wraps its text narrowly; the table of licences reads better wider.
+    if (auto* label = box->findChild<QLabel*>(QStringLiteral("qt_msgbox_label")))
+        label->setMinimumWidth(460);
+    return box;
+}
+
+QRect VDRMainWindow::fittedGeometry(QRect window, const QRect& available)
+{
+    window.setWidth(qMin(window.width(), available.width()));
+    window.setHeight(qMin(window.height(), available.height()));
+    if (window.right() > available.right())
+        window.moveRight(available.right());
+    if (window.bottom() > available.bottom())
+        window.moveBottom(available.bottom());
+    if (window.left() < available.left())
+        window.moveLeft(available.left());
+    if (window.top() < available.top())
+        window.moveTop(available.top());
+    return window;
+}
+
+void VDRMainWindow::restoreWindowGeometry(const QByteArray& geometry, const QByteArray& state, int instance)
+{
+    const bool restored = !geometry.isEmpty() && restoreGeometry(geometry);
+    restoreState(state);
+    updateViewActions();
+    if (isMaximized() || isFullScreen())
+        return;
+    QScreen* screen = restored ? QGuiApplication::screenAt(this->geometry().center()) : nullptr;
+    if (!screen)
+        screen = QGuiApplication::primaryScreen();
+    if (!screen)
+        return;
+    // Room for the frame the window manager adds around the window.
+    const QRect available = screen->availableGeometry().adjusted(0, 0, 0, -32);
+    QRect wanted = restored ? this->geometry() : QRect(QPoint(), kDefaultSize);
+    if (!restored)
+        wanted.moveCenter(available.center());
+    if (instance > 0) {
+        // Moved aside and, where the screen ends, narrowed rather than pushed back on top of the first.
+        const QPoint offset(kInstanceOffset * instance, kInstanceOffset * instance);
+        const QPoint topLeft = wanted.topLeft() + offset;
+        wanted.moveTopLeft(QPoint(qMin(topLeft.x(), available.left() + available.width() / 3),
+                                  qMin(topLeft.y(), available.top() + available.height() / 3)));
+        wanted.setRight(qMin(wanted.right(), available.right()));
+        wanted.setBottom(qMin(wanted.bottom(), available.bottom()));
+    }
+    setGeometry(fittedGeometry(wanted, available));
 }
 
 int VDRMainWindow::openDocument(const QString& path, bool noRecentEntry, bool noSaveQuestion)
@@ -212,6 +373,24 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
 {
     if (!m_document->isStateValid())
         return 0;
+    if (m_document->isDemoProject()) {
+        // The demo is never saved: only offer what can work.
+        if (withoutQuestion) {
+            VDRPrompt::information(tr("Speichern"), tr("Das Musterprojekt kann nicht gespeichert werden."));
+            return 1;
+        }
+        if (!m_document->isStateModified())
+            return 0;
+        const int choice = VDRPrompt::instance()->choose(
+            VDRPrompt::Question, tr("Dokument geändert"),
+            tr("Das Musterprojekt wurde geändert.\nDas Musterprojekt kann nicht gespeichert werden; "
+               "die Änderungen gehen beim Schließen verloren."),
+            {tr("Verwerfen"), tr("Abbrechen")}, 1, 1);
+        if (choice != 0)
+            return 1;
+        m_document->setMasterDataModified(false);
+        return 0;
+    }
     const QString file = m_document->getFilepath();
     const bool readOnly = !file.isEmpty() && QFileInfo::exists(file) && !QFileInfo(file).isWritable();
     if (!saveAs && readOnly && withoutQuestion) {
@@ -331,7 +510,9 @@ void VDRMainWindow::updateGuiRecentFileList()
     menu->clear();
     const QIcon icon(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico"));
     for (const QString& path : qAsConst(m_recentFiles)) {
-        QAction* entry = menu->addAction(icon, QFileInfo(path).fileName());
+        // An '&' in a file name is text, not a mnemonic.
+        QAction* entry =
+            menu->addAction(icon, QFileInfo(path).fileName().replace(QLatin1Char('&'), QLatin1String("&&")));
         entry->setData(path);
         entry->setToolTip(QDir::toNativeSeparators(path));
         connect(entry, &QAction::triggered, this, [this, path] {
@@ -339,6 +520,7 @@ void VDRMainWindow::updateGuiRecentFileList()
                 createDocument(true);
         });
     }
+    Ui_VDRMainWindowClass::assignMnemonics(menu->actions());
     menu->setEnabled(!m_recentFiles.isEmpty());
 }
 
@@ -347,6 +529,16 @@ void VDRMainWindow::updateGui()
     const bool valid = m_document->isStateValid();
     for (const char* name : kDocumentActions)
         m_ui.action(QLatin1String(name))->setEnabled(valid);
+    const bool demo = valid && m_document->isDemoProject();
+    for (const char* name : kSaveActions) {
+        QAction* action = m_ui.action(QLatin1String(name));
+        action->setEnabled(valid && !demo);
+        const QString tip = demo ? tr("Das Musterprojekt kann nicht gespeichert werden.")
+                                 : Ui_VDRMainWindowClass::plainText(action->text());
+        action->setToolTip(tip);
+        action->setStatusTip(demo ? tip : QString());
+    }
+    updateReportPage();
     m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_reportPage) : m_welcome);
     QString title = tr("Varduna");
     if (valid) {
@@ -387,10 +579,23 @@ void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
     connect(model, &VDRAllEntryTableModel::reportDatesChanged, this, &VDRMainWindow::slotReportDatesChanged,
             Qt::UniqueConnection);
     model->updateDates();
-    m_reportPage->setText(tr("<h2>%1</h2><p>%2 Bauberichte</p>")
-                              .arg(document->projectName().toHtmlEscaped())
-                              .arg(model->rowCount()));
     updateGui();
+}
+
+void VDRMainWindow::updateReportPage()
+{
+    if (!m_document->isStateValid())
+        return;
+    const int reports = m_document->modelEntryAll() ? m_document->modelEntryAll()->rowCount() : 0;
+    const QString count = reports == 1 ? tr("1 Baubericht") : tr("%1 Bauberichte").arg(reports);
+    // The heading is the project's name from its data, which may differ from the file's name.
+    QString file = m_document->isStateNew()
+                       ? tr("Noch nicht gespeichert")
+                       : tr("Datei: %1").arg(QFileInfo(m_document->getFilepath()).fileName().toHtmlEscaped());
+    const QString name = m_document->projectName();
+    if (name == QLatin1String("Neues Varduna") || name == VDRDocument::tr("Neues Varduna"))
+        file += tr("<br>Den Projektnamen ändern Sie unter Stammdaten - Projektdaten bearbeiten.");
+    m_reportPage->setText(tr("<h2>%1</h2><p>%2</p><p>%3</p>").arg(name.toHtmlEscaped(), count, file));
 }
 
 void VDRMainWindow::slotDocumentClosed(VDRDocument*)
@@ -467,22 +672,18 @@ void VDRMainWindow::on_actionFileExit_triggered()
 void VDRMainWindow::on_actionViewToolbar_triggered()
 {
     m_ui.mainToolBar->setVisible(!m_ui.mainToolBar->isVisible());
+    updateViewActions();
 }
 
 void VDRMainWindow::on_actionViewStatusbar_triggered()
 {
     statusBar()->setVisible(!statusBar()->isVisible());
+    updateViewActions();
 }
 
 void VDRMainWindow::on_actionNumberOfBackups_triggered()
 {
     VDRBackupConfigDialog dialog(this);
-    dialog.exec();
-}
-
-void VDRMainWindow::on_actionFileSizeWarning_triggered()
-{
-    VDRFileSizeConfigDialog dialog(this);
     dialog.exec();
 }
 
@@ -493,6 +694,7 @@ void VDRMainWindow::setSpellChecker(VDRSpellChecker* checker)
     action->setEnabled(checker && checker->isValid());
     action->setText(checker && checker->isActive() ? tr("Rechtschreibprüfung aus")
                                                    : tr("Rechtschreibprüfung ein"));
+    Ui_VDRMainWindowClass::assignMnemonics(m_ui.menu(QStringLiteral("menuSettings"))->actions());
 }
 
 void VDRMainWindow::on_actionStartSpellChecking_triggered()
@@ -511,6 +713,16 @@ void VDRMainWindow::syncCompleterTexts()
 void VDRMainWindow::on_actionVorschlagtexte_triggered()
 {
     CompleterEditor::editCompleters(this);
+}
+
+void VDRMainWindow::on_actionHelpShowHelp_triggered()
+{
+    showHelp();
+}
+
+void VDRMainWindow::on_actionHelpInfoDialog_triggered()
+{
+    createAboutBox()->exec();
 }
 
 void VDRMainWindow::on_actionCompactDB_triggered()

@@ -6,9 +6,12 @@
 #include <QMainWindow>
 #include <QStringList>
 
+#include <memory>
+
 class QCalendarWidget;
 class QDockWidget;
 class QLabel;
+class QMessageBox;
 class QStackedWidget;
 class QTableView;
 class QTimer;
@@ -46,6 +49,19 @@ public:
 
     // The demo project beside the program ("../Projects/Ejemplo.vd2").
     static QString demoProjectPath();
+    // The help page beside the program ("../Help/Varduna-Hilfe.html").
+    static QString helpPagePath();
+    // Opens the help page in the system's browser; says so when it cannot.
+    void showHelp();
+    // The "Info über Varduna" box: program, version, Qt, and the licences of the libraries shipped.
+    std::unique_ptr<QMessageBox> createAboutBox();
+
+    // Restores the saved geometry and state; a further running instance ('instance' > 0) is moved
+    // aside so it does not hide the first. The result always fits the screen.
+    void restoreWindowGeometry(const QByteArray& geometry, const QByteArray& state, int instance);
+    // 'window' moved and shrunk so that it lies within 'available', keeping as much of its place
+    // and size as fits.
+    static QRect fittedGeometry(QRect window, const QRect& available);
 
     // Ends at once, as on logout: unsaved work stays in the working copy for the next opening.
     void endSession();
@@ -71,10 +87,11 @@ private slots:
     void on_actionViewToolbar_triggered();
     void on_actionViewStatusbar_triggered();
     void on_actionNumberOfBackups_triggered();
-    void on_actionFileSizeWarning_triggered();
     void on_actionCompactDB_triggered();
     void on_actionStartSpellChecking_triggered();
     void on_actionVorschlagtexte_triggered();
+    void on_actionHelpShowHelp_triggered();
+    void on_actionHelpInfoDialog_triggered();
     void slotReportDatesChanged(const QList<QDate>& dates);
 
 protected:
@@ -84,6 +101,9 @@ private:
     QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content,
                          Qt::DockWidgetArea area);
     void connectActions();
+    // Check marks of the Ansicht menu follow what is shown.
+    void updateViewActions();
+    void updateReportPage();
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).
     void syncCompleterTexts();

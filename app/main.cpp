@@ -10,40 +10,18 @@
 #include "editing/VDRWidgetPrompt.h"
 
 #include <QDir>
-#include <QFileInfo>
-#include <QLibraryInfo>
 #include <QLocale>
+#include <QLockFile>
 #include <QProcess>
 #include <QSettings>
 #include <QSqlDatabase>
 #include <QTimer>
-#include <QTranslator>
+
+#include <memory>
 
 namespace {
 
 const int kRestartExitCode = 1000;
-
-void installTranslators(QCoreApplication& app, const QLocale& locale)
-{
-    const QString base = QCoreApplication::applicationDirPath();
-    const QString language = VDRSpellChecker::translationLanguage(locale.language(), locale.country());
-    const struct
-    {
-        QString name;
-        QString folder;
-    } files[] = {{QStringLiteral("qt_") + locale.name(), base + QStringLiteral("/../Translations")},
-                 {QStringLiteral("qtBase_") + locale.name(), base + QStringLiteral("/../Translations")},
-                 {QStringLiteral("ncreport_") + language, base + QStringLiteral("/../NCreport/i18n")},
-                 {QStringLiteral("vdr_") + language, base + QStringLiteral("/../Translations")}};
-    for (const auto& file : files) {
-        auto* translator = new QTranslator(&app);
-        // A missing translation leaves the German source texts; it must not stop the start.
-        if (translator->load(file.name, file.folder))
-            QCoreApplication::installTranslator(translator);
-        else
-            delete translator;
-    }
-}
 
 } // namespace
 
@@ -55,6 +33,7 @@ int main(int argc, char* argv[])
     QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
     QCoreApplication::setOrganizationDomain(QStringLiteral("korvant-software.de"));
     QCoreApplication::setApplicationName(QStringLiteral("Varduna"));
+    QCoreApplication::setApplicationVersion(QStringLiteral(VARDUNA_VERSION));
 
     QSettings settings;
     // German, English and Spanish are served; any other system language starts in German.
@@ -67,7 +46,7 @@ int main(int argc, char* argv[])
     const QLocale locale{chosen, chosen == QLocale::system().language() ? QLocale::system().country()
                                                                         : QLocale::AnyCountry};
     QLocale::setDefault(locale);
-    installTranslators(app, locale);
+    VDRStartup::installTranslators(app, locale);
 
     VDRWidgetPrompt prompt;
     VDRPrompt::setInstance(&prompt);
@@ -93,8 +72,11 @@ int main(int argc, char* argv[])
         g_mainWindow = &window;
         window.setSpellChecker(&spellChecker);
         prompt.setParentWidget(&window);
-        window.restoreGeometry(settings.value(VDRMainWindow::geometrySettingsKey()).toByteArray());
-        window.restoreState(settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray());
+        std::unique_ptr<QLockFile> instanceClaim;
+        const int instance = VDRStartup::claimInstance(QDir::tempPath(), instanceClaim);
+        window.restoreWindowGeometry(settings.value(VDRMainWindow::geometrySettingsKey()).toByteArray(),
+                                     settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray(),
+                                     instance);
         window.show();
 
         // Before the first document: a logout during a long opening must not kill us unprepared.
@@ -108,8 +90,12 @@ int main(int argc, char* argv[])
             VDRStartup::firstDocumentPath(app.fileToOpen(), settings, QCoreApplication::arguments().mid(1));
         const bool opened = VDRStartup::openFirstDocument(window, file);
         QObject::connect(&app, &QGuiApplication::lastWindowClosed, &app, &QCoreApplication::quit);
-        QObject::connect(&app, &VDRApplication::fileOpenRequested, &window,
-                         [&window](const QString& path) { window.openDocument(path, false, false); });
+        QObject::connect(&app, &VDRApplication::fileOpenRequested, &window, [&window](const QString& path) {
+            if (VDRStartup::isExchangeFile(path))
+                VDRStartup::refuseExchangeFile(path);
+            else
+                window.openDocument(path, false, false);
+        });
 
         if (!opened && settings.value(QStringLiteral("tips/showWelcomePageOnStart"), true).toBool())
             QTimer::singleShot(2000, &window, &VDRMainWindow::showWelcomePage);
