@@ -129,8 +129,9 @@ int cmdNew(const QString& file)
     const bool written = doc.writeWorkingCopyTo(QFileInfo(file).absoluteFilePath());
     doc.closeDocument();
     if (!written) {
-        VDRPrompt::critical(QObject::tr("Dateifehler"),
-                            VDRFileOps::withReason(QObject::tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(file)));
+        VDRPrompt::critical(
+            QObject::tr("Dateifehler"),
+            VDRFileOps::withReason(QObject::tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(file)));
         return ExitRefused;
     }
     out() << QFileInfo(file).absoluteFilePath() << "\n";
@@ -281,13 +282,11 @@ int cmdRestore(const QString& file)
 int cmdCheck(const QString& file, bool json)
 {
     const VDRDiaryCheck::Result r = VDRDiaryCheck::inspect(file);
-    static const char* const statusNames[] = {"can be opened",
-                                              "missing",
-                                              "damaged",
-                                              "held by a running instance",
-                                              "made by a newer version",
-                                              "cannot be opened"};
-    static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged, CheckHeld, CheckNewer, CheckRefused};
+    static const char* const statusNames[] = {
+        "can be opened",           "missing",         "damaged", "held by a running instance",
+        "made by a newer version", "cannot be opened"};
+    static const int exitCodes[] = {CheckOpenable, CheckMissing, CheckDamaged,
+                                    CheckHeld,     CheckNewer,   CheckRefused};
     if (json) {
         QJsonObject o;
         o.insert(QStringLiteral("status"), QLatin1String(statusNames[r.status]));

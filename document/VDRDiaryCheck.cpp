@@ -33,11 +33,11 @@ struct ReadOnlyLook
 ReadOnlyLook look(const QString& path, bool integrity)
 {
     ReadOnlyLook result;
-    const auto connection =
-        integrity ? VDRScopedConnection::readOnlyLook(QLatin1String(kCheckConnection), path)
-                  : std::make_unique<VDRScopedConnection>(QLatin1String(kCheckConnection), path,
-                                                          QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"),
-                                                          false);
+    const auto connection = integrity
+                                ? VDRScopedConnection::readOnlyLook(QLatin1String(kCheckConnection), path)
+                                : std::make_unique<VDRScopedConnection>(
+                                      QLatin1String(kCheckConnection), path,
+                                      QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_BUSY_TIMEOUT=0"), false);
     result.opened = connection->isOpen();
     if (!result.opened)
         return result;
@@ -104,8 +104,9 @@ QString trialOpening(const QString& diary)
     VDRPrompt::setInstance(previous);
     if (opened)
         return QString();
-    return recorder.problems.isEmpty() ? QStringLiteral("Fehler: Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!")
-                                       : recorder.problems.join(QLatin1Char('\n'));
+    return recorder.problems.isEmpty()
+               ? QStringLiteral("Fehler: Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!")
+               : recorder.problems.join(QLatin1Char('\n'));
 }
 
 // Opening needs to create the working copy beside the diary (or, resuming, to write to it).
@@ -118,8 +119,8 @@ QString workingCopyProblem(const QString& diary, bool resumable, bool demo)
     const QString reason = VDRFileOps::reasonText(errno);
     return (resumable ? QObject::tr("Die Working Copy Datei\n%1\nkann nicht geöffnet werden:\n%2")
                             .arg(QDir::toNativeSeparators(workingCopy), reason)
-                      : QObject::tr("Die Working Copy Datei konnte nicht erstellt werden.") + QLatin1Char('\n') +
-                            reason);
+                      : QObject::tr("Die Working Copy Datei konnte nicht erstellt werden.") +
+                            QLatin1Char('\n') + reason);
 }
 
 } // namespace

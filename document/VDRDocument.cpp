@@ -459,6 +459,16 @@ void VDRDocument::abandonOpening(bool removeWorkingCopy)
 
 bool VDRDocument::openDocument(const QString& path, bool& showError)
 {
+    // One problem, one message: a refusal explained on the way needs no general one after it.
+    const int shown = VDRPrompt::messagesShown();
+    const bool opened = openDocumentImpl(path, showError);
+    if (!opened && VDRPrompt::messagesShown() != shown)
+        showError = false;
+    return opened;
+}
+
+bool VDRDocument::openDocumentImpl(const QString& path, bool& showError)
+{
     showError = true;
     if (m_valid)
         return false;
@@ -496,9 +506,10 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                 probed = getFreeTempFile(QStringLiteral(".vd2"));
                 m_filesToRemove << probed + QStringLiteral("-journal");
                 if (!VDRFileOps::copy(workingCopy, probed)) {
-                    VDRPrompt::critical(tr("Dateifehler"),
-                                        VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
-                                                                   .arg(nativePath(workingCopy))));
+                    VDRPrompt::critical(
+                        tr("Dateifehler"),
+                        VDRFileOps::withReason(
+                            tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(workingCopy))));
                     abandonOpening(false);
                     showError = false;
                     return false;
@@ -588,8 +599,9 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
             }
         }
         if (!madeWorkingCopy) {
-            VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(
-                                                       tr("Die Working Copy Datei konnte nicht erstellt werden.")));
+            VDRPrompt::critical(
+                tr("Dateifehler"),
+                VDRFileOps::withReason(tr("Die Working Copy Datei konnte nicht erstellt werden.")));
             abandonOpening(m_demo || m_inspecting);
             showError = false;
         }
@@ -652,7 +664,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                 if (inspection) {
                     // An inspection changes no file; it shows what the backup holds instead.
                     m_inspecting = true;
-                    return openDocument(backup, showError);
+                    return openDocumentImpl(backup, showError);
                 }
                 QString newName;
                 QString error;
@@ -661,7 +673,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
                                            tr("Die Datei wurde erfolgreich wiederhergestellt und wird jetzt "
                                               "geöffnet.\nDie beschädigte Datei wurde umbenannt in %2.")
                                                .arg(nativePath(newName)));
-                    return openDocument(diaryPath, showError);
+                    return openDocumentImpl(diaryPath, showError);
                 }
                 VDRPrompt::critical(tr("Backup wiederherstellen"),
                                     tr("Die Datei konnte nicht wiederhegestellt werden.\n") + error);
@@ -878,20 +890,23 @@ bool VDRDocument::reopenWorkingCopyAfterError()
     closeConnection();
     // SQLite would make an empty database of a missing file, and the document would seem valid.
     if (!QFileInfo(m_workingCopyPath).isFile()) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Die Working Copy Datei\n%1\nexistiert nicht mehr.")
-                                                   .arg(nativePath(m_workingCopyPath)));
+        VDRPrompt::critical(
+            tr("Dateifehler"),
+            tr("Die Working Copy Datei\n%1\nexistiert nicht mehr.").arg(nativePath(m_workingCopyPath)));
         return false;
     }
     if (!openWorkingCopyConnection(true))
         return false;
     QSqlError error;
     {
-        // The copy was flushed when it was written; the lock's write needs no second flush.
+        // An empty exclusive transaction takes the same lock as the dummy row's write, and in
+        // exclusive locking mode keeps it, without writing: the copy needs no second flush, and a
+        // full disk cannot stop the user from going on with the open diary.
         QSqlQuery q(database());
-        q.exec(QStringLiteral("PRAGMA synchronous = OFF"));
-        const bool locked = writeDummyRow(database(), error);
-        q.exec(QStringLiteral("PRAGMA synchronous = FULL"));
+        const bool locked = q.exec(QStringLiteral("BEGIN EXCLUSIVE TRANSACTION")) &&
+                            q.exec(QStringLiteral("COMMIT TRANSACTION"));
         if (!locked) {
+            error = q.lastError();
             q.finish();
             VDRPrompt::critical(tr("Datenbankfehler"),
                                 tr("Die Working Copy Datei\n%1\nkann nicht wieder gesperrt werden:\n%2")

@@ -350,6 +350,7 @@ private:
     bool openWorkingCopyConnection(bool showErrors);
     void closeConnection();
     void abandonOpening(bool removeWorkingCopy);
+    bool openDocumentImpl(const QString& path, bool& showError);
     VDRSqlTableModel* createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter);
     void connectIdGenerator(VDRSqlTableModel* model);
     bool importExternalDocuments();

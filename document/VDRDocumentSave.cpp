@@ -10,17 +10,17 @@
 #include "document/VDRScopedConnection.h"
 
 #include <QCoreApplication>
-#include <QEventLoop>
-#include <QThread>
-#include <QTimer>
 #include <QDebug>
 #include <QDir>
+#include <QEventLoop>
 #include <QFileInfo>
 #include <QRegularExpression>
 #include <QSettings>
 #include <QSqlDatabase>
 #include <QSqlError>
 #include <QSqlQuery>
+#include <QThread>
+#include <QTimer>
 
 namespace {
 
@@ -102,8 +102,9 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (n < 1 || !QFileInfo::exists(diary)) {
         if (VDRFileOps::replaceFile(temporary, diary))
             return true;
-        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
-                                                                        .arg(nativePath(diary))));
+        VDRPrompt::critical(
+            tr("Dateifehler"),
+            VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary))));
         return false;
     }
 
@@ -115,9 +116,10 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
         dropped = backup + QLatin1String(kDropSuffix);
         QFile::remove(dropped);
         if (!VDRFileOps::rename(backup, dropped)) {
-            VDRPrompt::critical(tr("Dateifehler"),
-                                VDRFileOps::withReason(
-                                    tr("Löschen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(backup))));
+            VDRPrompt::critical(
+                tr("Dateifehler"),
+                VDRFileOps::withReason(
+                    tr("Löschen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(backup))));
             dropped.clear();
             return false;
         }
@@ -135,9 +137,10 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
                 continue;
             const QString to = backupName(diary, k + 1);
             if (!VDRFileOps::rename(from, to)) {
-                VDRPrompt::critical(tr("Dateifehler"),
-                                    VDRFileOps::withReason(tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.")
-                                                               .arg(nativePath(from))));
+                VDRPrompt::critical(
+                    tr("Dateifehler"),
+                    VDRFileOps::withReason(
+                        tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(from))));
                 undo(done);
                 return false;
             }
@@ -156,17 +159,19 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     if (!linked) {
         renamed = VDRFileOps::rename(diary, newest);
         if (!renamed) {
-            VDRPrompt::critical(tr("Dateifehler"),
-                                VDRFileOps::withReason(tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.")
-                                                           .arg(nativePath(diary))));
+            VDRPrompt::critical(
+                tr("Dateifehler"),
+                VDRFileOps::withReason(
+                    tr("Umbenennen der Backup-Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary))));
             undo(done);
             return false;
         }
     }
     bool replaced = false;
     if (!VDRFileOps::replaceFile(temporary, diary, &replaced)) {
-        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
-                                                                        .arg(nativePath(diary))));
+        VDRPrompt::critical(
+            tr("Dateifehler"),
+            VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(diary))));
         if (replaced) {
             // The new diary is in place but its folder could not be flushed: the save failed and
             // says so, and every backup stays where the rotation put it.
@@ -196,8 +201,8 @@ QString VDRDocument::copyCheckedWorkingCopy(const QString& target, const QString
     QString integrity;
     const bool copied = copy.copyAndWait([&] {
         const auto check = VDRScopedConnection::readOnlyLook(QStringLiteral("SAVECHECK"), m_workingCopyPath);
-        integrity = check->isOpen() ? checkDbIntegrity(check->db())
-                                    : CVdShared::sqlErrorText(check->lastError());
+        integrity =
+            check->isOpen() ? checkDbIntegrity(check->db()) : CVdShared::sqlErrorText(check->lastError());
     });
     if (!copied) {
         VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(failureText));
@@ -335,7 +340,8 @@ QString VDRDocument::vacuumInto(const QString& target)
     QEventLoop loop;
     QTimer progress;
     QObject::connect(&progress, &QTimer::timeout, [&] {
-        VDRPrompt::instance()->noticeProgress(int(std::min<qint64>(99, QFileInfo(temporary).size() * 100 / sourceSize)));
+        VDRPrompt::instance()->noticeProgress(
+            int(std::min<qint64>(99, QFileInfo(temporary).size() * 100 / sourceSize)));
     });
     QObject::connect(worker.get(), &QThread::finished, &loop, &QEventLoop::quit);
     progress.start(200);
@@ -355,8 +361,9 @@ QString VDRDocument::vacuumInto(const QString& target)
     }
     if (ok && !VDRFileOps::flush(temporary)) {
         QFile::remove(temporary);
-        VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.")
-                                                                        .arg(nativePath(target))));
+        VDRPrompt::critical(
+            tr("Dateifehler"),
+            VDRFileOps::withReason(tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(target))));
         return QString();
     }
     if (!ok) {

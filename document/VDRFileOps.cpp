@@ -107,9 +107,11 @@ QString VDRFileOps::reasonText(int errorNumber)
     case 0:
         return QString();
     case ENOSPC:
-        return QCoreApplication::translate("VDRFileOps", "Auf dem Gerät ist kein Speicherplatz mehr verfügbar.");
+        return QCoreApplication::translate("VDRFileOps",
+                                           "Auf dem Gerät ist kein Speicherplatz mehr verfügbar.");
     case EDQUOT:
-        return QCoreApplication::translate("VDRFileOps", "Der zugewiesene Plattenplatz (Quota) ist überschritten.");
+        return QCoreApplication::translate("VDRFileOps",
+                                           "Der zugewiesene Plattenplatz (Quota) ist überschritten.");
     case EACCES:
     case EPERM:
         return QCoreApplication::translate("VDRFileOps", "Keine Berechtigung.");
@@ -368,8 +370,8 @@ bool VDRFileOps::copyDurably(const QString& source, const QString& target)
 void VDRFileOps::removeInBackground(const QString& path, const QString& neighbour)
 {
     const QFileInfo fi(neighbour);
-    QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() +
-                        QLatin1String(kRemovalInfix) + QStringLiteral("XXXXXX.tmp"));
+    QTemporaryFile name(fi.absolutePath() + QLatin1Char('/') + fi.fileName() + QLatin1String(kRemovalInfix) +
+                        QStringLiteral("XXXXXX.tmp"));
     if (!name.open()) {
         QFile::remove(path);
         return;

@@ -35,12 +35,14 @@ VDRScopedConnection::~VDRScopedConnection()
     QSqlDatabase::removeDatabase(m_name);
 }
 
-std::unique_ptr<VDRScopedConnection> VDRScopedConnection::readOnlyLook(const QString& name, const QString& path)
+std::unique_ptr<VDRScopedConnection> VDRScopedConnection::readOnlyLook(const QString& name,
+                                                                       const QString& path)
 {
     QUrl uri = QUrl::fromLocalFile(path);
     uri.setQuery(QStringLiteral("immutable=1"));
     return std::make_unique<VDRScopedConnection>(name, uri.toString(QUrl::FullyEncoded),
-                                   QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_OPEN_URI"), false);
+                                                 QStringLiteral("QSQLITE_OPEN_READONLY;QSQLITE_OPEN_URI"),
+                                                 false);
 }
 
 int VDRScopedConnection::sqliteCode(const QSqlError& error)

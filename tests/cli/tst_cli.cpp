@@ -6,6 +6,7 @@
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QProcess>
+#include <QScopeGuard>
 #include <QSettings>
 #include <QTemporaryDir>
 #include <QtTest>
@@ -37,6 +38,7 @@ private slots:
     void usageErrors();
     void newWritesAFreshDiary();
     void newRefusesExistingFile();
+    void newLeavesNoDocumentsOfAnEarlierDiary();
     void infoListsReports_data();
     void infoListsReports();
     void infoUpgradesOnlyTheWorkingCopy();
@@ -132,6 +134,15 @@ void TestCli::newWritesAFreshDiary()
         QCOMPARE(tableLayout(path, table), tableLayout(reference, table));
 }
 
+void TestCli::newLeavesNoDocumentsOfAnEarlierDiary()
+{
+    const QString path = m_dir.filePath(QStringLiteral("wieder.vd2"));
+    const QString documents = VDRDocument::documentsDbPathFor(path);
+    QVERIFY(execSql(documents, {"CREATE TABLE documents (id INTEGER)"}));
+    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
+    QVERIFY(!QFile::exists(documents));
+}
+
 void TestCli::newRefusesExistingFile()
 {
     const QString path = m_dir.filePath(QStringLiteral("vorhanden.vd2"));
@@ -213,12 +224,32 @@ void TestCli::checkExitCodes_data()
     QTest::addColumn<QString>("kind");
     QTest::addColumn<int>("exitCode");
     QTest::addColumn<QString>("status");
-    QTest::newRow("intact") << "intact" << 0 << "can be opened";
-    QTest::newRow("missing") << "missing" << 2 << "missing";
-    QTest::newRow("folder") << "folder" << 2 << "missing";
-    QTest::newRow("damaged") << "damaged" << 3 << "damaged";
-    QTest::newRow("not a diary") << "text" << 3 << "damaged";
-    QTest::newRow("newer") << "newer" << 5 << "made by a newer version";
+    QTest::addColumn<QString>(
+        "refusal"); // the title with which opening refuses, for the cases check predicts
+    QTest::newRow("intact") << "intact" << 0 << "can be opened"
+                            << "";
+    QTest::newRow("missing") << "missing" << 2 << "missing"
+                             << "Dateifehler";
+    QTest::newRow("folder") << "folder" << 2 << "missing"
+                            << "Dateifehler";
+    QTest::newRow("damaged") << "damaged" << 3 << "damaged"
+                             << "-";
+    QTest::newRow("not a diary") << "text" << 3 << "damaged"
+                                 << "-";
+    QTest::newRow("newer") << "newer" << 5 << "made by a newer version"
+                           << "Datei öffnen";
+    QTest::newRow("no meta table") << "no meta" << 6 << "cannot be opened"
+                                   << "SQL Error";
+    QTest::newRow("no vdr table") << "no vdr" << 6 << "cannot be opened"
+                                  << "Datenbankfehler";
+    QTest::newRow("renamed meta columns") << "renamed" << 6 << "cannot be opened"
+                                          << "SQL Error";
+    QTest::newRow("leftover dummy row") << "dummy" << 0 << "can be opened"
+                                        << "";
+    QTest::newRow("WAL mode") << "wal" << 0 << "can be opened"
+                              << "";
+    QTest::newRow("folder without write access") << "immutable" << 6 << "cannot be opened"
+                                                 << "Dateifehler";
 }
 
 void TestCli::checkExitCodes()
@@ -226,7 +257,10 @@ void TestCli::checkExitCodes()
     QFETCH(QString, kind);
     QFETCH(int, exitCode);
     QFETCH(QString, status);
-    const QString path = m_dir.filePath(QStringLiteral("check-%1.vd2").arg(kind));
+    QFETCH(QString, refusal);
+    const QString folder = m_dir.filePath(QStringLiteral("check-") + kind);
+    QDir().mkpath(folder);
+    const QString path = QDir(folder).filePath(QStringLiteral("tagebuch.vd2"));
     if (kind == QLatin1String("folder")) {
         QDir().mkpath(path);
     } else if (kind == QLatin1String("text")) {
@@ -237,15 +271,45 @@ void TestCli::checkExitCodes()
         QVERIFY(createDiary(path));
         if (kind == QLatin1String("damaged"))
             QVERIFY(damageFile(path));
-        if (kind == QLatin1String("newer"))
-            QVERIFY(execSql(path, {"UPDATE meta SET value = '0.10' WHERE key = 'fileversion'"}));
+        const QMap<QString, QString> change{
+            {"newer", "UPDATE meta SET value = '0.10' WHERE key = 'fileversion'"},
+            {"no meta", "DROP TABLE meta"},
+            {"no vdr", "DROP TABLE vdr"},
+            {"renamed", "ALTER TABLE meta RENAME COLUMN key TO schluessel"},
+            {"dummy", "INSERT INTO meta (key, value) VALUES ('dummy', 'dummy')"},
+            {"wal", "PRAGMA journal_mode = WAL"}};
+        if (change.contains(kind))
+            QVERIFY(execSql(path, {change.value(kind)}));
         QVERIFY(QFile::copy(path, path + QStringLiteral(".bak")));
     }
-    const QByteArray before = fileHash(path);
+    auto mutableAgain = qScopeGuard([&] {
+        if (kind == QLatin1String("immutable"))
+            setImmutable(folder, false);
+    });
+    if (kind == QLatin1String("immutable") && !setImmutable(folder, true))
+        QSKIP("the file system cannot make a folder immutable");
+    auto folderState = [&] {
+        QStringList state;
+        for (const QString& name : QDir(folder).entryList(QDir::Files | QDir::Hidden, QDir::Name))
+            state << name + QLatin1Char('=') +
+                         QString::fromLatin1(fileHash(QDir(folder).filePath(name)).toHex());
+        return state;
+    };
+    const QStringList before = folderState();
     const Run r = cli({QStringLiteral("check"), path});
     QCOMPARE(r.exitCode, exitCode);
     QVERIFY2(r.out.startsWith(QStringLiteral("Status: ") + status + QLatin1Char('\n')), qPrintable(r.out));
-    QCOMPARE(fileHash(path), before);
+    QCOMPARE(folderState(), before);
+
+    // Opening agrees with what check said.
+    if (refusal != QLatin1String("-")) {
+        VDRDocument doc;
+        bool showError = true;
+        if (!refusal.isEmpty())
+            m_prompt.expect(refusal);
+        QCOMPARE(doc.openDocument(path, showError), refusal.isEmpty());
+        doc.closeDocument();
+    }
     if (kind == QLatin1String("intact"))
         QVERIFY(r.out.contains(QLatin1String("Working copy: none\nBackups: 1\n")));
 

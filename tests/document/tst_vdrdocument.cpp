@@ -5,7 +5,9 @@
 
 #include <QDir>
 #include <QProcess>
+#include <QScopeGuard>
 #include <QSignalSpy>
+#include <QSqlQuery>
 #include <QTemporaryDir>
 #include <QtTest>
 
@@ -91,6 +93,12 @@ private slots:
     void readOnlyDiaryWarns();
     void demoProjectFromReadOnlyFolder();
     void temporaryFilesAreRemovedOnClose();
+    void resumedCopyIsNeverLost_data();
+    void resumedCopyIsNeverLost();
+    void strayJournalNeverReachesTheDiary();
+    void openingNeverWritesTheDiary_data();
+    void openingNeverWritesTheDiary();
+    void lostWorkingCopyFailsTheReopening();
     void checkDbIntegrity_data();
     void checkDbIntegrity();
 
@@ -202,7 +210,7 @@ void TestVDRDocument::refusedFilesStayUntouched_data()
                                   << "mit einer neueren Programmversion erstellt" << false;
     QTest::newRow("other database") << "foreign"
                                     << "Datenbankfehler"
-                                    << "Tabelle vdr fehlt" << true;
+                                    << "Tabelle vdr fehlt" << false;
     QTest::newRow("damaged, cancelled") << "damaged"
                                         << "Beschädigte Datenbank-Datei"
                                         << "Es existieren keine Backup-Dateien." << false;
@@ -352,7 +360,8 @@ void TestVDRDocument::fileHeldByAnotherProcess()
         m_prompt.expect(
             QStringLiteral("Datenbank in Bearbeitung"),
             QStringLiteral("da sie in Bearbeitung ist von\nUser: kollegin\nComputer: %1\nseit dem %2 ")
-                .arg(VDRDocument::currentComputerName(), QDate::currentDate().toString(QStringLiteral("dd.MM.yyyy"))));
+                .arg(VDRDocument::currentComputerName(),
+                     QDate::currentDate().toString(QStringLiteral("dd.MM.yyyy"))));
     else
         m_prompt.expect(QStringLiteral("Datenbank in Bearbeitung"),
                         QStringLiteral("Die Datei konnte nicht geöffnet werden, da sie in Bearbeitung ist."));
@@ -460,6 +469,168 @@ void TestVDRDocument::temporaryFilesAreRemovedOnClose()
     QVERIFY(!QFile::exists(a));
     QVERIFY(!QFile::exists(b));
     QVERIFY(!QFileInfo::exists(folder));
+}
+
+namespace {
+// Every file in the folder with its hash: shows that nothing beside a diary changed.
+QStringList folderState(const QString& folder)
+{
+    QStringList state;
+    const QDir dir(folder);
+    for (const QString& name : dir.entryList(QDir::Files | QDir::Hidden, QDir::Name))
+        state << name + QLatin1Char('=') + QString::fromLatin1(fileHash(dir.filePath(name)).toHex());
+    return state;
+}
+} // namespace
+
+void TestVDRDocument::resumedCopyIsNeverLost_data()
+{
+    QTest::addColumn<QString>("kind");
+    QTest::addColumn<bool>("opens");
+    QTest::newRow("inspected") << "inspected" << true;
+    QTest::newRow("leftover dummy row") << "dummy" << true;
+    QTest::newRow("copy that cannot be written") << "immutable" << false;
+    QTest::newRow("full disk") << "full" << false;
+}
+
+// The working copy left by a crash holds the only state of unsaved work: no opening may lose it.
+void TestVDRDocument::resumedCopyIsNeverLost()
+{
+    QFETCH(QString, kind);
+    QFETCH(bool, opens);
+    const QString folder = m_dir.filePath(QStringLiteral("rest-") + kind);
+    std::unique_ptr<SmallDisk> disk;
+    if (kind == QLatin1String("full")) {
+        disk = std::make_unique<SmallDisk>(folder, 1024 * 1024);
+        if (!disk->isMounted())
+            QSKIP("no small file system can be mounted here");
+    }
+    const QString path = newDiary(QStringLiteral("rest-%1/rest.vd2").arg(kind));
+    const QString workingCopy = path + QStringLiteral(".workingcopy");
+    const QString lockInfo = VDRDocument::lockInfoPathFor(path);
+    QVERIFY(QFile::copy(path, workingCopy));
+    QVERIFY(execSql(workingCopy, {"UPDATE vdr SET name = 'Ungespeicherter Stand'"}));
+    if (kind == QLatin1String("dummy"))
+        QVERIFY(execSql(workingCopy, {"INSERT INTO meta (key, value) VALUES ('dummy', 'dummy')"}));
+    QFile info(lockInfo);
+    QVERIFY(info.open(QIODevice::WriteOnly));
+    info.write(QStringLiteral("%1\n%2\nSun Dec 6 2026\n09:15\n")
+                   .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName())
+                   .toUtf8());
+    info.close();
+    const bool immutable = kind == QLatin1String("immutable");
+    auto mutableAgain = qScopeGuard([&] {
+        if (immutable)
+            setImmutable(workingCopy, false);
+    });
+    if (immutable && !setImmutable(workingCopy, true))
+        QSKIP("the file system cannot make a file immutable");
+    if (disk)
+        QVERIFY(disk->fill());
+    const QStringList before = folderState(folder);
+
+    VDRDocument doc;
+    doc.setInspecting(kind == QLatin1String("inspected"));
+    bool showError = true;
+    if (opens)
+        m_prompt.expect(QStringLiteral("Datei öffnen"),
+                        QStringLiteral("Der letzte Bearbeitungsstand wird geöffnet."));
+    else
+        m_prompt.expect(QStringLiteral("Datenbankfehler"),
+                        QStringLiteral("Die Datei bleibt erhalten, damit keine ungespeicherten Änderungen "
+                                       "verloren gehen."));
+    QCOMPARE(doc.openDocument(path, showError), opens);
+    if (opens) {
+        QCOMPARE(doc.projectName(), QStringLiteral("Ungespeicherter Stand"));
+        QVERIFY(doc.closeDocument());
+    }
+    QCOMPARE(showError, opens); // a refusal explained itself
+    if (kind == QLatin1String("dummy")) {
+        QVERIFY(!QFile::exists(workingCopy)); // closed properly, as any opening
+    } else {
+        QCOMPARE(folderState(folder), before);
+    }
+}
+
+// A journal whose working copy is gone (deleted by hand or by a sync client) is not the journal of
+// the next fresh copy: rolled into it, it would make the next save write a damaged diary.
+void TestVDRDocument::strayJournalNeverReachesTheDiary()
+{
+    const QString path = newDiary(QStringLiteral("streu/tagebuch.vd2"));
+    // A hot journal as SQLite writes one: a header, then page 2's "original" content with its checksum.
+    QByteArray journal = QByteArray::fromHex("d9d505f920a163d7");
+    QDataStream header(&journal, QIODevice::Append);
+    header << quint32(1) << quint32(0) << quint32(QFileInfo(path).size() / 4096) << quint32(512)
+           << quint32(4096);
+    journal = journal.leftJustified(512, '\0');
+    const QByteArray page(4096, '\xA5');
+    quint32 checksum = 0;
+    for (int i = 4096 - 200; i > 0; i -= 200)
+        checksum += quint8(page[i]);
+    QDataStream record(&journal, QIODevice::Append);
+    record << quint32(2);
+    journal += page;
+    record.device()->seek(journal.size());
+    record << checksum;
+    QFile stray(path + QStringLiteral(".workingcopy-journal"));
+    QVERIFY(stray.open(QIODevice::WriteOnly));
+    stray.write(journal);
+    stray.close();
+
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    QVERIFY(doc.modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("Gespeichert")));
+    QVERIFY(doc.modelVdr()->submitAll());
+    QCOMPARE(doc.saveDocument(), 0);
+    QVERIFY(doc.closeDocument());
+    QCOMPARE(queryValue(path, QStringLiteral("PRAGMA quick_check")).toString(), QStringLiteral("ok"));
+    QCOMPARE(queryValue(path, QStringLiteral("SELECT name FROM vdr")).toString(),
+             QStringLiteral("Gespeichert"));
+}
+
+void TestVDRDocument::openingNeverWritesTheDiary_data()
+{
+    QTest::addColumn<bool>("unreadable");
+    QTest::addColumn<bool>("inspecting");
+    QTest::newRow("intact") << false << false;
+    QTest::newRow("intact, inspected") << false << true;
+    QTest::newRow("no integrity result") << true << false;
+    QTest::newRow("no integrity result, inspected") << true << true;
+}
+
+// Only saving, restoring and compacting change a diary's bytes; opening and closing never do.
+void TestVDRDocument::openingNeverWritesTheDiary()
+{
+    QFETCH(bool, unreadable);
+    QFETCH(bool, inspecting);
+    const QString path = newDiary(QStringLiteral("unberuehrt.vd2"));
+    if (unreadable) {
+        QVERIFY(damageSchemaPage(path));
+        m_prompt.expect(QStringLiteral("Beschädigte Datenbank-Datei"),
+                        QStringLiteral("Es existieren keine Backup-Dateien."), 1);
+        m_prompt.expect(QStringLiteral("SQL Error"), QStringLiteral("malformed"));
+    }
+    const QByteArray hash = fileHash(path);
+    VDRDocument doc;
+    doc.setInspecting(inspecting);
+    bool showError = true;
+    if (doc.openDocument(path, showError))
+        QVERIFY(doc.closeDocument());
+    QCOMPARE(fileHash(path), hash);
+}
+
+void TestVDRDocument::lostWorkingCopyFailsTheReopening()
+{
+    const QString path = newDiary(QStringLiteral("verloren.vd2"));
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    QVERIFY(QFile::remove(doc.getFilepathWorkingCopy()));
+    m_prompt.expect(QStringLiteral("Dateifehler"), QStringLiteral("existiert nicht mehr."));
+    QVERIFY(!doc.reopenWorkingCopyAfterError());
+    QVERIFY(!QFile::exists(doc.getFilepathWorkingCopy())); // no empty database made in its place
+    doc.closeDocument();
 }
 
 void TestVDRDocument::checkDbIntegrity_data()

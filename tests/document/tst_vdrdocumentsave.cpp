@@ -1,5 +1,6 @@
 #include "VDRTestFixtures.h"
 #include "VDRTestPrompt.h"
+#include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
 #include "document/VDRFileSizeDialog.h"
@@ -10,6 +11,8 @@
 #include <QSqlQuery>
 #include <QTemporaryDir>
 #include <QtTest>
+
+#include <cerrno>
 
 using namespace VDRTestFixtures;
 
@@ -59,6 +62,8 @@ private slots:
     void damagedDiaryIsRestoredFromNewestIntactBackup_data();
     void damagedDiaryIsRestoredFromNewestIntactBackup();
     void compactionRemovesUnreferencedImages();
+    void compactionAfterACancelledSaveKeepsTheFileMode();
+    void fullDiskGivesOneMessageWithItsReason();
     void manyDeletedImagesOfferCompaction();
     void fileSizeCheckAfterOpening_data();
     void fileSizeCheckAfterOpening();
@@ -230,10 +235,9 @@ void TestVDRDocumentSave::failedSaveLeavesEverythingComplete()
     // The diary is complete and holds the old or the new state (the new one when only flushing the
     // folder after the final rename failed); backups are intact; nothing else lies around.
     QVERIFY(intact(path));
-    QCOMPARE(projectNameIn(path),
-             failed && !finalFlushFailed
-                 ? (firstSave ? QStringLiteral("Generation 4") : QStringLiteral("Zwischenstand"))
-                 : QStringLiteral("Neuer Stand"));
+    QCOMPARE(projectNameIn(path), failed && !finalFlushFailed ? (firstSave ? QStringLiteral("Generation 4")
+                                                                           : QStringLiteral("Zwischenstand"))
+                                                              : QStringLiteral("Neuer Stand"));
     QStringList after;
     for (const QString& name : filesBeside(path)) {
         const QString file = QFileInfo(path).dir().filePath(name);
@@ -533,6 +537,67 @@ void TestVDRDocumentSave::compactionRemovesUnreferencedImages()
     m_prompt.expect(QStringLiteral("Datenbank bereinigen"),
                     QStringLiteral("Die Datenbank wurde erfolgreich bereinigt.\n"));
     QCOMPARE(doc.compactDB(true), 0);
+    QVERIFY(doc.closeDocument());
+}
+
+void TestVDRDocumentSave::compactionAfterACancelledSaveKeepsTheFileMode()
+{
+    const QString path = diary(QStringLiteral("d.vd2"));
+    QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
+    QVERIFY(QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner | QFile::ReadGroup));
+    const QFile::Permissions mode = QFile::permissions(path);
+    VDRDocument doc;
+    bool showError = true;
+    m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("wird jetzt erweitert"));
+    QVERIFY(doc.openDocument(path, showError));
+
+    // Cancelling the save's question is no failure; the next compaction goes through.
+    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("wird jetzt bereinigt"));
+    m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("Vorgang fortsetzen?"),
+                    VDRPrompt::Cancel);
+    QCOMPARE(doc.compactDB(true), 1);
+    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("wird jetzt bereinigt"));
+    m_prompt.expect(QStringLiteral("Datei-Warnung"), QStringLiteral("Vorgang fortsetzen?"), VDRPrompt::Ok);
+    m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("erfolgreich bereinigt"));
+    QCOMPARE(doc.compactDB(true), 0);
+    QCOMPARE(QFile::permissions(path), mode);
+    QVERIFY(VDRDiaryCheck::isHeld(doc.getFilepathWorkingCopy())); // the lock is taken again
+    QVERIFY(doc.closeDocument());
+    QVERIFY(intact(path));
+}
+
+void TestVDRDocumentSave::fullDiskGivesOneMessageWithItsReason()
+{
+    const QString folder = m_dir.filePath(QStringLiteral("voll"));
+    SmallDisk disk(folder, 1024 * 1024);
+    const QString path = QDir(folder).filePath(QStringLiteral("d.vd2"));
+    QVERIFY(createDiary(path));
+    const QByteArray before = fileHash(path);
+    VDRDocument doc;
+    bool showError = true;
+    QVERIFY(doc.openDocument(path, showError));
+    rename(doc, QStringLiteral("Ungespeichert"));
+    // A real full disk where the test may mount one, else the same error injected.
+    if (disk.isMounted()) {
+        QVERIFY(disk.fill());
+    } else {
+        VDRFileOps::setFailurePredicate(
+            [](VDRFileOps::Op op, const QString&) { return op == VDRFileOps::Copy; });
+        VDRFileOps::setFailureErrno(ENOSPC);
+    }
+    m_prompt.expect(
+        QStringLiteral("Dateifehler"),
+        QStringLiteral("Kopieren der Datei\n%1\n fehlgeschlagen.\nAuf dem Gerät ist kein Speicherplatz "
+                       "mehr verfügbar.")
+            .arg(QDir::toNativeSeparators(path)));
+    const int shown = VDRPrompt::messagesShown();
+    QCOMPARE(doc.saveDocument(), 2);
+    QCOMPARE(VDRPrompt::messagesShown(), shown + 1);
+    VDRFileOps::setFailurePredicate(nullptr);
+    // Nothing is lost: the diary is as it was, the edit stays open in the working copy.
+    QCOMPARE(fileHash(path), before);
+    QVERIFY(doc.isStateValid());
+    QCOMPARE(doc.projectName(), QStringLiteral("Ungespeichert"));
     QVERIFY(doc.closeDocument());
 }
 

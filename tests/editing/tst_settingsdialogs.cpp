@@ -1,7 +1,9 @@
 #include "VDRTestFixtures.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRFileSizeConfigDialog.h"
+#include "editing/VDRWidgetPrompt.h"
 
+#include <QProgressDialog>
 #include <QPushButton>
 #include <QSettings>
 #include <QSpinBox>
@@ -18,6 +20,7 @@ private slots:
     void initTestCase();
     void storesOnlyOnOk_data();
     void storesOnlyOnOk();
+    void longWorkNoticeShowsProgressAndCloses();
 
 private:
     QTemporaryDir m_dir;
@@ -88,6 +91,29 @@ void TestSettingsDialogs::storesOnlyOnOk()
     QCOMPARE(QSettings().value(key).toInt(), 7 * step);
     click(d.get(), "pushButtonOk");
     QCOMPARE(QSettings().value(key).toInt(), defaultValue);
+}
+
+// The box shown during compaction must go away when the work ends: a box without buttons that
+// refuses to close leaves a window nobody can use.
+void TestSettingsDialogs::longWorkNoticeShowsProgressAndCloses()
+{
+    QWidget window;
+    VDRWidgetPrompt prompt;
+    prompt.setParentWidget(&window);
+    auto visibleBoxes = [] {
+        QList<QProgressDialog*> boxes;
+        for (QWidget* w : QApplication::topLevelWidgets())
+            if (auto* box = qobject_cast<QProgressDialog*>(w); box && box->isVisible())
+                boxes << box;
+        return boxes;
+    };
+    prompt.beginNotice(QStringLiteral("Datenbank bereinigen"),
+                       QStringLiteral("Die Datenbank wird jetzt bereinigt."));
+    QCOMPARE(visibleBoxes().size(), 1);
+    prompt.noticeProgress(40);
+    QCOMPARE(visibleBoxes().first()->value(), 40);
+    prompt.endNotice();
+    QVERIFY(visibleBoxes().isEmpty());
 }
 
 QTEST_MAIN(TestSettingsDialogs)

@@ -7,6 +7,7 @@
 #include <QDebug>
 #include <QDir>
 #include <QFile>
+#include <QProcess>
 #include <QSettings>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -149,6 +150,49 @@ bool damageFile(const QString& path)
         f.write(QByteArray(64, '\xA5'));
     }
     return f.flush();
+}
+
+bool damageSchemaPage(const QString& path)
+{
+    QFile f(path);
+    if (!f.open(QIODevice::ReadWrite) || !f.seek(100))
+        return false;
+    f.write(QByteArray(8, '\xFF'));
+    return f.flush();
+}
+
+bool setImmutable(const QString& path, bool immutable)
+{
+    return QProcess::execute(QStringLiteral("chattr"),
+                             {immutable ? QStringLiteral("+i") : QStringLiteral("-i"), path}) == 0;
+}
+
+SmallDisk::SmallDisk(const QString& folder, qint64 bytes) : m_folder(folder)
+{
+    QDir().mkpath(folder);
+    QProcess mount;
+    mount.start(QStringLiteral("mount"),
+                {QStringLiteral("-t"), QStringLiteral("tmpfs"), QStringLiteral("-o"),
+                 QStringLiteral("size=%1").arg(bytes), QStringLiteral("tmpfs"), folder});
+    m_mounted =
+        mount.waitForFinished(10000) && mount.exitStatus() == QProcess::NormalExit && mount.exitCode() == 0;
+}
+
+SmallDisk::~SmallDisk()
+{
+    if (m_mounted)
+        QProcess::execute(QStringLiteral("umount"), {QStringLiteral("-l"), m_folder});
+}
+
+bool SmallDisk::fill()
+{
+    QFile filler(QDir(m_folder).filePath(QStringLiteral("filler.bin")));
+    if (!filler.open(QIODevice::WriteOnly | QIODevice::Append | QIODevice::Unbuffered))
+        return false;
+    const QByteArray block(4096, 'x');
+    while (filler.write(block) == block.size()) {
+    }
+    return true;
 }
 
 bool createOldestLayoutDiary(const QString& path, const QString& fileVersion)

@@ -34,5 +34,29 @@ QByteArray fileHash(const QString& path);
 
 // Overwrites bytes in the middle of the file so that SQLite sees a damaged b-tree.
 bool damageFile(const QString& path);
+// Overwrites the schema page's b-tree header: SQLite cannot even run its integrity check.
+bool damageSchemaPage(const QString& path);
+
+// Makes a file or folder immutable (chattr +i), so that not even root may change it; false where
+// the file system or the user cannot.
+bool setImmutable(const QString& path, bool immutable);
+
+// A real, small file system (tmpfs) mounted at 'folder' for full-disk tests, where the test may
+// mount one (as root); isMounted() tells. Unmounted on destruction.
+class SmallDisk
+{
+public:
+    SmallDisk(const QString& folder, qint64 bytes);
+    ~SmallDisk();
+    SmallDisk(const SmallDisk&) = delete;
+    SmallDisk& operator=(const SmallDisk&) = delete;
+    bool isMounted() const { return m_mounted; }
+    // Fills the disk up to the last byte with a file of its own.
+    bool fill();
+
+private:
+    QString m_folder;
+    bool m_mounted = false;
+};
 
 } // namespace VDRTestFixtures
