@@ -132,35 +132,24 @@ void TestVDRSettingsXml::segmentElementNames_data()
 {
     QTest::addColumn<QString>("segment");
     QTest::addColumn<QString>("element");
-    QTest::newRow("blank") << "Witterung Wind"
-                           << "Witterung_Wind";
-    QTest::newRow("number 0") << "0"
-                              << "value_0";
-    QTest::newRow("number 12") << "12"
-                               << "value_12";
-    QTest::newRow("Spanish equipment") << "Equipo, máquina"
-                                       << "Equipo_máquina";
-    QTest::newRow("Spanish index") << "Nº índice"
-                                   << "No_índice";
-    QTest::newRow("umlauts") << "Witterung Bewölkung"
-                             << "Witterung_Bewölkung";
-    QTest::newRow("sharp s") << "Baumaßnahmen"
-                             << "Baumaßnahmen";
-    QTest::newRow("dash and dot") << "Raumbuch-Nr."
-                                  << "Raumbuch-Nr.";
+    const auto row = [](const char* tag, const char* segment, const char* element) {
+        QTest::newRow(tag) << QString::fromUtf8(segment) << QString::fromUtf8(element);
+    };
+    row("blank", "Witterung Wind", "Witterung_Wind");
+    row("number 0", "0", "value_0");
+    row("number 12", "12", "value_12");
+    row("Spanish equipment", "Equipo, máquina", "Equipo_máquina");
+    row("Spanish index", "Nº índice", "No_índice");
+    row("umlauts", "Witterung Bewölkung", "Witterung_Bewölkung");
+    row("sharp s", "Baumaßnahmen", "Baumaßnahmen");
+    row("dash and dot", "Raumbuch-Nr.", "Raumbuch-Nr.");
     // Beyond the fixed rules: names that would otherwise read back changed or not parse at all.
-    QTest::newRow("underscore") << "Witterung_Wind"
-                                << "Witterung_x005F_Wind";
-    QTest::newRow("leading digit") << "2D-Plan"
-                                   << "_x0032_D-Plan";
-    QTest::newRow("comma, slash-free") << "Lage, Ort"
-                                       << "Lage_x002C__Ort";
-    QTest::newRow("looks numeric") << "value 3"
-                                   << "value_x0020_3";
-    QTest::newRow("looks special") << "Equipo máquina"
-                                   << "Equipo_x0020_máquina";
-    QTest::newRow("looks escaped") << " x0041 "
-                                   << "_x0020_x0041_x0020_";
+    row("underscore", "Witterung_Wind", "Witterung_x005F_Wind");
+    row("leading digit", "2D-Plan", "_x0032_D-Plan");
+    row("comma, slash-free", "Lage, Ort", "Lage_x002C__Ort");
+    row("looks numeric", "value 3", "value_x0020_3");
+    row("looks special", "Equipo máquina", "Equipo_x0020_máquina");
+    row("looks escaped", " x0041 ", "_x0020_x0041_x0020_");
 }
 
 void TestVDRSettingsXml::segmentElementNames()
