@@ -270,6 +270,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
         return false;
     }
 
+    VDRDatabaseSchema::createEntryIndexes(database());
     initModels();
     m_fileVersion = VDRDatabaseSchema::currentVersion();
     bool ok = true;
@@ -641,6 +642,7 @@ bool VDRDocument::openDocument(const QString& path, bool& showError)
         return false;
     }
     m_structureExtended = extended;
+    VDRDatabaseSchema::createEntryIndexes(database());
     if (extended) {
         QString text =
             tr("Sie öffnen ein Dokument, das mit einer früheren Programmversion erstellt wurde.\nDie "
