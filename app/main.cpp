@@ -10,6 +10,7 @@
 #include "editing/VDRWidgetPrompt.h"
 
 #include <QDir>
+#include <QEvent>
 #include <QLocale>
 #include <QLockFile>
 #include <QProcess>
@@ -17,11 +18,36 @@
 #include <QSqlDatabase>
 #include <QTimer>
 
+#include <functional>
 #include <memory>
 
 namespace {
 
 const int kRestartExitCode = 1000;
+
+// Runs a function once the window has been painted for the first time.
+class AfterFirstPaint : public QObject
+{
+public:
+    AfterFirstPaint(QWidget* window, std::function<void()> run) : QObject(window), m_run(std::move(run))
+    {
+        window->installEventFilter(this);
+    }
+
+    bool eventFilter(QObject* watched, QEvent* event) override
+    {
+        if (event->type() == QEvent::Paint && m_run) {
+            watched->removeEventFilter(this);
+            // Queued, so that the paint itself reaches the screen first.
+            QTimer::singleShot(0, parent(), std::move(m_run));
+            m_run = nullptr;
+        }
+        return false;
+    }
+
+private:
+    std::function<void()> m_run;
+};
 
 } // namespace
 
@@ -53,9 +79,9 @@ int main(int argc, char* argv[])
 
     const QString dictionaries = QCoreApplication::applicationDirPath() + QStringLiteral("/../Dictionaries/");
     const QString suffix = VDRSpellChecker::dictionarySuffix(locale.language(), locale.country());
-    VDRSpellChecker spellChecker(dictionaries + QStringLiteral("vdr_") + suffix,
-                                 dictionaries + QStringLiteral("vdr_userDict_") + suffix +
-                                     QStringLiteral(".txt"));
+    // Loaded once the window is shown: the dictionary takes longer than building the window. It
+    // outlives the window, which points at it.
+    std::unique_ptr<VDRSpellChecker> spellChecker;
     settings.remove(QStringLiteral("spellCheckerDialogX"));
     settings.remove(QStringLiteral("spellCheckerDialogY"));
 
@@ -70,13 +96,18 @@ int main(int argc, char* argv[])
     {
         VDRMainWindow window;
         g_mainWindow = &window;
-        window.setSpellChecker(&spellChecker);
         prompt.setParentWidget(&window);
         std::unique_ptr<QLockFile> instanceClaim;
         const int instance = VDRStartup::claimInstance(QDir::tempPath(), instanceClaim);
         window.restoreWindowGeometry(settings.value(VDRMainWindow::geometrySettingsKey()).toByteArray(),
                                      settings.value(VDRMainWindow::windowStateSettingsKey()).toByteArray(),
                                      instance);
+        new AfterFirstPaint(&window, [&] {
+            spellChecker = std::make_unique<VDRSpellChecker>(dictionaries + QStringLiteral("vdr_") + suffix,
+                                                             dictionaries + QStringLiteral("vdr_userDict_") +
+                                                                 suffix + QStringLiteral(".txt"));
+            window.setSpellChecker(spellChecker.get());
+        });
         window.show();
 
         // Before the first document: a logout during a long opening must not kill us unprepared.

@@ -3,8 +3,11 @@
 //   open    vs  cp + sqlite3 "PRAGMA quick_check"
 //   save    vs  cp + sync (copy and flush)
 //   compact vs  sqlite3 "VACUUM"
-// Usage: bench_diary [--reports N] [--photos N] [--runs N] [--file PATH] [--keep]
-// BENCH_VERBOSE=1 prints every run, not only the medians.
+// Opening and saving are measured warm (the file in the page cache) and cold (the diary's pages
+// evicted before each run, the baseline's too).
+// Usage: bench_diary [--reports N] [--photos N] [--runs N] [--file PATH] [--keep] [--json]
+// BENCH_VERBOSE=1 prints every run, not only the medians. --json prints one JSON object on stdout
+// with each ratio (the program's median over its baseline's median) and the medians themselves.
 #include "document/VDRDocument.h"
 
 #include <QBuffer>
@@ -14,6 +17,8 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QImage>
+#include <QJsonDocument>
+#include <QJsonObject>
 #include <QPainter>
 #include <QProcess>
 #include <QRandomGenerator>
@@ -26,14 +31,19 @@
 #include <QThreadPool>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
+#include <fcntl.h>
 #include <unistd.h>
 
 namespace {
 
+bool g_json = false;
+
+// Stdout belongs to the JSON object when one is asked for.
 QTextStream& out()
 {
-    static QTextStream s(stdout);
+    static QTextStream s(g_json ? stderr : stdout);
     return s;
 }
 
@@ -215,6 +225,19 @@ void settle()
     ::sync();
 }
 
+// Drops a file's pages from the page cache, as after a restart: flushed first, since dirty pages
+// cannot be dropped.
+void evict(const QString& path)
+{
+    const int fd = ::open(QFile::encodeName(path).constData(), O_RDONLY);
+    if (fd < 0)
+        return;
+    ::fdatasync(fd);
+    if (::posix_fadvise(fd, 0, 0, POSIX_FADV_DONTNEED) != 0)
+        std::fprintf(stderr, "could not evict %s\n", qPrintable(path));
+    ::close(fd);
+}
+
 double run(const QString& program, const QStringList& args)
 {
     QElapsedTimer t;
@@ -265,12 +288,80 @@ double median(QList<double> values)
     return values.isEmpty() ? 0 : values[values.size() / 2];
 }
 
-void report(const char* what, double ours, double baseline, qint64 readOurs, qint64 readBaseline, qint64 size)
+QString spread(QList<double> values)
+{
+    std::sort(values.begin(), values.end());
+    return values.isEmpty()
+               ? QString()
+               : QString::asprintf("%.0f-%.0f-%.0f", values.first(), median(values), values.last());
+}
+
+void report(const char* what, const QList<double>& ours, const QList<double>& baseline, qint64 readOurs,
+            qint64 readBaseline, qint64 size)
 {
     out() << QString::asprintf(
-        "%-8s %9.0f ms   baseline %9.0f ms   ratio %5.2f   read %5.2f x file (baseline %4.2f)\n", what, ours,
-        baseline, ours / baseline, double(readOurs) / size, double(readBaseline) / size);
+        "%-10s %7.0f ms  baseline %7.0f ms  ratio %5.2f  read %5.2f x file (baseline %4.2f)  "
+        "min-median-max %s / %s ms\n",
+        what, median(ours), median(baseline), median(ours) / median(baseline), double(readOurs) / size,
+        double(readBaseline) / size, qPrintable(spread(ours)), qPrintable(spread(baseline)));
     out().flush();
+}
+
+double ratio(const QList<double>& ours, const QList<double>& baseline)
+{
+    return std::round(median(ours) / median(baseline) * 100) / 100;
+}
+
+struct Timings
+{
+    QList<double> openOurs, openBase, saveOurs, saveBase;
+    qint64 readOpen = 0, readSave = 0;
+};
+
+// One opening and one save of the diary, each after its baseline. Cold: the files a step reads
+// are evicted before it.
+bool openAndSave(const QString& file, const QString& copy, bool cold, int index, Timings& t)
+{
+    const auto prepare = [&](const QStringList& files) {
+        settle();
+        if (cold) {
+            for (const QString& f : files)
+                evict(f);
+        }
+    };
+    QFile::remove(copy);
+    prepare({file});
+    t.openBase << run(QStringLiteral("cp"), {file, copy}) +
+                      run(QStringLiteral("sqlite3"), {copy, QStringLiteral("PRAGMA quick_check;")});
+    QFile::remove(copy);
+    prepare({file});
+    t.saveBase << run(QStringLiteral("cp"), {file, copy}) + run(QStringLiteral("sync"), {copy});
+
+    VDRDocument doc;
+    bool showError = true;
+    prepare({file});
+    const qint64 before = bytesRead();
+    QElapsedTimer timer;
+    timer.start();
+    if (!doc.openDocument(file, showError)) {
+        std::fprintf(stderr, "open failed\n");
+        return false;
+    }
+    t.openOurs << timer.nsecsElapsed() / 1e6;
+    t.readOpen = bytesRead() - before;
+    doc.modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("Lauf %1").arg(index));
+    doc.modelVdr()->submitAll();
+    prepare({file, doc.getFilepathWorkingCopy()});
+    const qint64 beforeSave = bytesRead();
+    timer.restart();
+    if (doc.saveDocument() != 0) {
+        std::fprintf(stderr, "save failed\n");
+        return false;
+    }
+    t.saveOurs << timer.nsecsElapsed() / 1e6;
+    t.readSave = bytesRead() - beforeSave;
+    doc.closeDocument();
+    return true;
 }
 
 } // namespace
@@ -297,6 +388,8 @@ int main(int argc, char* argv[])
             file = args[++i];
         else if (args[i] == QLatin1String("--keep"))
             keep = true;
+        else if (args[i] == QLatin1String("--json"))
+            g_json = true;
     }
     QTemporaryDir dir(QDir::currentPath() + QStringLiteral("/bench-XXXXXX"));
     dir.setAutoRemove(!keep);
@@ -317,69 +410,73 @@ int main(int argc, char* argv[])
                                qPrintable(file), size / 1e6, reports, photos, t.elapsed() / 1000.0);
     const QString copy = dir.filePath(QStringLiteral("baseline.vd2"));
 
-    QList<double> openOurs, openBase, saveOurs, saveBase;
-    qint64 readOpen = 0, readSave = 0;
+    Timings warm, cold;
+    for (int r = 0; r < runs; ++r) {
+        if (!openAndSave(file, copy, false, r, warm) || !openAndSave(file, copy, true, r, cold))
+            return 1;
+    }
+    if (qEnvironmentVariableIsSet("BENCH_VERBOSE")) {
+        for (int i = 0; i < runs; ++i)
+            out() << QString::asprintf(
+                "  run %d: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f); "
+                "cold: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f)\n",
+                i + 1, warm.openOurs[i], warm.openBase[i], warm.saveOurs[i], warm.saveBase[i],
+                cold.openOurs[i], cold.openBase[i], cold.saveOurs[i], cold.saveBase[i]);
+    }
+    const qint64 copyBytes = copyRead(file, copy);
+    const qint64 quickCheckBytes = copyBytes + sqlRead(copy, QStringLiteral("PRAGMA quick_check"));
+    report("open", warm.openOurs, warm.openBase, warm.readOpen, quickCheckBytes, size);
+    report("save", warm.saveOurs, warm.saveBase, warm.readSave, copyBytes, size);
+    report("open cold", cold.openOurs, cold.openBase, cold.readOpen, quickCheckBytes, size);
+    report("save cold", cold.saveOurs, cold.saveBase, cold.readSave, copyBytes, size);
+
+    copyRead(file, copy);
+    const qint64 vacuumBytes = sqlRead(copy, QStringLiteral("VACUUM"));
+    QList<double> compactOurs, compactBase;
+    qint64 readCompact = 0;
     for (int r = 0; r < runs; ++r) {
         QFile::remove(copy);
+        QFile::copy(file, copy);
         settle();
-        openBase << run(QStringLiteral("cp"), {file, copy}) +
-                        run(QStringLiteral("sqlite3"), {copy, QStringLiteral("PRAGMA quick_check;")});
-        QFile::remove(copy);
-        settle();
-        saveBase << run(QStringLiteral("cp"), {file, copy}) + run(QStringLiteral("sync"), {copy});
-        settle();
-
+        compactBase << run(QStringLiteral("sqlite3"), {copy, QStringLiteral("VACUUM;")});
         VDRDocument doc;
         bool showError = true;
-        const qint64 before = bytesRead();
-        t.restart();
         if (!doc.openDocument(file, showError)) {
             std::fprintf(stderr, "open failed\n");
             return 1;
         }
-        openOurs << t.nsecsElapsed() / 1e6;
-        readOpen = bytesRead() - before;
-        doc.modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("Lauf %1").arg(r));
-        doc.modelVdr()->submitAll();
         settle();
-        const qint64 beforeSave = bytesRead();
+        const qint64 before = bytesRead();
         t.restart();
-        if (doc.saveDocument() != 0) {
-            std::fprintf(stderr, "save failed\n");
-            return 1;
-        }
-        saveOurs << t.nsecsElapsed() / 1e6;
-        readSave = bytesRead() - beforeSave;
+        doc.compactDB(false);
+        compactOurs << t.nsecsElapsed() / 1e6;
+        readCompact = bytesRead() - before;
         doc.closeDocument();
     }
-    if (qEnvironmentVariableIsSet("BENCH_VERBOSE")) {
-        for (int i = 0; i < saveOurs.size(); ++i)
-            out() << QString::asprintf(
-                "  run %d: open %.0f ms (baseline %.0f), save %.0f ms (baseline %.0f)\n", i + 1, openOurs[i],
-                openBase[i], saveOurs[i], saveBase[i]);
-    }
-    const qint64 copyBytes = copyRead(file, copy);
-    report("open", median(openOurs), median(openBase), readOpen,
-           copyBytes + sqlRead(copy, QStringLiteral("PRAGMA quick_check")), size);
-    report("save", median(saveOurs), median(saveBase), readSave, copyBytes, size);
+    report("compact", compactOurs, compactBase, readCompact, vacuumBytes, size);
 
-    copyRead(file, copy);
-    const qint64 vacuumBytes = sqlRead(copy, QStringLiteral("VACUUM"));
-    QFile::remove(copy);
-    QFile::copy(file, copy);
-    settle();
-    const double vacuum = run(QStringLiteral("sqlite3"), {copy, QStringLiteral("VACUUM;")});
-    VDRDocument doc;
-    bool showError = true;
-    doc.openDocument(file, showError);
-    settle();
-    const qint64 before = bytesRead();
-    t.restart();
-    doc.compactDB(false);
-    const double compact = t.nsecsElapsed() / 1e6;
-    const qint64 readCompact = bytesRead() - before;
-    doc.closeDocument();
-    report("compact", compact, vacuum, readCompact, vacuumBytes, size);
+    if (g_json) {
+        const QJsonObject json{
+            {"file_mb", std::round(size / 1e5) / 10},
+            {"runs", runs},
+            {"open_ratio", ratio(warm.openOurs, warm.openBase)},
+            {"save_ratio", ratio(warm.saveOurs, warm.saveBase)},
+            {"compact_ratio", ratio(compactOurs, compactBase)},
+            {"open_ratio_cold", ratio(cold.openOurs, cold.openBase)},
+            {"save_ratio_cold", ratio(cold.saveOurs, cold.saveBase)},
+            {"open_ms", median(warm.openOurs)},
+            {"open_baseline_ms", median(warm.openBase)},
+            {"save_ms", median(warm.saveOurs)},
+            {"save_baseline_ms", median(warm.saveBase)},
+            {"compact_ms", median(compactOurs)},
+            {"compact_baseline_ms", median(compactBase)},
+            {"open_cold_ms", median(cold.openOurs)},
+            {"open_cold_baseline_ms", median(cold.openBase)},
+            {"save_cold_ms", median(cold.saveOurs)},
+            {"save_cold_baseline_ms", median(cold.saveBase)},
+        };
+        std::printf("%s\n", QJsonDocument(json).toJson(QJsonDocument::Compact).constData());
+    }
     QThreadPool::globalInstance()->waitForDone();
     for (const QString& backup :
          QDir(QFileInfo(file).path()).entryList({QFileInfo(file).fileName() + "*.bak"}))

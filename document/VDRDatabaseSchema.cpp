@@ -397,6 +397,29 @@ int VDRDatabaseSchema::compareVersions(const QString& a, const QString& b)
     return 0;
 }
 
+bool VDRDatabaseSchema::createEntryIndexes(QSqlDatabase db)
+{
+    // One commit for all, inside the caller's transaction or on its own.
+    QSqlQuery savepoint(db);
+    savepoint.exec(QStringLiteral("SAVEPOINT entry_indexes"));
+    bool ok = true;
+    for (const char* table :
+         {"entry_attendee", "entry_workforce", "entry_time_recording", "entry_progress", "entry_photo",
+          "entry_task", "entry_constructionmeasure", "entry_constructionmaterial", "entry_scheduleddelivery",
+          "entry_telephone_notice", "entry_concern", "entry_equipment"}) {
+        if (!tableExists(db, QLatin1String(table)))
+            continue;
+        QSqlQuery q(db);
+        if (!q.exec(QStringLiteral("CREATE INDEX IF NOT EXISTS %1_entry_id ON %1(entry_id)")
+                        .arg(QLatin1String(table)))) {
+            qWarning().noquote() << "index on" << table << "not created:" << q.lastError().text();
+            ok = false;
+        }
+    }
+    savepoint.exec(QStringLiteral("RELEASE entry_indexes"));
+    return ok;
+}
+
 bool VDRDatabaseSchema::tableExists(QSqlDatabase db, const QString& table)
 {
     QSqlQuery q(db);

@@ -30,6 +30,11 @@ public:
     // An SQL failure is shown as "SQL Error" and returns false.
     static bool upgrade(QSqlDatabase db, bool& extended);
 
+    // Indexes on entry_id of the report sub-tables, so that one report's models read only its rows.
+    // They change no table and no query result, and every SQLite reader and writer keeps them up to
+    // date. Missing tables are left out; a failure only costs speed.
+    static bool createEntryIndexes(QSqlDatabase db);
+
     static bool tableExists(QSqlDatabase db, const QString& table);
     static QStringList columns(QSqlDatabase db, const QString& table);
 };

@@ -332,6 +332,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
         return false;
     }
 
+    VDRDatabaseSchema::createEntryIndexes(database());
     initModels();
     m_fileVersion = VDRDatabaseSchema::currentVersion();
     bool ok = true;
@@ -775,6 +776,7 @@ bool VDRDocument::openDocumentImpl(const QString& path, bool& showError)
         return false;
     }
     m_structureExtended = extended;
+    VDRDatabaseSchema::createEntryIndexes(database());
     if (extended) {
         QString text =
             tr("Sie öffnen ein Dokument, das mit einer früheren Programmversion erstellt wurde.\nDie "

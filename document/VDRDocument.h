@@ -7,6 +7,7 @@
 #include <QMap>
 #include <QObject>
 #include <QPixmap>
+#include <QPointer>
 #include <QSqlDatabase>
 #include <QStringList>
 
@@ -95,9 +96,30 @@ public:
     VDRAllEntryTableModel* modelEntryAll() const { return m_modelEntryAll; }
     VDRSqlTableModel* modelExternalEntryNumber() const { return m_modelExternalEntryNumber; }
 
-    // Models of one report, built on first access.
+    // Models of one report, built on first access. Only the models of the few reports used last
+    // are kept: building another report's models drops the oldest ones, unless they hold
+    // unsubmitted edits or are pinned (EntryModelsPin) by an operation or the report on show.
+    static constexpr int keptEntryModelSets() { return 6; }
     void initEntryModels(int entryId);
     bool hasEntryModels(int entryId) const { return m_entryModels.contains(entryId); }
+    int entryModelSetCount() const { return m_entryModels.size(); }
+
+    // Keeps the models of one report alive while it exists.
+    class EntryModelsPin
+    {
+    public:
+        EntryModelsPin(VDRDocument* document, int entryId);
+        ~EntryModelsPin();
+        EntryModelsPin(const EntryModelsPin&) = delete;
+        EntryModelsPin& operator=(const EntryModelsPin&) = delete;
+
+    private:
+        QPointer<VDRDocument> m_document;
+        int m_entryId;
+    };
+    void pinEntryModels(int entryId);
+    void unpinEntryModels(int entryId);
+
     VDRSqlTableModel* modelEntry(int entryId, VDRSqlTableModel::TABLE_NAMES table);
     QList<VDRSqlTableModel*> entryModels(int entryId);
     VDRSqlTableModel* modelEntryAttendee(int entryId)
@@ -327,7 +349,11 @@ public:
     static void setSyncListQuery(std::function<bool(const QString&)> query);
     static bool isOnSyncList(const QString& path);
 
+    // The id of a new row of 'model' from the diary's counter table.
+    void sqlTableIdGenerator(VDRSqlTableModel* model, int row, QSqlRecord& record);
+
 public slots:
+    // For models connected from outside; the document's own models call the overload above.
     void sqlTableIdGenerator(int row, QSqlRecord& record);
 
 signals:
@@ -352,7 +378,8 @@ private:
     void abandonOpening(bool removeWorkingCopy);
     bool openDocumentImpl(const QString& path, bool& showError);
     VDRSqlTableModel* createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter);
-    void connectIdGenerator(VDRSqlTableModel* model);
+    void releaseEntryModels();
+    bool entryModelsDirty(int entryId) const;
     bool importExternalDocuments();
     void repairOldVersion();
     void freezeCompaniesOfLockedEntries();
@@ -396,6 +423,8 @@ private:
     VDRAllEntryTableModel* m_modelEntryAll = nullptr;
     VDRSqlTableModel* m_modelExternalEntryNumber = nullptr;
     QMap<int, QMap<int, VDRSqlTableModel*>> m_entryModels;
+    QList<int> m_entryModelsUsed; // report ids, the one used last at the end
+    QHash<int, int> m_entryModelPins;
     QMap<int, VDRSqlTableModel*> m_addresslistModels;
     bool m_masterDataModified = false;
     // Temporary files of images, written once per opening.

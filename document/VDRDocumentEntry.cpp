@@ -107,11 +107,31 @@ QString VDRDocument::externalEntryNumberString(int row) const
 
 int VDRDocument::maxEntryNumber() const
 {
-    m_modelEntryAll->fetch_all();
-    int result = 0;
-    for (int row = 0; row < m_modelEntryAll->rowCount(); ++row)
-        result = std::max(result, entryNumberInt(row));
-    return result;
+    // Unsubmitted edits count, as the report form shows them; only the model knows them.
+    if (m_modelEntryAll->isDirty()) {
+        m_modelEntryAll->fetch_all();
+        int result = 0;
+        for (int row = 0; row < m_modelEntryAll->rowCount(); ++row)
+            result = std::max(result, entryNumberInt(row));
+        return result;
+    }
+    // SQLite reads ASCII digits only, and would also accept a sign or blanks in front: numbers that
+    // begin with an ASCII digit are its part, those that begin with other characters (rare) ours.
+    qint64 result = 0;
+    QSqlQuery q(database());
+    if (q.exec(QStringLiteral("SELECT max(CAST(number AS INTEGER)) FROM entry WHERE number GLOB '[0-9]*'")) &&
+        q.next())
+        result = std::max<qint64>(0, q.value(0).toLongLong());
+    if (q.exec(QStringLiteral("SELECT number FROM entry WHERE unicode(number) > 127"))) {
+        while (q.next()) {
+            const QString number = q.value(0).toString();
+            qint64 value = 0;
+            for (int i = 0; i < number.size() && number.at(i).isDigit() && value <= INT_MAX; ++i)
+                value = value * 10 + number.at(i).digitValue();
+            result = std::max(result, value);
+        }
+    }
+    return static_cast<int>(std::min<qint64>(result, INT_MAX));
 }
 
 int VDRDocument::maxEntryNumber(int& number, QChar& letter) const
@@ -134,7 +154,10 @@ int VDRDocument::maxEntryNumber(int& number, QChar& letter) const
 
 int VDRDocument::maxEntryID() const
 {
-    return m_modelEntryAll->last_id();
+    if (m_modelEntryAll->isDirty())
+        return m_modelEntryAll->last_id();
+    QSqlQuery q(database());
+    return q.exec(QStringLiteral("SELECT max(id) FROM entry")) && q.next() ? q.value(0).toInt() : 0;
 }
 
 void VDRDocument::entrySetNumberText(int row)
@@ -214,6 +237,9 @@ int VDRDocument::appendEntry()
         }
     }
 
+    // The counter, the new id and whatever the caller adds before it ends its own transaction go
+    // to disk in one commit.
+    beginTransaction();
     if (m_modelVdr->rowCount() > 0) {
         const int counter = m_modelVdr->dataById(1, QStringLiteral("entrycounter"), Qt::EditRole).toInt();
         m_modelVdr->setDataById(1, QStringLiteral("entrycounter"), counter + 1);
@@ -252,6 +278,7 @@ int VDRDocument::appendEntry()
         {"exported_by_app", 0},
         {"import_version", QVariant(QVariant::DateTime)},
     });
+    endTransaction();
     return ok ? 1 : 0;
 }
 
@@ -487,8 +514,12 @@ bool VDRDocument::copyEntryAll(int row)
     copyFields(source, m_modelEntryAll, newRow,
                {"id", "number", "progress_audio_id", "user_id", "creation_date", "exported_by_app",
                 "import_version", "locked"});
+    // The new row holds the highest id (ids only grow); no need to look through every report.
+    const int newId = m_modelEntryAll->data(newRow, QStringLiteral("id"), Qt::EditRole).toInt();
     bool ok = m_modelEntryAll->submitAll();
-    const int newId = m_modelEntryAll->last_id();
+    // Both reports' models are used throughout.
+    const EntryModelsPin sourcePin(this, sourceId);
+    const EntryModelsPin copyPin(this, newId);
 
     using Append = bool (VDRDocument::*)(int);
     static const std::pair<VDRSqlTableModel::TABLE_NAMES, Append> tables[] = {
@@ -566,6 +597,7 @@ bool VDRDocument::removeEntryAll(int row)
     beginTransaction();
     bool ok = true;
     QSet<int> imageIds;
+    const EntryModelsPin pin(this, entryId);
     for (VDRSqlTableModel* model : entryModels(entryId)) {
         model->fetch_all();
         const int rows = model->rowCount();

@@ -47,18 +47,10 @@ VDRSqlTableModel* VDRDocument::createModel(VDRSqlTableModel::TABLE_NAMES table, 
         model->setSort(posColumn, Qt::AscendingOrder);
     if (!model->select())
         qDebug().noquote() << "select failed:" << sqlTable << model->lastError().text();
-    connectIdGenerator(model);
+    model->setGeneratesIds(sqlTable != QLatin1String("meta") && sqlTable != QLatin1String("image") &&
+                           sqlTable != QLatin1String("audio") && sqlTable != QLatin1String("id_generator") &&
+                           sqlTable != QLatin1String("external_entry_number"));
     return model;
-}
-
-void VDRDocument::connectIdGenerator(VDRSqlTableModel* model)
-{
-    const QString table = VDRSqlTableModel::sqlTableName(model->tableNameId());
-    if (table == QLatin1String("meta") || table == QLatin1String("image") ||
-        table == QLatin1String("audio") || table == QLatin1String("id_generator") ||
-        table == QLatin1String("external_entry_number"))
-        return;
-    connect(model, &QSqlTableModel::primeInsert, this, &VDRDocument::sqlTableIdGenerator);
 }
 
 void VDRDocument::initModels()
@@ -85,6 +77,7 @@ void VDRDocument::destroyModels()
     for (auto& models : m_entryModels)
         qDeleteAll(models);
     m_entryModels.clear();
+    m_entryModelsUsed.clear();
     qDeleteAll(m_addresslistModels);
     m_addresslistModels.clear();
     for (VDRSqlTableModel** model :
@@ -97,8 +90,13 @@ void VDRDocument::destroyModels()
 
 void VDRDocument::initEntryModels(int entryId)
 {
-    if (m_entryModels.contains(entryId))
+    if (m_entryModels.contains(entryId)) {
+        if (m_entryModelsUsed.isEmpty() || m_entryModelsUsed.constLast() != entryId) {
+            m_entryModelsUsed.removeOne(entryId);
+            m_entryModelsUsed.append(entryId);
+        }
         return;
+    }
     static const VDRSqlTableModel::TABLE_NAMES tables[] = {
         VDRSqlTableModel::TN_ATTENDEE,
         VDRSqlTableModel::TN_WORKFORCE,
@@ -129,6 +127,60 @@ void VDRDocument::initEntryModels(int entryId)
             filter += QStringLiteral(" AND type = '") + QString::number(type) + QLatin1Char('\'');
         models.insert(table, createModel(table, filter));
     }
+    m_entryModelsUsed.append(entryId);
+    releaseEntryModels();
+}
+
+bool VDRDocument::entryModelsDirty(int entryId) const
+{
+    for (const VDRSqlTableModel* model : m_entryModels.value(entryId)) {
+        if (model->isDirty())
+            return true;
+    }
+    return false;
+}
+
+void VDRDocument::releaseEntryModels()
+{
+    // Oldest first; the report used last always stays.
+    for (int i = 0; m_entryModels.size() > keptEntryModelSets() && i < m_entryModelsUsed.size() - 1;) {
+        const int entryId = m_entryModelsUsed.at(i);
+        if (m_entryModelPins.value(entryId) > 0 || entryModelsDirty(entryId)) {
+            ++i;
+            continue;
+        }
+        m_entryModelsUsed.removeAt(i);
+        qDeleteAll(m_entryModels.take(entryId));
+    }
+}
+
+void VDRDocument::pinEntryModels(int entryId)
+{
+    ++m_entryModelPins[entryId];
+}
+
+void VDRDocument::unpinEntryModels(int entryId)
+{
+    auto it = m_entryModelPins.find(entryId);
+    if (it == m_entryModelPins.end())
+        return;
+    if (--it.value() <= 0) {
+        m_entryModelPins.erase(it);
+        releaseEntryModels();
+    }
+}
+
+VDRDocument::EntryModelsPin::EntryModelsPin(VDRDocument* document, int entryId)
+    : m_document(document), m_entryId(entryId)
+{
+    if (m_document)
+        m_document->pinEntryModels(entryId);
+}
+
+VDRDocument::EntryModelsPin::~EntryModelsPin()
+{
+    if (m_document)
+        m_document->unpinEntryModels(m_entryId);
 }
 
 VDRSqlTableModel* VDRDocument::modelEntry(int entryId, VDRSqlTableModel::TABLE_NAMES table)
@@ -162,8 +214,13 @@ VDRSqlTableModel* VDRDocument::modelAddresslistItem(int listId)
 
 void VDRDocument::sqlTableIdGenerator(int row, QSqlRecord& record)
 {
+    if (auto* model = qobject_cast<VDRSqlTableModel*>(sender()))
+        sqlTableIdGenerator(model, row, record);
+}
+
+void VDRDocument::sqlTableIdGenerator(VDRSqlTableModel* model, int row, QSqlRecord& record)
+{
     Q_UNUSED(row)
-    auto* model = qobject_cast<VDRSqlTableModel*>(sender());
     if (!model)
         return;
     const QVariant current = record.value(QStringLiteral("id"));

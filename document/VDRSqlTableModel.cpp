@@ -56,6 +56,15 @@ VDRSqlTableModel::VDRSqlTableModel(TABLE_NAMES tableName, VDRDocument* document,
 {
     setObjectName(displayName(tableName));
     setEditStrategy(QSqlTableModel::OnManualSubmit);
+    // Connected to itself, not to the document: the document would have to find the model among
+    // the senders of every model of the diary.
+    connect(this, &QSqlTableModel::primeInsert, this, &VDRSqlTableModel::primeNewRecord);
+}
+
+void VDRSqlTableModel::primeNewRecord(int row, QSqlRecord& record)
+{
+    if (m_generatesIds && m_document)
+        m_document->sqlTableIdGenerator(this, row, record);
 }
 
 QString VDRSqlTableModel::displayName(TABLE_NAMES tableName)
@@ -95,7 +104,7 @@ bool VDRSqlTableModel::appendRow(const QHash<QString, QVariant>& values)
 bool VDRSqlTableModel::insertRow(int row, const QHash<QString, QVariant>& values)
 {
     fetch_all();
-    if (!QSqlTableModel::insertRows(row, 1))
+    if (!insertRows(row, 1))
         return false;
     for (auto it = values.constBegin(); it != values.constEnd(); ++it) {
         if (!setData(row, it.key(), it.value()))
@@ -201,10 +210,68 @@ int VDRSqlTableModel::record_position(const QString& field, const QVariant& valu
 
 bool VDRSqlTableModel::submitAll()
 {
-    if (QSqlTableModel::submitAll())
+    m_refreshRowsOnly = canRefreshRowsOnly();
+    const bool ok = QSqlTableModel::submitAll();
+    m_refreshRowsOnly = false;
+    if (ok)
         return true;
     qDebug("SQL-Error: %s\n", qPrintable(lastError().text()));
     return false;
+}
+
+bool VDRSqlTableModel::canRefreshRowsOnly() const
+{
+    // Without application-assigned ids a new row's key is known only to SQLite; with a filter or a
+    // sort order a changed row may have to leave or move; rows not yet fetched would land behind
+    // the appended ones. Submitted rows stay in the model's cache of changes until the next full
+    // select, so one now and then keeps that cache small.
+    const int submitsBetweenSelects = 64;
+    return m_generatesIds && !m_needsSelect && filter().isEmpty() && orderByClause().isEmpty() &&
+           !canFetchMore() && m_submitsSinceSelect < submitsBetweenSelects;
+}
+
+bool VDRSqlTableModel::select()
+{
+    // QSqlTableModel::submitAll() ends with a select in manual-submit mode.
+    if (m_refreshRowsOnly) {
+        ++m_submitsSinceSelect;
+        bool ok = true;
+        for (const int row : qAsConst(m_appendedRows))
+            ok &= selectRow(row);
+        m_appendedRows.clear();
+        return ok;
+    }
+    m_appendedRows.clear();
+    m_needsSelect = false;
+    m_submitsSinceSelect = 0;
+    return QSqlTableModel::select();
+}
+
+void VDRSqlTableModel::revertRow(int row)
+{
+    // Reverting an appended row removes it and moves the rows behind it (revertAll comes here too).
+    if (!m_appendedRows.isEmpty())
+        m_needsSelect = true;
+    QSqlTableModel::revertRow(row);
+}
+
+bool VDRSqlTableModel::insertRows(int row, int count, const QModelIndex& parent)
+{
+    const bool appended = row == rowCount();
+    if (!QSqlTableModel::insertRows(row, count, parent))
+        return false;
+    if (!appended)
+        m_needsSelect = true;
+    for (int r = row; r < row + count; ++r)
+        m_appendedRows.append(r);
+    return true;
+}
+
+bool VDRSqlTableModel::removeRows(int row, int count, const QModelIndex& parent)
+{
+    // A removed row stays as a blank row until the next full select.
+    m_needsSelect = true;
+    return QSqlTableModel::removeRows(row, count, parent);
 }
 
 bool VDRSqlTableModel::setHeaderData(const QString& field, Qt::Orientation orientation, const QVariant& value,

@@ -67,6 +67,9 @@ public:
     static int typeCondition(TABLE_NAMES tableName);
     TABLE_NAMES tableNameId() const { return m_tableName; }
     VDRDocument* getDocument() const { return m_document; }
+    // New rows take their id from the diary's counter table (VDRDocument::sqlTableIdGenerator).
+    void setGeneratesIds(bool generates) { m_generatesIds = generates; }
+    bool generatesIds() const { return m_generatesIds; }
 
     void fetch_all();
 
@@ -92,7 +95,14 @@ public:
     // Row of the first record whose field holds the value, -1 when none.
     int record_position(const QString& field, const QVariant& value);
 
+    // After submitting, the whole table is read again only when that can change what the model
+    // shows: rows removed or inserted in the middle, or a filter or sort order that a changed row
+    // may no longer fit. Otherwise only the appended rows are read back (for SQLite's defaults).
     bool submitAll();
+    bool select() override;
+    void revertRow(int row) override;
+    bool insertRows(int row, int count, const QModelIndex& parent = QModelIndex()) override;
+    bool removeRows(int row, int count, const QModelIndex& parent = QModelIndex()) override;
 
     bool setHeaderData(const QString& field, Qt::Orientation orientation, const QVariant& value,
                        int role = Qt::EditRole);
@@ -127,9 +137,17 @@ protected:
 
 private:
     QStringList distinctTexts(const QString& field);
+    void primeNewRecord(int row, QSqlRecord& record);
+    bool canRefreshRowsOnly() const;
 
     TABLE_NAMES m_tableName;
     VDRDocument* m_document;
+    bool m_generatesIds = false;
+    // Bookkeeping of what a submit must read back.
+    bool m_refreshRowsOnly = false;
+    bool m_needsSelect = false;
+    QList<int> m_appendedRows;
+    int m_submitsSinceSelect = 0;
     QHash<int, QVariant::Type> m_types;
     QHash<int, DISPLAYROLE_TYPE> m_displayTypes;
 };

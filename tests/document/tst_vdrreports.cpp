@@ -3,6 +3,7 @@
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 
+#include <QPointer>
 #include <QSqlError>
 #include <QSqlQuery>
 #include <QSqlRecord>
@@ -31,6 +32,7 @@ private slots:
     void copyEntryAll();
     void lockFreezesNamedCompanies();
     void removeEntryAll();
+    void modelsOfFewReportsKept();
     void oldVersionFreezesOnOpening_data();
     void oldVersionFreezesOnOpening();
     void photoAssignmentRepair_data();
@@ -455,6 +457,38 @@ void TestVDRReports::removeEntryAll()
              QStringList({"2", "2"}));
     QCOMPARE(rows("SELECT id FROM image ORDER BY id"), QStringList({"2", "3"}));
     QCOMPARE(rows("SELECT id FROM audio"), QStringList{"2"});
+}
+
+void TestVDRReports::modelsOfFewReportsKept()
+{
+    setReports(300, {});
+    exec({"INSERT INTO entry_attendee SELECT id, id, 0, NULL, 'Person ' || id FROM entry",
+          "INSERT INTO id_generator VALUES ('entry_attendee', 300)"});
+    const int wholeDiary = m_doc->findChildren<VDRSqlTableModel*>().size();
+    // The report on show is pinned and another one holds an unsubmitted row: both must stay.
+    const VDRDocument::EntryModelsPin shown(m_doc.get(), 1);
+    const QPointer<VDRSqlTableModel> shownModel = m_doc->modelEntryAttendee(1);
+    QVERIFY(m_doc->appendEntryConcern(2));
+    const QPointer<VDRSqlTableModel> edited = m_doc->modelEntryConcern(2);
+    const QPointer<VDRSqlTableModel> early = m_doc->modelEntryAttendee(3);
+    const int perReport = m_doc->entryModels(3).size();
+
+    int most = 0;
+    for (int id = 1; id <= 300; ++id) {
+        QCOMPARE(m_doc->modelEntryAttendee(id)->data(0, QStringLiteral("comment"), Qt::EditRole).toString(),
+                 QStringLiteral("Person %1").arg(id));
+        most = std::max(most, m_doc->findChildren<VDRSqlTableModel*>().size() - wholeDiary);
+    }
+    QVERIFY2(most <= (VDRDocument::keptEntryModelSets() + 2) * perReport, qPrintable(QString::number(most)));
+    QVERIFY(shownModel && edited && !early);
+    QVERIFY(edited->submitAll());
+    QCOMPARE(rows("SELECT entry_id, id FROM entry_concern"), QStringList{"2|1"});
+
+    // Copying reports far apart, as the report list does, keeps the bound too.
+    QVERIFY(m_doc->copyEntryAll(0) && m_doc->copyEntryAll(150));
+    QCOMPARE(rows("SELECT entry_id, comment FROM entry_attendee WHERE entry_id > 300"),
+             QStringList({"301|Person 1", "302|Person 151"}));
+    QVERIFY(m_doc->entryModelSetCount() <= VDRDocument::keptEntryModelSets() + 2);
 }
 
 void TestVDRReports::oldVersionFreezesOnOpening_data()

@@ -70,6 +70,8 @@ private slots:
     void nestedTransactions_data();
     void nestedTransactions();
     void reportDatesChanged();
+    void submitShowsWhatIsStored_data();
+    void submitShowsWhatIsStored();
     void datesAndTimesStoredAsIso_data();
     void datesAndTimesStoredAsIso();
 
@@ -414,6 +416,66 @@ void TestVDRSqlTableModel::reportDatesChanged()
     QVERIFY(entries->setData(0, QStringLiteral("progress"), QStringLiteral("Rohbau")));
     QTest::qWait(10);
     QCOMPARE(spy.count(), 0);
+}
+
+void TestVDRSqlTableModel::submitShowsWhatIsStored_data()
+{
+    QTest::addColumn<QString>("action");
+    QTest::newRow("new row with SQLite's defaults") << "default";
+    QTest::newRow("many new reports") << "append";
+    QTest::newRow("report removed") << "remove";
+    QTest::newRow("row moved by pos") << "move";
+}
+
+void TestVDRSqlTableModel::submitShowsWhatIsStored()
+{
+    QFETCH(QString, action);
+    VDRSqlTableModel* m = nullptr;
+    QString field, sql;
+    if (action == QLatin1String("default")) {
+        m = m_doc->modelVdr();
+        QHash<QString, QVariant> values = newRow(m, 0);
+        values.remove(QStringLiteral("address1")); // DEFAULT -1
+        QVERIFY(m->appendRow(values));
+        field = "address1";
+        sql = "SELECT id, address1 FROM vdr ORDER BY id";
+    } else if (action == QLatin1String("move")) {
+        m = m_doc->modelEntryDelay(1);
+        for (int i = 0; i < 3; ++i)
+            QVERIFY(m_doc->appendEntryDelay(1));
+        QVERIFY(m->submitAll());
+        QVERIFY(m->setData(0, QStringLiteral("pos"), 9));
+        field = "pos";
+        sql = "SELECT id, pos FROM entry_progress WHERE entry_id = 1 AND type = 1 ORDER BY pos";
+    } else {
+        m = m_doc->modelEntryAll();
+        m_doc->beginTransaction();
+        for (int i = 0; i < 70; ++i) {
+            QCOMPARE(m_doc->appendEntry(), 1);
+            QVERIFY(m->submitAll());
+        }
+        m_doc->endTransaction();
+        if (action == QLatin1String("remove"))
+            QVERIFY(m->removeRows(3, 1));
+        field = "number";
+        sql = "SELECT id, number FROM entry ORDER BY id";
+    }
+    QVERIFY(m->submitAll());
+
+    QStringList shown, stored;
+    m->fetch_all();
+    for (int r = 0; r < m->rowCount(); ++r)
+        shown << m->data(r, QStringLiteral("id"), Qt::EditRole).toString() + QLatin1Char('|') +
+                     m->data(r, field, Qt::EditRole).toString();
+    QSqlQuery q(m_doc->database());
+    QVERIFY(q.exec(sql));
+    while (q.next())
+        stored << q.value(0).toString() + QLatin1Char('|') + q.value(1).toString();
+    QCOMPARE(shown, stored);
+    if (action == QLatin1String("default"))
+        QCOMPARE(shown.last(), QStringLiteral("2|-1"));
+    else if (action != QLatin1String("move"))
+        QCOMPARE(m_doc->maxEntryID(), shown.last().section(QLatin1Char('|'), 0, 0).toInt());
 }
 
 void TestVDRSqlTableModel::datesAndTimesStoredAsIso_data()
