@@ -471,18 +471,6 @@ void TestVDRDocument::temporaryFilesAreRemovedOnClose()
     QVERIFY(!QFileInfo::exists(folder));
 }
 
-namespace {
-// Every file in the folder with its hash: shows that nothing beside a diary changed.
-QStringList folderState(const QString& folder)
-{
-    QStringList state;
-    const QDir dir(folder);
-    for (const QString& name : dir.entryList(QDir::Files | QDir::Hidden, QDir::Name))
-        state << name + QLatin1Char('=') + QString::fromLatin1(fileHash(dir.filePath(name)).toHex());
-    return state;
-}
-} // namespace
-
 void TestVDRDocument::resumedCopyIsNeverLost_data()
 {
     QTest::addColumn<QString>("kind");

@@ -152,6 +152,15 @@ bool damageFile(const QString& path)
     return f.flush();
 }
 
+QStringList folderState(const QString& folder)
+{
+    QStringList state;
+    const QDir dir(folder);
+    for (const QString& name : dir.entryList(QDir::Files | QDir::Hidden, QDir::Name))
+        state << name + QLatin1Char('=') + QString::fromLatin1(fileHash(dir.filePath(name)).toHex());
+    return state;
+}
+
 bool damageSchemaPage(const QString& path)
 {
     QFile f(path);

@@ -32,6 +32,9 @@ QStringList tableNames(const QString& path);
 // SHA-256 of a file's bytes (empty when it cannot be read): shows that a file was left untouched.
 QByteArray fileHash(const QString& path);
 
+// Every file in a folder with its hash: shows that nothing beside a diary changed.
+QStringList folderState(const QString& folder);
+
 // Overwrites bytes in the middle of the file so that SQLite sees a damaged b-tree.
 bool damageFile(const QString& path);
 // Overwrites the schema page's b-tree header: SQLite cannot even run its integrity check.
