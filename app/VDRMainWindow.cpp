@@ -20,10 +20,12 @@
 #include <QFileInfo>
 #include <QGuiApplication>
 #include <QHeaderView>
+#include <QIconEngine>
 #include <QLabel>
 #include <QMenu>
 #include <QMenuBar>
 #include <QMessageBox>
+#include <QPainter>
 #include <QScreen>
 #include <QSettings>
 #include <QShortcut>
@@ -66,6 +68,43 @@ const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 const QSize kDefaultSize(1200, 800);
 const int kInstanceOffset = 32;
 
+// Decodes its file on first use: QIcon(file) reads every image of an .ico at once, which start-up
+// need not pay for a menu that is not open.
+class LazyIconEngine : public QIconEngine
+{
+public:
+    explicit LazyIconEngine(QString file) : m_file(std::move(file)) {}
+    void paint(QPainter* painter, const QRect& rect, QIcon::Mode mode, QIcon::State state) override
+    {
+        icon().paint(painter, rect, Qt::AlignCenter, mode, state);
+    }
+    QPixmap pixmap(const QSize& size, QIcon::Mode mode, QIcon::State state) override
+    {
+        return icon().pixmap(size, mode, state);
+    }
+    QSize actualSize(const QSize& size, QIcon::Mode mode, QIcon::State state) override
+    {
+        return icon().actualSize(size, mode, state);
+    }
+    QList<QSize> availableSizes(QIcon::Mode mode, QIcon::State state) const override
+    {
+        return icon().availableSizes(mode, state);
+    }
+    QIconEngine* clone() const override { return new LazyIconEngine(m_file); }
+    QString key() const override { return QStringLiteral("LazyIconEngine"); }
+
+private:
+    const QIcon& icon() const
+    {
+        if (m_icon.isNull())
+            m_icon = QIcon(m_file);
+        return m_icon;
+    }
+
+    QString m_file;
+    mutable QIcon m_icon;
+};
+
 QString sqliteVersion()
 {
     VDRScopedConnection about(QStringLiteral("ABOUT"), QStringLiteral(":memory:"), QString(), false);
@@ -79,7 +118,9 @@ QString sqliteVersion()
 VDRMainWindow::VDRMainWindow(QWidget* parent)
     : QMainWindow(parent), m_document(new VDRDocument(this)), m_central(new QStackedWidget(this)),
       m_welcome(new QLabel(this)), m_reportPage(new QLabel(this)), m_entryList(new QTableView(this)),
-      m_calendar(new QCalendarWidget(this)), m_clock(new QLabel(this)), m_clockTimer(new QTimer(this))
+      m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
+      m_recentIcon(
+          new LazyIconEngine(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico")))
 {
     setObjectName(QStringLiteral("VDRMainWindow"));
     setWindowTitle(tr("Varduna"));
@@ -104,8 +145,14 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     m_entryList->verticalHeader()->hide();
     m_dockEntryList = addDock(tr("Bautagesberichte"), QStringLiteral("dockWidgetEntryList"), m_entryList,
                               Qt::LeftDockWidgetArea);
-    m_dockEntryDate = addDock(tr("Bauberichts-Kalender"), QStringLiteral("dockWidgetEntryDate"), m_calendar,
-                              Qt::LeftDockWidgetArea);
+    // The calendar costs more than the rest of the dock area: it is built right after the window's
+    // first paint, or when its dock first opens later.
+    m_dockEntryDate = addDock(tr("Bauberichts-Kalender"), QStringLiteral("dockWidgetEntryDate"),
+                              new QWidget(this), Qt::LeftDockWidgetArea);
+    connect(m_dockEntryDate, &QDockWidget::visibilityChanged, this, [this](bool visible) {
+        if (visible && m_painted)
+            buildCalendar();
+    });
     const char* const photoDocks[][2] = {{QT_TR_NOOP("Bilder Leistungsstand"), "dockWidgetPhotos1"},
                                          {QT_TR_NOOP("Bilder Mängel"), "dockWidgetPhotos2"},
                                          {QT_TR_NOOP("Bilder Behinderungen"), "dockWidgetPhotos3"},
@@ -508,11 +555,10 @@ void VDRMainWindow::updateGuiRecentFileList()
 {
     QMenu* menu = m_ui.menuFileRecent;
     menu->clear();
-    const QIcon icon(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico"));
     for (const QString& path : qAsConst(m_recentFiles)) {
         // An '&' in a file name is text, not a mnemonic.
-        QAction* entry =
-            menu->addAction(icon, QFileInfo(path).fileName().replace(QLatin1Char('&'), QLatin1String("&&")));
+        QAction* entry = menu->addAction(
+            m_recentIcon, QFileInfo(path).fileName().replace(QLatin1Char('&'), QLatin1String("&&")));
         entry->setData(path);
         entry->setToolTip(QDir::toNativeSeparators(path));
         connect(entry, &QAction::triggered, this, [this, path] {
@@ -601,24 +647,54 @@ void VDRMainWindow::updateReportPage()
 void VDRMainWindow::slotDocumentClosed(VDRDocument*)
 {
     m_entryList->setModel(nullptr);
-    m_calendar->setDateTextFormat(QDate(), QTextCharFormat());
+    slotReportDatesChanged({});
     updateGui();
 }
 
 void VDRMainWindow::slotReportDatesChanged(const QList<QDate>& dates)
 {
+    m_reportDates = dates;
+    if (m_calendar)
+        markReportDates();
+}
+
+void VDRMainWindow::markReportDates()
+{
     m_calendar->setDateTextFormat(QDate(), QTextCharFormat());
     QTextCharFormat marked;
     marked.setFontWeight(QFont::Bold);
     marked.setBackground(QColor(255, 230, 150));
-    for (const QDate& date : dates)
+    for (const QDate& date : qAsConst(m_reportDates))
         m_calendar->setDateTextFormat(date, marked);
+}
+
+void VDRMainWindow::buildCalendar()
+{
+    if (m_calendar)
+        return;
+    m_calendar = new QCalendarWidget(this);
+    m_calendar->setObjectName(QStringLiteral("calendar"));
+    QWidget* placeholder = m_dockEntryDate->widget();
+    m_dockEntryDate->setWidget(m_calendar);
+    delete placeholder;
+    markReportDates();
 }
 
 void VDRMainWindow::checkFileSize()
 {
     VDRFileSizeDialog dialog(m_document);
     dialog.exec();
+}
+
+bool VDRMainWindow::event(QEvent* event)
+{
+    if (event->type() == QEvent::Paint && !m_painted) {
+        m_painted = true;
+        // Queued, so that the first paint reaches the screen first.
+        if (!m_dockEntryDate->isHidden())
+            QTimer::singleShot(0, this, &VDRMainWindow::buildCalendar);
+    }
+    return QMainWindow::event(event);
 }
 
 void VDRMainWindow::closeEvent(QCloseEvent* event)

@@ -3,6 +3,7 @@
 #include "app/Ui_VDRMainWindowClass.h"
 
 #include <QDate>
+#include <QIcon>
 #include <QMainWindow>
 #include <QStringList>
 
@@ -95,6 +96,7 @@ private slots:
     void slotReportDatesChanged(const QList<QDate>& dates);
 
 protected:
+    bool event(QEvent* event) override;
     void closeEvent(QCloseEvent* event) override;
 
 private:
@@ -104,6 +106,8 @@ private:
     // Check marks of the Ansicht menu follow what is shown.
     void updateViewActions();
     void updateReportPage();
+    void markReportDates();
+    void buildCalendar();
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).
     void syncCompleterTexts();
@@ -115,11 +119,14 @@ private:
     QLabel* m_welcome;
     QLabel* m_reportPage;
     QTableView* m_entryList;
-    QCalendarWidget* m_calendar;
+    QCalendarWidget* m_calendar = nullptr;
+    QList<QDate> m_reportDates;
     QDockWidget* m_dockEntryList;
     QDockWidget* m_dockEntryDate;
     QLabel* m_clock;
     QTimer* m_clockTimer;
+    QIcon m_recentIcon;
+    bool m_painted = false;
     VDRSpellChecker* m_spellChecker = nullptr;
 };
 

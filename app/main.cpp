@@ -107,6 +107,8 @@ int main(int argc, char* argv[])
                                                              dictionaries + QStringLiteral("vdr_userDict_") +
                                                                  suffix + QStringLiteral(".txt"));
             window.setSpellChecker(spellChecker.get());
+            // Nothing to migrate costs little, but a fresh store writes every default list.
+            VDRCompleter::migrateSettings();
         });
         window.show();
 
@@ -133,7 +135,6 @@ int main(int argc, char* argv[])
 
         KeyPressEater eater;
         app.installEventFilter(&eater);
-        VDRCompleter::migrateSettings();
 
         result = app.exec();
         app.removeEventFilter(&eater);
