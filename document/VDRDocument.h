@@ -10,6 +10,7 @@
 #include <QPointer>
 #include <QSqlDatabase>
 #include <QStringList>
+#include <QVector>
 
 #include <functional>
 
@@ -103,6 +104,8 @@ public:
     void initEntryModels(int entryId);
     bool hasEntryModels(int entryId) const { return m_entryModels.contains(entryId); }
     int entryModelSetCount() const { return m_entryModels.size(); }
+    // The tables of a report's models, in the order they are built.
+    static const QVector<VDRSqlTableModel::TABLE_NAMES>& entryTables();
 
     // Keeps the models of one report alive while it exists.
     class EntryModelsPin

@@ -586,6 +586,16 @@ bool VDRDocument::copyEntryAll(int row)
     return ok;
 }
 
+namespace {
+bool execLogged(QSqlQuery& q)
+{
+    if (q.exec())
+        return true;
+    qDebug().noquote() << "SQL-Error:" << q.lastError().text();
+    return false;
+}
+} // namespace
+
 bool VDRDocument::removeEntryAll(int row)
 {
     m_modelEntryAll->fetch_all();
@@ -597,21 +607,46 @@ bool VDRDocument::removeEntryAll(int row)
     beginTransaction();
     bool ok = true;
     QSet<int> imageIds;
-    const EntryModelsPin pin(this, entryId);
-    for (VDRSqlTableModel* model : entryModels(entryId)) {
-        model->fetch_all();
-        const int rows = model->rowCount();
-        if (rows == 0)
-            continue;
-        if (model->fieldIndex(QStringLiteral("photo_image_id")) >= 0) {
-            for (int r = 0; r < rows; ++r) {
-                const QVariant image = model->data(r, QStringLiteral("photo_image_id"), Qt::EditRole);
-                if (!image.isNull() && image.toInt() > 0)
-                    imageIds.insert(image.toInt());
+    if (hasEntryModels(entryId)) {
+        // Models in use may hold unsubmitted rows, which must go with the report.
+        const EntryModelsPin pin(this, entryId);
+        for (VDRSqlTableModel* model : entryModels(entryId)) {
+            model->fetch_all();
+            const int rows = model->rowCount();
+            if (rows == 0)
+                continue;
+            if (model->fieldIndex(QStringLiteral("photo_image_id")) >= 0) {
+                for (int r = 0; r < rows; ++r) {
+                    const QVariant image = model->data(r, QStringLiteral("photo_image_id"), Qt::EditRole);
+                    if (!image.isNull() && image.toInt() > 0)
+                        imageIds.insert(image.toInt());
+                }
             }
+            model->removeRows(0, rows);
+            ok &= model->submitAll();
         }
-        model->removeRows(0, rows);
-        ok &= model->submitAll();
+    } else {
+        // Building the report's models only to empty them costs more than the removal itself.
+        QSqlQuery photos(database());
+        photos.prepare(QStringLiteral("SELECT photo_image_id FROM entry_photo WHERE entry_id = :id"));
+        photos.bindValue(QStringLiteral(":id"), entryId);
+        ok &= execLogged(photos);
+        while (photos.next()) {
+            if (!photos.value(0).isNull() && photos.value(0).toInt() > 0)
+                imageIds.insert(photos.value(0).toInt());
+        }
+        QStringList tables;
+        for (VDRSqlTableModel::TABLE_NAMES table : entryTables()) {
+            const QString name = VDRSqlTableModel::sqlTableName(table);
+            if (!tables.contains(name))
+                tables << name;
+        }
+        for (const QString& table : qAsConst(tables)) {
+            QSqlQuery q(database());
+            q.prepare(QStringLiteral("DELETE FROM ") + table + QStringLiteral(" WHERE entry_id = :id"));
+            q.bindValue(QStringLiteral(":id"), entryId);
+            ok &= execLogged(q);
+        }
     }
     // An image goes only when no photo row refers to it any more (-1: the count failed).
     for (const int imageId : qAsConst(imageIds)) {
@@ -622,8 +657,17 @@ bool VDRDocument::removeEntryAll(int row)
         deleteAudioRecord(audioId);
     VDRDocumentsDb::removeRecordsOnDocumentsDb4Entry(this, entryId);
 
-    m_modelEntryAll->removeRows(row, 1);
-    ok &= m_modelEntryAll->submitAll();
+    if (m_modelEntryAll->canDropDeletedRow(row)) {
+        // The report list drops the row instead of reading every report again.
+        QSqlQuery q(database());
+        q.prepare(QStringLiteral("DELETE FROM entry WHERE id = :id"));
+        q.bindValue(QStringLiteral(":id"), entryId);
+        const bool deleted = execLogged(q);
+        ok &= deleted && m_modelEntryAll->dropDeletedRow(row);
+    } else {
+        m_modelEntryAll->removeRows(row, 1);
+        ok &= m_modelEntryAll->submitAll();
+    }
     endTransaction();
     return ok;
 }

@@ -97,7 +97,21 @@ void VDRDocument::initEntryModels(int entryId)
         }
         return;
     }
-    static const VDRSqlTableModel::TABLE_NAMES tables[] = {
+    QMap<int, VDRSqlTableModel*>& models = m_entryModels[entryId];
+    for (VDRSqlTableModel::TABLE_NAMES table : entryTables()) {
+        QString filter = QStringLiteral("entry_id = '") + QString::number(entryId) + QLatin1Char('\'');
+        const int type = VDRSqlTableModel::typeCondition(table);
+        if (type > 0)
+            filter += QStringLiteral(" AND type = '") + QString::number(type) + QLatin1Char('\'');
+        models.insert(table, createModel(table, filter));
+    }
+    m_entryModelsUsed.append(entryId);
+    releaseEntryModels();
+}
+
+const QVector<VDRSqlTableModel::TABLE_NAMES>& VDRDocument::entryTables()
+{
+    static const QVector<VDRSqlTableModel::TABLE_NAMES> tables = {
         VDRSqlTableModel::TN_ATTENDEE,
         VDRSqlTableModel::TN_WORKFORCE,
         VDRSqlTableModel::TN_TIME_RECORDING,
@@ -119,16 +133,7 @@ void VDRDocument::initEntryModels(int entryId)
         VDRSqlTableModel::TN_CONCERN,
         VDRSqlTableModel::TN_EQUIPMENT,
     };
-    QMap<int, VDRSqlTableModel*>& models = m_entryModels[entryId];
-    for (VDRSqlTableModel::TABLE_NAMES table : tables) {
-        QString filter = QStringLiteral("entry_id = '") + QString::number(entryId) + QLatin1Char('\'');
-        const int type = VDRSqlTableModel::typeCondition(table);
-        if (type > 0)
-            filter += QStringLiteral(" AND type = '") + QString::number(type) + QLatin1Char('\'');
-        models.insert(table, createModel(table, filter));
-    }
-    m_entryModelsUsed.append(entryId);
-    releaseEntryModels();
+    return tables;
 }
 
 bool VDRDocument::entryModelsDirty(int entryId) const

@@ -244,7 +244,64 @@ bool VDRSqlTableModel::select()
     m_appendedRows.clear();
     m_needsSelect = false;
     m_submitsSinceSelect = 0;
-    return QSqlTableModel::select();
+    m_droppedQueryRows.clear();
+    m_cacheClean = QSqlTableModel::select();
+    return m_cacheClean;
+}
+
+void VDRSqlTableModel::clear()
+{
+    m_droppedQueryRows.clear();
+    m_cacheClean = false;
+    QSqlTableModel::clear();
+}
+
+int VDRSqlTableModel::rowCount(const QModelIndex& parent) const
+{
+    const int rows = QSqlTableModel::rowCount(parent);
+    return parent.isValid() ? rows : rows - m_droppedQueryRows.size();
+}
+
+QModelIndex VDRSqlTableModel::indexInQuery(const QModelIndex& item) const
+{
+    const QModelIndex inQuery = QSqlTableModel::indexInQuery(item);
+    if (!inQuery.isValid() || m_droppedQueryRows.isEmpty())
+        return inQuery;
+    return createIndex(skipDroppedRows(inQuery.row()), inQuery.column(), inQuery.internalPointer());
+}
+
+int VDRSqlTableModel::skipDroppedRows(int row) const
+{
+    for (const int dropped : m_droppedQueryRows) {
+        if (dropped > row)
+            break;
+        ++row;
+    }
+    return row;
+}
+
+bool VDRSqlTableModel::canDropDeletedRow(int row) const
+{
+    // Cached changes are keyed by row and would not move with the rows behind a dropped one.
+    // Dropped rows cost a little on every read, so a full select now and then clears them.
+    const int droppedBetweenSelects = 64;
+    return m_cacheClean && !canFetchMore() && row >= 0 && row < rowCount() &&
+           m_droppedQueryRows.size() < droppedBetweenSelects;
+}
+
+bool VDRSqlTableModel::dropDeletedRow(int row)
+{
+    if (!canDropDeletedRow(row))
+        return select();
+    // Without cached changes a model row is the query row after skipping the dropped ones.
+    const int queryRow = skipDroppedRows(row);
+    beginRemoveRows(QModelIndex(), row, row);
+    m_droppedQueryRows.insert(
+        std::upper_bound(m_droppedQueryRows.begin(), m_droppedQueryRows.end(), queryRow) -
+            m_droppedQueryRows.begin(),
+        queryRow);
+    endRemoveRows();
+    return true;
 }
 
 void VDRSqlTableModel::revertRow(int row)
@@ -258,6 +315,7 @@ void VDRSqlTableModel::revertRow(int row)
 bool VDRSqlTableModel::insertRows(int row, int count, const QModelIndex& parent)
 {
     const bool appended = row == rowCount();
+    m_cacheClean = false;
     if (!QSqlTableModel::insertRows(row, count, parent))
         return false;
     if (!appended)
@@ -271,6 +329,7 @@ bool VDRSqlTableModel::removeRows(int row, int count, const QModelIndex& parent)
 {
     // A removed row stays as a blank row until the next full select.
     m_needsSelect = true;
+    m_cacheClean = false;
     return QSqlTableModel::removeRows(row, count, parent);
 }
 
@@ -415,6 +474,7 @@ QVariant VDRSqlTableModel::data(const QModelIndex& idx, int role) const
 
 bool VDRSqlTableModel::setData(const QModelIndex& idx, const QVariant& value, int role)
 {
+    m_cacheClean = false;
     if (role == Qt::CheckStateRole && displayroleType(idx.column()) == DRT_CHECKBOX)
         return QSqlTableModel::setData(idx, value.toInt() == Qt::Checked ? 1 : 0, Qt::EditRole);
     const QVariant::Type type = m_types.value(idx.column(), QVariant::Invalid);

@@ -103,6 +103,13 @@ public:
     void revertRow(int row) override;
     bool insertRows(int row, int count, const QModelIndex& parent = QModelIndex()) override;
     bool removeRows(int row, int count, const QModelIndex& parent = QModelIndex()) override;
+    int rowCount(const QModelIndex& parent = QModelIndex()) const override;
+    void clear() override;
+
+    // A row whose record was deleted with SQL leaves the model without the table being read again;
+    // possible only while the model holds no changes, submitted or not, and has fetched every row.
+    bool canDropDeletedRow(int row) const;
+    bool dropDeletedRow(int row);
 
     bool setHeaderData(const QString& field, Qt::Orientation orientation, const QVariant& value,
                        int role = Qt::EditRole);
@@ -134,11 +141,13 @@ public:
 protected:
     // Sub-table and company rows can be dragged between views.
     bool isDragEnabledTable() const;
+    QModelIndex indexInQuery(const QModelIndex& item) const override;
 
 private:
     QStringList distinctTexts(const QString& field);
     void primeNewRecord(int row, QSqlRecord& record);
     bool canRefreshRowsOnly() const;
+    int skipDroppedRows(int row) const;
 
     TABLE_NAMES m_tableName;
     VDRDocument* m_document;
@@ -148,6 +157,10 @@ private:
     bool m_needsSelect = false;
     QList<int> m_appendedRows;
     int m_submitsSinceSelect = 0;
+    // Rows of the last full select that were dropped since, ascending; the model holds no cached
+    // changes while m_cacheClean is true.
+    QList<int> m_droppedQueryRows;
+    bool m_cacheClean = false;
     QHash<int, QVariant::Type> m_types;
     QHash<int, DISPLAYROLE_TYPE> m_displayTypes;
 };

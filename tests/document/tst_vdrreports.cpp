@@ -32,6 +32,8 @@ private slots:
     void copyEntryAll();
     void lockFreezesNamedCompanies();
     void removeEntryAll();
+    void reportListAfterRemovals_data();
+    void reportListAfterRemovals();
     void modelsOfFewReportsKept();
     void oldVersionFreezesOnOpening_data();
     void oldVersionFreezesOnOpening();
@@ -457,6 +459,51 @@ void TestVDRReports::removeEntryAll()
              QStringList({"2", "2"}));
     QCOMPARE(rows("SELECT id FROM image ORDER BY id"), QStringList({"2", "3"}));
     QCOMPARE(rows("SELECT id FROM audio"), QStringList{"2"});
+}
+
+void TestVDRReports::reportListAfterRemovals_data()
+{
+    QTest::addColumn<bool>("editedList");
+    QTest::addColumn<bool>("modelsInUse");
+    QTest::newRow("list read") << false << false;
+    QTest::newRow("list with an unsubmitted edit") << true << false;
+    QTest::newRow("removed reports shown") << false << true;
+}
+
+void TestVDRReports::reportListAfterRemovals()
+{
+    QFETCH(bool, editedList);
+    QFETCH(bool, modelsInUse);
+    setReports(10, {});
+    VDRAllEntryTableModel* list = m_doc->modelEntryAll();
+    const auto shown = [list](const QString& field) {
+        QStringList values;
+        for (int r = 0; r < list->rowCount(); ++r)
+            values << list->data(r, field, Qt::EditRole).toString();
+        return values;
+    };
+    if (editedList)
+        QVERIFY(list->setData(1, QStringLiteral("env_weather1"), QStringLiteral("Regen")));
+    // The first, a middle and the last report, then the list is edited and grows again.
+    for (const int row : {0, 4, 7}) {
+        const int id = list->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
+        if (modelsInUse)
+            QVERIFY(m_doc->appendEntryConcern(id)); // left unsubmitted
+        QVERIFY(m_doc->removeEntryAll(row));
+        QCOMPARE(shown(QStringLiteral("id")), rows("SELECT id FROM entry"));
+    }
+    QVERIFY(list->setData(3, QStringLiteral("env_weather2"), QStringLiteral("Sonne")));
+    QCOMPARE(m_doc->appendEntry(), 1);
+    QVERIFY(list->submitAll());
+    QCOMPARE(shown(QStringLiteral("id")), rows("SELECT id FROM entry"));
+    QCOMPARE(shown(QStringLiteral("env_weather2")), rows("SELECT env_weather2 FROM entry"));
+    QStringList edits = {"5||Sonne"};
+    if (editedList)
+        edits.prepend("2|Regen|");
+    QCOMPARE(rows("SELECT id, env_weather1, env_weather2 FROM entry "
+                  "WHERE id <= 10 AND (env_weather1 <> '' OR env_weather2 <> '')"),
+             edits);
+    QCOMPARE(rows("SELECT count(*) FROM entry_concern"), QStringList{"0"});
 }
 
 void TestVDRReports::modelsOfFewReportsKept()
