@@ -18,8 +18,12 @@ public:
     QString temporaryFile() const { return m_temporary; }
 
     // Runs the copy and waits for its end, keeping timers and painting alive but not user input.
-    // 'meanwhile' runs on the calling thread while the copy runs.
-    bool copyAndWait(const std::function<void()>& meanwhile = nullptr);
+    // 'whileFlushing' runs on the calling thread with the written copy (under its temporary name)
+    // while the copy is being flushed to disk: it reads the copy from memory while the disk works.
+    bool copyAndWait(const std::function<void(const QString& copy)>& whileFlushing = nullptr);
+
+signals:
+    void copied(const QString& temporary);
 
 protected:
     void run() override;

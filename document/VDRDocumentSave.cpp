@@ -191,16 +191,16 @@ bool VDRDocument::replaceDiaryKeepingBackups(const QString& temporary)
     return true;
 }
 
-// Copies the closed working copy to a flushed temporary file beside 'target' and checks the working
-// copy's integrity while the copy runs: a damaged copy is never saved over a diary. Returns the
-// temporary file, empty after a failure (explained to the user).
+// Copies the closed working copy to a flushed temporary file beside 'target' and checks the copy's
+// integrity while it is flushed (its pages are still in memory): a damaged working copy is never
+// saved over a diary. Returns the temporary file, empty after a failure (explained to the user).
 QString VDRDocument::copyCheckedWorkingCopy(const QString& target, const QString& failureText)
 {
     CopyThread copy(m_workingCopyPath, target);
     copy.setReplaceTarget(false);
     QString integrity;
-    const bool copied = copy.copyAndWait([&] {
-        const auto check = VDRScopedConnection::readOnlyLook(QStringLiteral("SAVECHECK"), m_workingCopyPath);
+    const bool copied = copy.copyAndWait([&](const QString& written) {
+        const auto check = VDRScopedConnection::readOnlyLook(QStringLiteral("SAVECHECK"), written);
         integrity =
             check->isOpen() ? checkDbIntegrity(check->db()) : CVdShared::sqlErrorText(check->lastError());
     });

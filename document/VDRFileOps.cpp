@@ -284,6 +284,13 @@ QString VDRFileOps::writeDurableCopy(const QString& source, const QString& targe
     return copyToTemporary(source, target, true);
 }
 
+QString VDRFileOps::writeCopy(const QString& source, const QString& target)
+{
+    if (shouldFail(Copy, target))
+        return QString();
+    return copyToTemporary(source, target, false);
+}
+
 QString VDRFileOps::copyToTemporary(const QString& source, const QString& target, bool flush)
 {
     QFile in(source);

@@ -38,6 +38,8 @@ public:
     // Copies 'source' to a new temporary file beside 'target' and flushes it to disk. Returns the
     // temporary file's name, empty on failure (nothing is left behind then).
     static QString writeDurableCopy(const QString& source, const QString& target);
+    // The same without flushing, for a caller that flushes the copy itself (flush()).
+    static QString writeCopy(const QString& source, const QString& target);
     // A new empty file under a temporary name beside 'target', for a writer that makes the contents itself.
     static QString emptyTemporaryBeside(const QString& target);
     // Flushes a finished file to disk.
