@@ -44,7 +44,7 @@ bool damageSchemaPage(const QString& path);
 // the file system or the user cannot.
 bool setImmutable(const QString& path, bool immutable);
 
-// A real, small file system (tmpfs) mounted at 'folder' for full-disk tests, where the test may
+// A real, small tmpfs mounted at 'folder' for full-disk tests, where the test may
 // mount one (as root); isMounted() tells. Unmounted on destruction.
 class SmallDisk
 {
