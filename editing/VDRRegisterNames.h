@@ -10,7 +10,8 @@ class VDRRegisterNames
     Q_DECLARE_TR_FUNCTIONS(VDRRegisterNames)
 
 public:
-    enum RegisterNames
+    // A fixed type: lists read from settings or exchange files may carry any number.
+    enum RegisterNames : int
     {
         Bautenstand = 0,
         Anwesende = 1,
