@@ -43,8 +43,9 @@ ReadOnlyLook look(const QString& path, bool integrity)
         return result;
     QSqlQuery q(connection->db());
     if (!q.exec(QStringLiteral("SELECT count(*) FROM sqlite_master"))) {
-        const QString code = q.lastError().nativeErrorCode();
-        result.busy = code == QLatin1String("5") || code == QLatin1String("6");
+        // SQLITE_BUSY or SQLITE_LOCKED, extended codes included, as the opening's probe reads them.
+        const int code = VDRScopedConnection::sqliteCode(q.lastError());
+        result.busy = code == 5 || code == 6;
         result.integrity = q.lastError().databaseText();
         return result;
     }
