@@ -82,9 +82,13 @@ bool writeDummyRow(const QSqlDatabase& db, QSqlError& error)
 }
 
 // "ok", the first problem quick_check found, or "NoResult" with the reason the check could not run.
-QString integrityOf(const QSqlDatabase& db, QSqlError* failure = nullptr)
+// 'mapped' reads the file through a memory map: several times faster on pages already in memory,
+// so only for files this process has just written and nobody else can shorten under it.
+QString integrityOf(const QSqlDatabase& db, QSqlError* failure = nullptr, bool mapped = false)
 {
     QSqlQuery q(db);
+    if (mapped)
+        q.exec(QStringLiteral("PRAGMA mmap_size = 2147418112"));
     if (q.exec(QStringLiteral("PRAGMA quick_check;")) && q.next())
         return q.value(0).toString();
     const QSqlError error = q.lastError();
@@ -219,10 +223,10 @@ QString VDRDocument::getFreeTempFile(const QString& suffix)
     return name;
 }
 
-QString VDRDocument::checkDbIntegrity(QSqlDatabase db)
+QString VDRDocument::checkDbIntegrity(QSqlDatabase db, bool ownFreshFile)
 {
     // Only reads: the connection may be one on the diary file itself, which only saving changes.
-    return integrityOf(db);
+    return integrityOf(db, nullptr, ownFreshFile);
 }
 
 QString VDRDocument::lockDateText(const QString& stored)
@@ -628,7 +632,7 @@ bool VDRDocument::openDocumentImpl(const QString& path, bool& showError)
         if (q.exec(QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")) && q.next())
             fileVersion = q.value(0).toString();
         q.finish();
-        integrity = integrityOf(version->db());
+        integrity = integrityOf(version->db(), nullptr, !resume);
     }
     if (integrity != QLatin1String("ok")) {
         qWarning().noquote() << "integrity of" << diaryPath << ":" << integrity;

@@ -72,7 +72,8 @@ public:
     QString getFreeTempFile(const QString& suffix);
 
     // "ok" for an intact database, "NoResult" when the check yields nothing, else the first problem.
-    static QString checkDbIntegrity(QSqlDatabase db);
+    // ownFreshFile: a file this process has just written, read through a memory map.
+    static QString checkDbIntegrity(QSqlDatabase db, bool ownFreshFile = false);
     // The message about a diary held by someone else, from its lock information.
     static QString lockHolderText(const QStringList& holder);
     static QString lockDateText(const QString& stored);

@@ -201,8 +201,8 @@ QString VDRDocument::copyCheckedWorkingCopy(const QString& target, const QString
     QString integrity;
     const bool copied = copy.copyAndWait([&](const QString& written) {
         const auto check = VDRScopedConnection::readOnlyLook(QStringLiteral("SAVECHECK"), written);
-        integrity =
-            check->isOpen() ? checkDbIntegrity(check->db()) : CVdShared::sqlErrorText(check->lastError());
+        integrity = check->isOpen() ? checkDbIntegrity(check->db(), true)
+                                    : CVdShared::sqlErrorText(check->lastError());
     });
     if (!copied) {
         VDRPrompt::critical(tr("Dateifehler"), VDRFileOps::withReason(failureText));
