@@ -105,6 +105,17 @@ private:
     mutable QIcon m_icon;
 };
 
+// The welcome text fills the empty window; its size never decides the window's. Asking a word-wrapped
+// rich-text label for its sizes lays the text out at several widths before anything is painted.
+class WelcomeLabel : public QLabel
+{
+public:
+    using QLabel::QLabel;
+    QSize sizeHint() const override { return {400, 200}; }
+    QSize minimumSizeHint() const override { return {100, 50}; }
+    bool hasHeightForWidth() const override { return false; }
+};
+
 QString sqliteVersion()
 {
     VDRScopedConnection about(QStringLiteral("ABOUT"), QStringLiteral(":memory:"), QString(), false);
@@ -117,7 +128,7 @@ QString sqliteVersion()
 
 VDRMainWindow::VDRMainWindow(QWidget* parent)
     : QMainWindow(parent), m_document(new VDRDocument(this)), m_central(new QStackedWidget(this)),
-      m_welcome(new QLabel(this)), m_reportPage(new QLabel(this)), m_entryList(new QTableView(this)),
+      m_welcome(new WelcomeLabel(this)), m_reportPage(new QLabel(this)), m_entryList(new QTableView(this)),
       m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
       m_recentIcon(
           new LazyIconEngine(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico")))
