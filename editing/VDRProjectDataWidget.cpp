@@ -5,6 +5,7 @@
 #include "document/VDRDocument.h"
 #include "document/VDRPrompt.h"
 #include "editing/VDRCompleterTextEdit.h"
+#include "editing/VDRTableView.h"
 
 #include <QCheckBox>
 #include <QComboBox>
@@ -39,21 +40,13 @@ const char* const footerColumns[] = {"footer_left", "footer_center", "footer_rig
 struct CompanyColumn
 {
     const char* field;
-    const char* title;
     int length;
+    int share; // percent of the width by default
 };
 const CompanyColumn companyColumns[] = {
-    {"type", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Typ"), 64},
-    {"firstname", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Vorname"), 64},
-    {"lastname", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Nachname"), 64},
-    {"company", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Firma"), 128},
-    {"street", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Straße"), 128},
-    {"plz", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "PLZ"), 16},
-    {"city", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Ort"), 64},
-    {"telephone", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Telefon"), 64},
-    {"telefax", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Telefax"), 64},
-    {"mobile", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "Mobil"), 64},
-    {"email", QT_TRANSLATE_NOOP("VDRProjectDataWidget", "E-Mail"), 128},
+    {"type", 64, 11},    {"firstname", 64, 9}, {"lastname", 64, 10}, {"company", 128, 14},
+    {"street", 128, 11}, {"plz", 16, 5},       {"city", 64, 9},      {"telephone", 64, 8},
+    {"telefax", 64, 7},  {"mobile", 64, 7},    {"email", 128, 9},
 };
 
 // Company cells are edited in place: a line edit bounded by the column's size; an empty text is
@@ -254,37 +247,26 @@ QWidget* VDRProjectDataWidget::createCompanyTab()
 {
     auto* tab = new QWidget(this);
     auto* layout = new QVBoxLayout(tab);
-    auto makeList = [&](const QString& title, const char* name, QTableView*& view,
-                        void (VDRProjectDataWidget::*add)(), void (VDRProjectDataWidget::*remove)()) {
+    auto makeList = [&](const QString& title, const char* name, VDRTableView*& view) {
         auto* group = new QGroupBox(title, tab);
         auto* groupLayout = new QHBoxLayout(group);
-        view = new QTableView(group);
+        view = new VDRTableView(group);
         view->setObjectName(QLatin1String(name));
-        view->setItemDelegate(new CompanyDelegate(view));
-        view->setSelectionBehavior(QAbstractItemView::SelectRows);
-        view->horizontalHeader()->setStretchLastSection(true);
+        view->setButtonBigviewVisible(false);
         groupLayout->addWidget(view);
-        auto* buttons = new QVBoxLayout;
-        auto* addButton = new QToolButton(group);
-        addButton->setObjectName(QStringLiteral("toolButtonAdd"));
-        addButton->setText(QStringLiteral("+"));
-        addButton->setToolTip(tr("Neue Zeile"));
-        auto* removeButton = new QToolButton(group);
-        removeButton->setObjectName(QStringLiteral("toolButtonRemove"));
-        removeButton->setText(QStringLiteral("-"));
-        removeButton->setToolTip(tr("Zeile entfernen"));
-        buttons->addWidget(addButton);
-        buttons->addWidget(removeButton);
-        buttons->addStretch();
-        groupLayout->addLayout(buttons);
-        connect(addButton, &QToolButton::clicked, this, add);
-        connect(removeButton, &QToolButton::clicked, this, remove);
         layout->addWidget(group);
     };
-    makeList(tr("Am Bau beteiligte Personen"), "tableViewCompanies1", m_table1,
-             &VDRProjectDataWidget::slotAddCompany1, &VDRProjectDataWidget::slotRemoveCompany1);
-    makeList(tr("Gewerke/Baufirmen"), "tableViewCompanies2", m_table2, &VDRProjectDataWidget::slotAddCompany2,
-             &VDRProjectDataWidget::slotRemoveCompany2);
+    makeList(tr("Am Bau beteiligte Personen"), "tableViewCompanies1", m_table1);
+    makeList(tr("Gewerke/Baufirmen"), "tableViewCompanies2", m_table2);
+    connect(m_table1, &VDRTableView::signalButtonAddClicked, this, &VDRProjectDataWidget::slotAddCompany1);
+    connect(m_table2, &VDRTableView::signalButtonAddClicked, this, &VDRProjectDataWidget::slotAddCompany2);
+    // List 1 asks here before removing; list 2 uses the table's own removal, which asks the same.
+    m_table1->setFlagAutodelete(false);
+    m_table2->setFlagAutodelete(true);
+    connect(m_table1, &VDRTableView::signalButtonDeleteClicked, this,
+            &VDRProjectDataWidget::slotRemoveCompany1);
+    connect(m_table2, &VDRTableView::signalButtonDeleteClicked, this,
+            &VDRProjectDataWidget::slotRemoveCompany2);
     return tab;
 }
 
@@ -444,15 +426,18 @@ void VDRProjectDataWidget::setCompanyModels()
 {
     struct
     {
-        QTableView* view;
+        VDRTableView* view;
         VDRSqlTableModel* model;
     } lists[] = {{m_table1, m_document->modelCompany1()}, {m_table2, m_document->modelCompany2()}};
     for (auto& list : lists) {
         VDRSqlTableModel* model = list.model;
         model->fetch_all();
-        for (const CompanyColumn& column : companyColumns)
-            model->setHeaderData(QLatin1String(column.field), Qt::Horizontal, tr(column.title));
         list.view->setModel(model);
+        // Company cells are edited in place here, unlike in the report tables.
+        QAbstractItemDelegate* old = list.view->itemDelegate();
+        list.view->setItemDelegate(new CompanyDelegate(list.view));
+        if (old && old->parent() == list.view)
+            old->deleteLater();
         for (int c = 0; c < model->columnCount(); ++c)
             list.view->setColumnHidden(c, true);
         for (const CompanyColumn& column : companyColumns)
@@ -655,7 +640,7 @@ void VDRProjectDataWidget::slotRemoveCompany1()
 
 void VDRProjectDataWidget::slotRemoveCompany2()
 {
-    removeSelectedRows(m_table2, true);
+    hideRemovedRows(m_table2);
 }
 
 void VDRProjectDataWidget::removeSelectedRows(QTableView* view, bool ask)
@@ -676,9 +661,18 @@ void VDRProjectDataWidget::removeSelectedRows(QTableView* view, bool ask)
                                                VDRPrompt::No) != VDRPrompt::Yes)
         return;
     std::sort(rows.begin(), rows.end(), std::greater<int>());
-    for (int row : rows) {
-        if (model->removeRows(row, 1))
-            view->setRowHidden(row, true); // kept by the model until the submit
+    for (int row : rows)
+        model->removeRows(row, 1);
+    view->clearSelection();
+    hideRemovedRows(view);
+}
+
+void VDRProjectDataWidget::hideRemovedRows(QTableView* view)
+{
+    // The model keeps removed rows, marked "!", until the submit.
+    for (int row = 0; view->model() && row < view->model()->rowCount(); ++row) {
+        if (view->model()->headerData(row, Qt::Vertical).toString() == QLatin1String("!"))
+            view->setRowHidden(row, true);
     }
 }
 
@@ -687,17 +681,25 @@ void VDRProjectDataWidget::removeSelectedRows(QTableView* view, bool ask)
 void VDRProjectDataWidget::restoreCompanyColumnWidths()
 {
     const QSettings settings;
-    const std::pair<QTableView*, QString> lists[] = {{m_table1, company1ColumnWidthsSettingsKey()},
-                                                     {m_table2, company2ColumnWidthsSettingsKey()}};
+    const std::pair<VDRTableView*, QString> lists[] = {{m_table1, company1ColumnWidthsSettingsKey()},
+                                                       {m_table2, company2ColumnWidthsSettingsKey()}};
     for (const auto& list : lists) {
+        VDRTableView* view = list.first;
+        auto* model = qobject_cast<VDRSqlTableModel*>(view->model());
+        if (!model)
+            continue;
         const QStringList widths = settings.value(list.second).toStringList();
-        QHeaderView* header = list.first->horizontalHeader();
-        for (int c = 0; c < widths.size() && c < header->count(); ++c) {
+        for (const CompanyColumn& column : companyColumns) {
+            const int c = model->fieldIndex(QLatin1String(column.field));
             bool ok = false;
-            const int width = widths.at(c).toInt(&ok);
+            const int width = widths.value(c).toInt(&ok);
+            // The user's widths in pixels; shares of the width until there are any.
             if (ok && width > 0 && width < 5000)
-                header->resizeSection(c, width);
+                view->setColumnWidth(c, VDRTableView::CWT_PIXEL, width);
+            else
+                view->setColumnWidth(c, VDRTableView::CWT_PERCENT, column.share);
         }
+        view->resizeColumns();
     }
 }
 

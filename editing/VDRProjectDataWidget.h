@@ -17,6 +17,7 @@ class VDRCompleterTextEdit;
 class VDRDocument;
 class VDRSpellChecker;
 class VDRSqlTableModel;
+class VDRTableView;
 
 // The master data of a diary in one modal dialog: the project data (the vdr row), the two company
 // lists and the company output formats. Nothing reaches the diary before OK.
@@ -49,8 +50,8 @@ public:
     void activateTab(SettingsType type);
     void setPrintButtonVisible(bool visible);
     void countCompanyEntries(int& persons, int& companies) const;
-    QTableView* tableViewCompanies1() const { return m_table1; }
-    QTableView* tableViewCompanies2() const { return m_table2; }
+    VDRTableView* tableViewCompanies1() const { return m_table1; }
+    VDRTableView* tableViewCompanies2() const { return m_table2; }
 
 public slots:
     void slotDocumentOpened(VDRDocument* document);
@@ -107,6 +108,7 @@ private:
     void setCompanyModels();
     void removeSelectedRows(QTableView* view, bool ask);
     void showAllRows();
+    void hideRemovedRows(QTableView* view);
 
     QPointer<VDRDocument> m_document;
     VDRSpellChecker* m_checker;
@@ -124,8 +126,8 @@ private:
     VDRCompleterTextEdit* m_projectDescription = nullptr;
     QCheckBox* m_showAddress[3] = {};
     QComboBox* m_address[3] = {};
-    QTableView* m_table1 = nullptr;
-    QTableView* m_table2 = nullptr;
+    VDRTableView* m_table1 = nullptr;
+    VDRTableView* m_table2 = nullptr;
     QPushButton* m_print = nullptr;
     QPushButton* m_import = nullptr;
 

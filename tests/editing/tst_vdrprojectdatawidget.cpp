@@ -3,10 +3,12 @@
 #include "document/CVdShared.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRProjectDataWidget.h"
+#include "editing/VDRTableView.h"
 
 #include <QCheckBox>
 #include <QComboBox>
 #include <QLineEdit>
+#include <QMimeData>
 #include <QPushButton>
 #include <QSettings>
 #include <QSqlError>
@@ -141,10 +143,7 @@ void TestVDRProjectDataWidget::okWritesAbbrechenReverts()
     party->setCurrentIndex(partyRow);
     // A new company row that Abbrechen must drop as well.
     m_widget->activateTab(VDRProjectDataWidget::ST_COMPANYLIST);
-    child<QTableView>("tableViewCompanies2")
-        ->parentWidget()
-        ->findChild<QToolButton*>("toolButtonAdd")
-        ->click();
+    m_widget->tableViewCompanies2()->buttonAdd()->click();
     child<QPushButton>(qPrintable(button))->click();
     QVERIFY(!m_widget->isVisible());
 
@@ -203,7 +202,7 @@ void TestVDRProjectDataWidget::companyLists()
 
     // Removing from list 1 asks first; "No" keeps the row.
     persons->selectRow(2);
-    QToolButton* remove = persons->parentWidget()->findChild<QToolButton*>("toolButtonRemove");
+    QToolButton* remove = m_widget->tableViewCompanies1()->buttonDelete();
     m_prompt.expect("Eintrag entfernen", "Soll der gewählte Eintrag tatsächlich entfernt werden?",
                     VDRPrompt::No);
     remove->click();
@@ -221,6 +220,19 @@ void TestVDRProjectDataWidget::companyLists()
     QCOMPARE(rows("SELECT type, length(company) FROM company WHERE category = 1 ORDER BY pos"),
              QStringList({"Bauherr|128", "Architekt|0"}));
     QVERIFY(QSettings().contains("Geometries/ProjectData/Company1ColumnWidths"));
+
+    // Reopened, the list has the stored widths; dragging the last person above the first reorders it.
+    QSettings().setValue(
+        "Geometries/ProjectData/Company1ColumnWidths",
+        QStringList({"0", "0", "77", "66", "55", "44", "33", "22", "11", "20", "30", "35", "40"}));
+    m_widget = openWidget(1);
+    QCOMPARE(m_widget->tableViewCompanies1()->columnWidth(model->fieldIndex("type")), 77);
+    QCOMPARE(m_widget->tableViewCompanies1()->columnWidth(model->fieldIndex("email")), 40);
+    std::unique_ptr<QMimeData> drag(model->mimeData({model->index(2, "type")}));
+    QVERIFY(model->dropMimeData(drag.get(), Qt::MoveAction, 1, 0, QModelIndex()));
+    child<QPushButton>("pbOk")->click();
+    QCOMPARE(rows("SELECT type FROM company WHERE category = 1 ORDER BY pos"),
+             QStringList({"Architekt", "Bauherr"}));
 }
 
 void TestVDRProjectDataWidget::formatTab_data()
