@@ -9,6 +9,7 @@
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRProjectDataWidget.h"
+#include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
 
 #include <QAction>
@@ -62,11 +63,16 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionHelpInfoDialog",
                                      "actionSettingsProjectData",
                                      "actionSettingsCompanyList",
-                                     "actionFormatCompany"};
+                                     "actionFormatCompany",
+                                     "actionSettingsProjectLogo"};
 // Commands that need an open document.
-const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB",
-                                        "actionSettingsProjectData", "actionSettingsCompanyList",
-                                        "actionFormatCompany"};
+const char* const kDocumentActions[] = {"actionFileSave",
+                                        "actionFileSaveAs",
+                                        "actionCompactDB",
+                                        "actionSettingsProjectData",
+                                        "actionSettingsCompanyList",
+                                        "actionFormatCompany",
+                                        "actionSettingsProjectLogo"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -862,4 +868,14 @@ void VDRMainWindow::on_actionSettingsCompanyList_triggered()
 void VDRMainWindow::on_actionFormatCompany_triggered()
 {
     showProjectData(VDRProjectDataWidget::ST_COMPANYFORMAT, true);
+}
+
+void VDRMainWindow::on_actionSettingsProjectLogo_triggered()
+{
+    if (!m_document->isStateValid())
+        return;
+    VDRProjectLogoWidget dialog(this);
+    dialog.slotDocumentOpened(m_document);
+    if (dialog.exec() == QDialog::Accepted)
+        updateGui();
 }

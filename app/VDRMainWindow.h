@@ -97,6 +97,7 @@ private slots:
     void on_actionSettingsProjectData_triggered();
     void on_actionSettingsCompanyList_triggered();
     void on_actionFormatCompany_triggered();
+    void on_actionSettingsProjectLogo_triggered();
 
 protected:
     bool event(QEvent* event) override;

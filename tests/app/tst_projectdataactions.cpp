@@ -3,6 +3,7 @@
 #include "app/VDRMainWindow.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRProjectDataWidget.h"
+#include "editing/VDRProjectLogoWidget.h"
 
 #include <QAction>
 #include <QApplication>
@@ -77,6 +78,28 @@ private slots:
         window.document()->closeDocument();
         window.updateGui();
         QVERIFY(!trigger->isEnabled());
+        VDR_VERIFY_PROMPT(prompt);
+    }
+
+    void logoActionOpensLogoDialog()
+    {
+        VDRTestPrompt prompt;
+        VDRMainWindow window;
+        window.show();
+        QAction* trigger = window.ui().action("actionSettingsProjectLogo");
+        QVERIFY(!trigger->isEnabled());
+        QVERIFY(window.createDocument(true));
+        QVERIFY(trigger->isEnabled());
+        QString title;
+        QTimer::singleShot(0, this, [&] {
+            if (auto* dialog = qobject_cast<VDRProjectLogoWidget*>(QApplication::activeModalWidget())) {
+                title = dialog->windowTitle();
+                dialog->findChild<QPushButton*>("pbCancel")->click();
+            }
+        });
+        trigger->trigger();
+        QCOMPARE(title, QString("Projektlogo"));
+        window.document()->closeDocument();
         VDR_VERIFY_PROMPT(prompt);
     }
 
