@@ -243,6 +243,9 @@ bool VDRProjectLogoWidget::actionSubmit()
         if (vdr->data(0, QLatin1String(kIdColumn[i]), Qt::EditRole) != id)
             ok &= vdr->setData(0, QLatin1String(kIdColumn[i]), id);
         const int align = logo.align->currentData().toInt();
+        // A second logo that is not there keeps its stored placement.
+        if (i == 1 && logo.imageId <= 0)
+            continue;
         if (vdr->data(0, QLatin1String(kAlignColumn[i]), Qt::EditRole).toInt() != align)
             ok &= vdr->setData(0, QLatin1String(kAlignColumn[i]), align);
     }
