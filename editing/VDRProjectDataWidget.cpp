@@ -28,6 +28,8 @@
 #include <QToolButton>
 #include <QVBoxLayout>
 
+#include <algorithm>
+
 namespace {
 
 const char* const showColumns[] = {"show_projectname", "show_headleft",     "show_headcenter",
@@ -73,6 +75,13 @@ public:
             }
         }
         return nullptr;
+    }
+
+    void setEditorData(QWidget* editor, const QModelIndex& index) const override
+    {
+        // Empty cells hold a blank; the editor starts without it.
+        if (auto* edit = qobject_cast<QLineEdit*>(editor))
+            edit->setText(index.data(Qt::EditRole).toString().trimmed());
     }
 
     void setModelData(QWidget* editor, QAbstractItemModel* model, const QModelIndex& index) const override
@@ -635,7 +644,7 @@ void VDRProjectDataWidget::slotAddCompany2()
 
 void VDRProjectDataWidget::slotRemoveCompany1()
 {
-    removeSelectedRows(m_table1, true);
+    removeSelectedRows(m_table1);
 }
 
 void VDRProjectDataWidget::slotRemoveCompany2()
@@ -643,7 +652,7 @@ void VDRProjectDataWidget::slotRemoveCompany2()
     hideRemovedRows(m_table2);
 }
 
-void VDRProjectDataWidget::removeSelectedRows(QTableView* view, bool ask)
+void VDRProjectDataWidget::removeSelectedRows(QTableView* view)
 {
     auto* model = qobject_cast<VDRSqlTableModel*>(view->model());
     if (!model || !view->selectionModel())
@@ -653,12 +662,26 @@ void VDRProjectDataWidget::removeSelectedRows(QTableView* view, bool ask)
         rows << index.row();
     if (rows.isEmpty() && view->currentIndex().isValid())
         rows << view->currentIndex().row();
-    if (rows.isEmpty())
+    // Frozen copies belong to locked reports, which must keep naming their companies.
+    const int selected = rows.size();
+    rows.erase(std::remove_if(rows.begin(), rows.end(),
+                              [&](int row) {
+                                  return model->data(row, QStringLiteral("category"), Qt::EditRole).toInt() <
+                                         0;
+                              }),
+               rows.end());
+    if (rows.isEmpty()) {
+        if (selected > 0)
+            VDRPrompt::information(
+                tr("Eintrag entfernen"),
+                tr("Der gewählte Eintrag wird von abgeschlossenen Berichten verwendet und kann "
+                   "nicht entfernt werden."));
         return;
-    if (ask && VDRPrompt::instance()->question(VDRPrompt::Question, tr("Eintrag entfernen"),
-                                               tr("Soll der gewählte Eintrag tatsächlich entfernt werden?"),
-                                               VDRPrompt::Yes | VDRPrompt::No, VDRPrompt::Yes,
-                                               VDRPrompt::No) != VDRPrompt::Yes)
+    }
+    if (VDRPrompt::instance()->question(VDRPrompt::Question, tr("Eintrag entfernen"),
+                                        tr("Soll der gewählte Eintrag tatsächlich entfernt werden?"),
+                                        VDRPrompt::Yes | VDRPrompt::No, VDRPrompt::Yes,
+                                        VDRPrompt::No) != VDRPrompt::Yes)
         return;
     std::sort(rows.begin(), rows.end(), std::greater<int>());
     for (int row : rows)

@@ -106,7 +106,7 @@ private:
     void updateFormatWidgets();
     void updateExamples();
     void setCompanyModels();
-    void removeSelectedRows(QTableView* view, bool ask);
+    void removeSelectedRows(QTableView* view);
     void showAllRows();
     void hideRemovedRows(QTableView* view);
 

@@ -200,7 +200,10 @@ void TestVDRProjectDataWidget::companyLists()
     persons->edit(model->index(0, "company"));
     QVERIFY(!persons->indexWidget(model->index(0, "company")));
 
-    // Removing from list 1 asks first; "No" keeps the row.
+    // The frozen copy cannot be removed; removing from list 1 asks first, "No" keeps the row.
+    persons->selectRow(0);
+    m_prompt.expect("Eintrag entfernen", "von abgeschlossenen Berichten verwendet");
+    m_widget->tableViewCompanies1()->buttonDelete()->click();
     persons->selectRow(2);
     QToolButton* remove = m_widget->tableViewCompanies1()->buttonDelete();
     m_prompt.expect("Eintrag entfernen", "Soll der gewählte Eintrag tatsächlich entfernt werden?",
