@@ -38,6 +38,8 @@ public:
     VDRTableView* view() const { return m_view; }
     QLineEdit* totalField() const { return m_total; }
 
+    // Writes the totals into the workforce row (after OK).
+    void writeWorkforceRow();
     // Opens the dialog for a workforce row and, on OK, writes the totals into it. Returns exec's result.
     static int editWorkforceRow(VDRDocument* document, int entryId, int workforceId, QWidget* parent);
 
