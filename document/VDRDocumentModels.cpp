@@ -45,7 +45,7 @@ VDRSqlTableModel* VDRDocument::createModel(VDRSqlTableModel::TABLE_NAMES table, 
     model->initColumns();
 
     const int posColumn = model->fieldIndex(QStringLiteral("pos"));
-    if (posColumn >= 0 && sqlTable != QLatin1String("company"))
+    if (posColumn >= 0)
         model->setSort(posColumn, Qt::AscendingOrder);
     if (!model->select())
         qDebug().noquote() << "select failed:" << sqlTable << model->lastError().text();
