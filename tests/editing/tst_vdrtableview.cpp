@@ -2,6 +2,7 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "editing/VDRCompanyDialog.h"
 #include "editing/VDRItemDelegate.h"
 #include "editing/VDRTableView.h"
 #include "editing/VDRTimePickerWidget.h"
@@ -15,6 +16,7 @@
 #include <QComboBox>
 #include <QLineEdit>
 #include <QMimeData>
+#include <QSettings>
 #include <QSpinBox>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -221,6 +223,61 @@ private slots:
         QTRY_COMPARE(m_prompt.messages.size(), message.isEmpty() ? 0 : 1);
         QCOMPARE(valueText(model->data(row, field, Qt::EditRole)), expected);
         QVERIFY(model->submitAll());
+    }
+
+    // "Neu..." creates the company in the list its dialog chose and writes its id into the cell.
+    void newCompany_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<bool>("person");
+        QTest::addColumn<bool>("accept");
+        QTest::addColumn<QString>("expected"); // category|company|type of the new row, or the cell's value
+        QTest::newRow("company") << int(M::TN_WORKFORCE) << false << true << "2|Neubau AG|Maler";
+        QTest::newRow("person of both lists") << int(M::TN_ATTENDEE) << true << true << "1|Neubau AG|Maler";
+        QTest::newRow("cancelled") << int(M::TN_WORKFORCE) << false << false << "NULL";
+    }
+
+    void newCompany()
+    {
+        QFETCH(int, table);
+        QFETCH(bool, person);
+        QFETCH(bool, accept);
+        QFETCH(QString, expected);
+        QSettings().setValue(VDRCompanyDialog::dontShowDataProtectionMsgSettingsKey(), true);
+        M* model = showTable(M::TABLE_NAMES(table), 1);
+        const QModelIndex index = model->index(0, QStringLiteral("company_id"));
+        m_view->setCurrentIndex(index);
+        QTest::keyClick(m_view.get(), Qt::Key_F2);
+        auto* combo = qobject_cast<QComboBox*>(m_view->indexWidget(index));
+        QVERIFY(combo);
+        QCOMPARE(combo->itemText(0), QStringLiteral("Neu..."));
+        QTimer::singleShot(0, [=] {
+            auto* dialog = qobject_cast<VDRCompanyDialog*>(QApplication::activeModalWidget());
+            if (!dialog)
+                return;
+            if (person)
+                dialog->findChild<QAbstractButton*>(QStringLiteral("radioButtonPerson"))->click();
+            dialog->findChild<QLineEdit*>(QStringLiteral("lineEditCompany"))
+                ->setText(QStringLiteral("Neubau AG"));
+            dialog->findChild<QComboBox*>(QStringLiteral("comboBoxType"))
+                ->setEditText(QStringLiteral("Maler"));
+            accept ? dialog->accept() : dialog->reject();
+        });
+        combo->setCurrentIndex(0);
+        emit combo->activated(0);
+        QTRY_VERIFY(!m_view->indexWidget(index) || combo->currentText().isEmpty());
+        if (!accept) {
+            QCOMPARE(combo->currentText(), QString());
+            QTest::keyClick(combo, Qt::Key_Escape);
+            QCOMPARE(valueText(model->data(0, QStringLiteral("company_id"), Qt::EditRole)), expected);
+            return;
+        }
+        const int id = model->data(0, QStringLiteral("company_id"), Qt::EditRole).toInt();
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(QStringLiteral("SELECT category, company, type FROM company WHERE id = %1").arg(id)));
+        QVERIFY(q.next());
+        QCOMPARE(QStringList({q.value(0).toString(), q.value(1).toString(), q.value(2).toString()}).join('|'),
+                 expected);
     }
 
     // A megabyte pasted into a cell is stored (or cut by a one-line field) and drawn without a freeze.
