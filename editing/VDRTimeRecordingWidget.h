@@ -1,11 +1,13 @@
 #pragma once
 
+#include "document/VDRSqlTableModel.h"
+
 #include <QDialog>
 #include <QList>
+#include <QPointer>
 
 class QLineEdit;
 class VDRDocument;
-class VDRSqlTableModel;
 class VDRTableView;
 
 // The persons and working times behind one workforce row; on OK their totals go into the row.
@@ -62,7 +64,7 @@ private:
     void restoreFilter();
 
     VDRDocument* m_document = nullptr;
-    VDRSqlTableModel* m_model = nullptr;
+    QPointer<VDRSqlTableModel> m_model;
     int m_entryId = 0;
     int m_workforceId = 0;
     VDRTableView* m_view;

@@ -410,8 +410,11 @@ private slots:
     void lockedReport()
     {
         M* model = showTable(M::TN_CONCERN, 3);
+        VDRTableView companies;
+        companies.setModel(m_doc->modelCompany2());
         VdEventsController::instance()->send_event(VdEvent::EnableEditors, false);
         QTRY_VERIFY(!m_view->editorsEnabled());
+        QVERIFY(companies.editorsEnabled());
         const QModelIndex index = model->index(0, QStringLiteral("description"));
         m_view->setCurrentIndex(index);
         QTest::keyClick(m_view.get(), Qt::Key_F2);
@@ -475,7 +478,8 @@ private slots:
         QCOMPARE(positions(obstructions), QStringList({"X|1", "B|2"}));
     }
 
-    // Metrics are kept per report, and only by views that keep them.
+    // Metrics are kept per report, and only by views that keep them; events 1003 and 1006 reach only
+    // the views they concern.
     void metricsPerReport()
     {
         M* model = showTable(M::TN_CONCERN, 2);
@@ -489,9 +493,15 @@ private slots:
         QTRY_COMPARE(m_view->rowHeight(0), 77);
         m_view->setSaveMetricsFlag(false);
         VdEventsController::instance()->send_event(VdEvent::SaveMetrics, 99);
-        VdEventsController::instance()->send_event(VdEvent::SelectRow, 1);
-        QTRY_COMPARE(m_view->currentIndex().row(), 1);
         QVERIFY(!m_view->hasMetrics(99));
+        // Row selection is the report list's; a report's lists keep theirs.
+        QVERIFY(m_doc->appendEntry() > 0);
+        VDRTableView reports;
+        reports.setModel(m_doc->modelEntryAll());
+        m_view->set_current_row(0);
+        VdEventsController::instance()->send_event(VdEvent::SelectRow, 1);
+        QTRY_COMPARE(reports.currentIndex().row(), 1);
+        QCOMPARE(m_view->currentIndex().row(), 0);
     }
 
     // The time recording: the totals of its rows go into the workforce row on OK.
