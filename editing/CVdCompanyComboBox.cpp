@@ -1,7 +1,9 @@
 #include "editing/CVdCompanyComboBox.h"
 
+#include "document/CVdShared.h"
 #include "document/VDRDocument.h"
 #include "document/VDRSqlTableModel.h"
+#include "editing/VDRCompanyDialog.h"
 
 #include <QLineEdit>
 
@@ -62,20 +64,9 @@ void CVdCompanyComboBox::addRows(VDRSqlTableModel* model, Format format)
 // One line of text for a company row in the output format the list uses.
 QString CVdCompanyComboBox::formatCompany(VDRSqlTableModel* model, int row, Format format)
 {
-    if (!model || row < 0)
-        return QString();
-    const auto field = [&](const char* name) {
-        return model->data(row, QLatin1String(name), Qt::EditRole).toString().trimmed();
-    };
-    QStringList parts;
-    if (format == PersonFormat && !field("lastname").isEmpty())
-        parts << field("lastname");
-    if (!field("company").isEmpty())
-        parts << field("company");
-    QString text = parts.join(QLatin1Char(' '));
-    if (!field("type").isEmpty())
-        text += (text.isEmpty() ? QStringLiteral("(%1)") : QStringLiteral(" (%1)")).arg(field("type"));
-    return text;
+    const QString separator = QStringLiteral(" ");
+    return format == CompanyFormat ? CVdShared::getCompanyFormat1(model, row, separator)
+                                   : CVdShared::getCompanyFormat2(model, row, separator);
 }
 
 QString CVdCompanyComboBox::companyText(VDRDocument* document, int companyId, int editorNumber)
@@ -144,15 +135,18 @@ void CVdCompanyComboBox::slot_selectedEntryChanged(int index)
     emit companyChosen(itemData(index).toInt());
 }
 
+// The company dialog decides whether a person or a company is created when it offers both.
 bool CVdCompanyComboBox::askNewCompany(int mode, QString* company, QString* name, QString* type,
                                        int* chosenMode)
 {
-    Q_UNUSED(mode)
-    Q_UNUSED(company)
-    Q_UNUSED(name)
-    Q_UNUSED(type)
-    Q_UNUSED(chosenMode)
-    return false;
+    VDRCompanyDialog dialog(mode, this);
+    if (dialog.exec() != QDialog::Accepted)
+        return false;
+    *company = dialog.company();
+    *name = dialog.name();
+    *type = dialog.type();
+    *chosenMode = dialog.mode();
+    return true;
 }
 
 void CVdCompanyComboBox::newCompany()

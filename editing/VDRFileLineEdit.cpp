@@ -4,6 +4,7 @@
 #include "document/VDRPrompt.h"
 
 #include <QCompleter>
+#include <QPointer>
 #include <QSqlQuery>
 #include <QSqlRecord>
 #include <QToolButton>
@@ -54,7 +55,13 @@ void VDRFileLineEdit::resizeEvent(QResizeEvent* event)
 
 void VDRFileLineEdit::slotChooseFile()
 {
+    setProperty("editorBusy", true);
+    const QPointer<VDRFileLineEdit> self(this);
     const QString path = VDRPrompt::instance()->openFileName(tr("Dokument auswählen"), QString(), QString());
+    if (!self)
+        return;
+    setProperty("editorBusy", false);
+    setFocus();
     if (path.isEmpty())
         return;
     setText(path);

@@ -22,9 +22,12 @@
 #include <QFileInfo>
 #include <QKeyEvent>
 #include <QLineEdit>
+#include <QPointer>
 #include <QRegularExpressionValidator>
 #include <QSpinBox>
+#include <QSqlField>
 #include <QSqlRecord>
+#include <QTimer>
 
 #include <cfloat>
 #include <climits>
@@ -55,6 +58,19 @@ bool isTextEditor(int editor)
 bool isTimeEditor(int editor)
 {
     return editor == 14 || editor == 40 || editor == 44 || editor == 47 || editor == 48;
+}
+
+// A box opened while an editor commits would take its focus and close it under the committing
+// code; the message comes once the edit has ended.
+void showLater(const QString& title, const QString& text)
+{
+    QTimer::singleShot(0, [title, text] { VDRPrompt::warning(title, text); });
+}
+
+// Text columns that must not be NULL refuse an empty date or time instead.
+bool isRequired(const VDRSqlTableModel* model, int column)
+{
+    return model && model->record().field(column).requiredStatus() == QSqlField::Required;
 }
 
 bool isDecimalEditor(int editor)
@@ -264,6 +280,11 @@ QWidget* VDRItemDelegate::createEditor(QWidget* parent, const QStyleOptionViewIt
     if (editor == 52) {
         auto* combo = new VDRTextEditComboBox(qobject_cast<VDRTableView*>(this->parent()), parent, false);
         combo->setDocument(document);
+        connect(combo, &VDRTextEditComboBox::picked, this, [this, combo](int) {
+            auto* self = const_cast<VDRItemDelegate*>(this);
+            emit self->commitData(combo);
+            emit self->closeEditor(combo);
+        });
         if (document && model) {
             VDRSqlTableModel* deficiencies = document->modelEntryDfcy(model->entryId());
             if (deficiencies) {
@@ -343,6 +364,8 @@ void VDRItemDelegate::setModelData(QWidget* editor, QAbstractItemModel* abstract
             return;
         }
         const QTime value = time->time();
+        if (!value.isValid() && isRequired(model, index.column()))
+            return;
         abstractModel->setData(index, value.isValid() ? QVariant(value) : QVariant(QVariant::Time));
         if (kind == 44)
             emit const_cast<VDRItemDelegate*>(this)->timeRecordingTimeChangedByUser(index, value.isValid());
@@ -373,12 +396,21 @@ void VDRItemDelegate::setModelData(QWidget* editor, QAbstractItemModel* abstract
         QString name = text;
         const QFileInfo info(text);
         if (file->mode() == 0 && model && info.isAbsolute() && info.isFile()) {
-            // A chosen file is stored in the documents database; the cell keeps its name.
-            name = VDRDocumentsDb::addDocument(
-                model->getDocument(), VDRSqlTableModel::sqlTableName(model->tableNameId()),
-                model->data(index.row(), QStringLiteral("id"), Qt::EditRole).toInt(), model->entryId(), text);
-            if (name.isEmpty())
-                return;
+            // A chosen file is stored in the documents database, once the edit has ended (storing
+            // may have to tell the user something); the cell keeps its name.
+            const QPersistentModelIndex cell(index);
+            QPointer<VDRSqlTableModel> target(model);
+            QTimer::singleShot(0, model, [target, cell, text] {
+                if (!target || !cell.isValid())
+                    return;
+                const QString stored = VDRDocumentsDb::addDocument(
+                    target->getDocument(), VDRSqlTableModel::sqlTableName(target->tableNameId()),
+                    target->data(cell.row(), QStringLiteral("id"), Qt::EditRole).toInt(), target->entryId(),
+                    text);
+                if (!stored.isEmpty())
+                    target->setData(cell, stored);
+            });
+            return;
         }
         abstractModel->setData(index, name.isEmpty() ? QVariant(QVariant::String) : QVariant(name));
         return;
@@ -414,7 +446,7 @@ void VDRItemDelegate::setModelData(QWidget* editor, QAbstractItemModel* abstract
         const qint64 minutes = parts.size() == 2 ? parts.at(1).toLongLong(&minutesOk) : 0;
         const qint64 value = hours * 60 + minutes;
         if (!hoursOk || !minutesOk || hours < 0 || minutes < 0 || minutes > 59 || value > INT_MAX) {
-            VDRPrompt::warning(tr("Warnung"), tr("Sie haben eine ungültigen Wert eingegeben."));
+            showLater(tr("Warnung"), tr("Sie haben eine ungültigen Wert eingegeben."));
             return;
         }
         if (old.isNull() || old.toLongLong() != value)
@@ -578,6 +610,9 @@ void VDRItemDelegate::updateEditorGeometry(QWidget* editor, const QStyleOptionVi
 
 bool VDRItemDelegate::eventFilter(QObject* object, QEvent* event)
 {
+    // An editor that waits for a dialog of its own stays open meanwhile.
+    if (event->type() == QEvent::FocusOut && object->property("editorBusy").toBool())
+        return false;
     // Return in a multi-line text ends the edit; Shift+Return makes a new line.
     if (event->type() == QEvent::KeyPress) {
         auto* key = static_cast<QKeyEvent*>(event);

@@ -312,10 +312,14 @@ bool VDRTableView::event(QEvent* event)
 {
     switch (int(event->type())) {
     case VdEvent::SelectRow:
-        set_current_row(static_cast<VdEvent*>(event)->arg(0).toInt());
+        // The row is one of the report list; the lists of a report keep their selection.
+        if (isOnTable("entry"))
+            set_current_row(static_cast<VdEvent*>(event)->arg(0).toInt());
         return true;
     case VdEvent::EnableEditors:
-        disable_editors(static_cast<VdEvent*>(event)->arg(0).toBool());
+        // Only the lists of a report follow its lock; master-data lists stay editable.
+        if (vdrModel() && vdrModel()->entryId() > 0)
+            disable_editors(static_cast<VdEvent*>(event)->arg(0).toBool());
         return true;
     case VdEvent::SaveMetrics:
         if (m_saveMetrics && !isOnTable("entry"))

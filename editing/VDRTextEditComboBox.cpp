@@ -126,4 +126,5 @@ void VDRTextEditComboBox::slotPicked(int row)
     setCurrentId(m_model->idAt(row));
     m_edit->setFocus();
     emit currentIdChanged(m_currentId);
+    emit picked(m_currentId);
 }

@@ -31,6 +31,8 @@ public:
 
 signals:
     void currentIdChanged(int id);
+    // An entry of the list was chosen.
+    void picked(int id);
 
 private slots:
     void slotTextChanged();

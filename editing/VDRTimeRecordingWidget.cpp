@@ -312,15 +312,18 @@ int VDRTimeRecordingWidget::editWorkforceRow(VDRDocument* document, int entryId,
     dialog.setEntryID(entryId);
     dialog.setWorkforceID(workforceId);
     const int result = dialog.exec();
-    if (result != 1)
-        return result;
-    VDRSqlTableModel* workforce = document->modelEntryWorkforce(entryId);
-    if (!workforce)
-        return result;
-    workforce->setDataById(workforceId, QStringLiteral("person_count"), dialog.totalPersonCount());
-    workforce->setDataById(workforceId, QStringLiteral("man_hours"),
-                           dialog.totalHoursIsValid() ? QVariant(dialog.totalHours())
-                                                      : QVariant(QVariant::Double));
-    workforce->setDataById(workforceId, QStringLiteral("person_type"), dialog.personTypes());
+    if (result == 1)
+        dialog.writeWorkforceRow();
     return result;
+}
+
+void VDRTimeRecordingWidget::writeWorkforceRow()
+{
+    VDRSqlTableModel* workforce = m_document ? m_document->modelEntryWorkforce(m_entryId) : nullptr;
+    if (!workforce)
+        return;
+    workforce->setDataById(m_workforceId, QStringLiteral("person_count"), totalPersonCount());
+    workforce->setDataById(m_workforceId, QStringLiteral("man_hours"),
+                           totalHoursIsValid() ? QVariant(totalHours()) : QVariant(QVariant::Double));
+    workforce->setDataById(m_workforceId, QStringLiteral("person_type"), personTypes());
 }

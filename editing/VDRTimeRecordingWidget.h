@@ -1,11 +1,13 @@
 #pragma once
 
+#include "document/VDRSqlTableModel.h"
+
 #include <QDialog>
 #include <QList>
+#include <QPointer>
 
 class QLineEdit;
 class VDRDocument;
-class VDRSqlTableModel;
 class VDRTableView;
 
 // The persons and working times behind one workforce row; on OK their totals go into the row.
@@ -38,6 +40,8 @@ public:
     VDRTableView* view() const { return m_view; }
     QLineEdit* totalField() const { return m_total; }
 
+    // Writes the totals into the workforce row (after OK).
+    void writeWorkforceRow();
     // Opens the dialog for a workforce row and, on OK, writes the totals into it. Returns exec's result.
     static int editWorkforceRow(VDRDocument* document, int entryId, int workforceId, QWidget* parent);
 
@@ -60,7 +64,7 @@ private:
     void restoreFilter();
 
     VDRDocument* m_document = nullptr;
-    VDRSqlTableModel* m_model = nullptr;
+    QPointer<VDRSqlTableModel> m_model;
     int m_entryId = 0;
     int m_workforceId = 0;
     VDRTableView* m_view;
