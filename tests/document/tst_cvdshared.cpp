@@ -146,10 +146,10 @@ void TestCVdShared::modelRowsAndFieldNames()
                                                  false),
              QString("Karl Mustermann Mustermann & Söhne"));
 
-    QCOMPARE(CVdShared::getCompanyFormat2OutputFieldName1(), QString("firstname"));
-    QCOMPARE(CVdShared::getCompanyFormat1OutputFieldName1(), QString()); // "- leer -"
-    QCOMPARE(CVdShared::getCompanyFormat1OutputFieldName2(), QString("company"));
-    QCOMPARE(CVdShared::listIdx2CompanyField().size(), 12);
+    QCOMPARE(CVdShared::getCompanyFormat2OutputFieldName1() + "|" +
+                 CVdShared::getCompanyFormat1OutputFieldName1() + "|" +
+                 CVdShared::getCompanyFormat1OutputFieldName2(),
+             QString("firstname||company")); // "- leer -" has no column
     for (int i = 0; i < 12; ++i)
         QCOMPARE(CVdShared::getListIdxByCompanyField(CVdShared::getCompanyFieldByIndex(i)), i);
     QCOMPARE(CVdShared::getCompanyFieldByIndex(12), QString());
@@ -158,51 +158,44 @@ void TestCVdShared::modelRowsAndFieldNames()
 
 void TestCVdShared::settingsAndReset()
 {
+    // Fields and bracket flags of both formats in one text: "0 4 1 (01) | 0 3 4 1 (01)".
+    auto state = [] {
+        using S = CVdShared;
+        return QString("%1 %2 %3 (%4%5) | %6 %7 %8 %9 (%10%11)")
+            .arg(S::companyOutputFormat1FieldIdx1())
+            .arg(S::companyOutputFormat1FieldIdx2())
+            .arg(S::companyOutputFormat1FieldIdx3())
+            .arg(S::companyOutputFormat1Field2InBrackets())
+            .arg(S::companyOutputFormat1Field3InBrackets())
+            .arg(S::companyOutputFormat2FieldIdx1())
+            .arg(S::companyOutputFormat2FieldIdx2())
+            .arg(S::companyOutputFormat2FieldIdx3())
+            .arg(S::companyOutputFormat2FieldIdx4())
+            .arg(S::companyOutputFormat2Field3InBrackets())
+            .arg(S::companyOutputFormat2Field4InBrackets());
+    };
+    const QString defaults = "0 4 1 (01) | 0 3 4 1 (01)";
     QSettings settings;
     settings.remove("CompanyOutputFormats");
-    CVdShared::restoreCompanyOutputFormats(); // nothing stored: the defaults
-    const QList<int> defaults1{0, 4, 1}, defaults2{0, 3, 4, 1};
-    auto current1 = [] {
-        return QList<int>{CVdShared::companyOutputFormat1FieldIdx1(),
-                          CVdShared::companyOutputFormat1FieldIdx2(),
-                          CVdShared::companyOutputFormat1FieldIdx3()};
-    };
-    auto current2 = [] {
-        return QList<int>{
-            CVdShared::companyOutputFormat2FieldIdx1(), CVdShared::companyOutputFormat2FieldIdx2(),
-            CVdShared::companyOutputFormat2FieldIdx3(), CVdShared::companyOutputFormat2FieldIdx4()};
-    };
-    QCOMPARE(current1(), defaults1);
-    QCOMPARE(current2(), defaults2);
+    CVdShared::restoreCompanyOutputFormats();
+    QCOMPARE(state(), defaults);
 
     // Stored values are used; one out of range falls back to its default.
     settings.setValue("CompanyOutputFormats/format1Field1", 7);
     settings.setValue("CompanyOutputFormats/format1Field2", 99);
     settings.setValue("CompanyOutputFormats/format2Field4InBrackets", false);
     CVdShared::restoreCompanyOutputFormats();
-    QCOMPARE(current1(), (QList<int>{7, 4, 1}));
-    QVERIFY(!CVdShared::companyOutputFormat2Field4InBrackets());
+    QCOMPARE(state(), QString("7 4 1 (01) | 0 3 4 1 (00)"));
 
     CVdShared::setCompanyOutputFormat1Field2InBrackets(true);
-    CVdShared::setCompanyOutputFormat1Field3InBrackets(false);
     CVdShared::setCompanyOutputFormat2FieldIdx2(11);
-    CVdShared::setCompanyOutputFormat2Field3InBrackets(true);
     CVdShared::saveCompanyOutputFormats();
+    // Resetting restores the defaults and touches no settings until they are saved.
     CVdShared::resetCompanyOutputFormat1();
     CVdShared::resetCompanyOutputFormat2();
-    QCOMPARE(current1(), defaults1);
-    QCOMPARE(current2(), defaults2);
-    QVERIFY(!CVdShared::companyOutputFormat1Field2InBrackets());
-    QVERIFY(CVdShared::companyOutputFormat1Field3InBrackets());
-    QVERIFY(!CVdShared::companyOutputFormat2Field3InBrackets());
-    QVERIFY(CVdShared::companyOutputFormat2Field4InBrackets());
-
-    // Resetting touches no settings until they are saved.
+    QCOMPARE(state(), defaults);
     CVdShared::restoreCompanyOutputFormats();
-    QCOMPARE(current1(), (QList<int>{7, 4, 1}));
-    QCOMPARE(current2(), (QList<int>{0, 11, 4, 1}));
-    QVERIFY(CVdShared::companyOutputFormat1Field2InBrackets());
-    QVERIFY(CVdShared::companyOutputFormat2Field3InBrackets());
+    QCOMPARE(state(), QString("7 4 1 (11) | 0 11 4 1 (00)"));
     settings.remove("CompanyOutputFormats");
     CVdShared::restoreCompanyOutputFormats();
 }
