@@ -8,6 +8,8 @@
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDRProjectDataWidget.h"
+#include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
 
 #include <QAction>
@@ -58,9 +60,19 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionStartSpellChecking",
                                      "actionVorschlagtexte",
                                      "actionHelpShowHelp",
-                                     "actionHelpInfoDialog"};
+                                     "actionHelpInfoDialog",
+                                     "actionSettingsProjectData",
+                                     "actionSettingsCompanyList",
+                                     "actionFormatCompany",
+                                     "actionSettingsProjectLogo"};
 // Commands that need an open document.
-const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB"};
+const char* const kDocumentActions[] = {"actionFileSave",
+                                        "actionFileSaveAs",
+                                        "actionCompactDB",
+                                        "actionSettingsProjectData",
+                                        "actionSettingsCompanyList",
+                                        "actionFormatCompany",
+                                        "actionSettingsProjectLogo"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -840,4 +852,41 @@ void VDRMainWindow::on_actionCompactDB_triggered()
         return;
     m_document->compactDB(true);
     updateGui();
+}
+
+void VDRMainWindow::showProjectData(int tab, bool printButton)
+{
+    if (!m_document->isStateValid())
+        return;
+    VDRProjectDataWidget dialog(this, m_spellChecker);
+    dialog.slotDocumentOpened(m_document);
+    dialog.activateTab(VDRProjectDataWidget::SettingsType(tab));
+    dialog.setPrintButtonVisible(printButton);
+    if (dialog.exec() == QDialog::Accepted)
+        updateGui();
+}
+
+void VDRMainWindow::on_actionSettingsProjectData_triggered()
+{
+    showProjectData(VDRProjectDataWidget::ST_PROJECTDATA, false);
+}
+
+void VDRMainWindow::on_actionSettingsCompanyList_triggered()
+{
+    showProjectData(VDRProjectDataWidget::ST_COMPANYLIST, true);
+}
+
+void VDRMainWindow::on_actionFormatCompany_triggered()
+{
+    showProjectData(VDRProjectDataWidget::ST_COMPANYFORMAT, true);
+}
+
+void VDRMainWindow::on_actionSettingsProjectLogo_triggered()
+{
+    if (!m_document->isStateValid())
+        return;
+    VDRProjectLogoWidget dialog(this);
+    dialog.slotDocumentOpened(m_document);
+    if (dialog.exec() == QDialog::Accepted)
+        updateGui();
 }

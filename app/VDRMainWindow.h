@@ -94,6 +94,10 @@ private slots:
     void on_actionHelpShowHelp_triggered();
     void on_actionHelpInfoDialog_triggered();
     void slotReportDatesChanged(const QList<QDate>& dates);
+    void on_actionSettingsProjectData_triggered();
+    void on_actionSettingsCompanyList_triggered();
+    void on_actionFormatCompany_triggered();
+    void on_actionSettingsProjectLogo_triggered();
 
 protected:
     bool event(QEvent* event) override;
@@ -111,6 +115,8 @@ private:
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).
     void syncCompleterTexts();
+    // The master-data dialog on one of its tabs; the window shows the result after OK.
+    void showProjectData(int tab, bool printButton);
 
     Ui_VDRMainWindowClass m_ui;
     VDRDocument* m_document;

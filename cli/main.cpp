@@ -1,4 +1,5 @@
 // varduna-cli: the program's own operations without a window.
+#include "cli/VDRCliCompanies.h"
 #include "cli/VDRCliPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDiaryCheck.h"
@@ -61,11 +62,15 @@ const char* const kHelp =
     "                      is kept under its ERROR name, which is printed.\n"
     "  compact FILE        Remove unreferenced images, rebuild the database and save; prints the\n"
     "                      size before and after in bytes.\n"
+    "  companies FILE [--json]  Print the two company lists (persons, then companies) in\n"
+    "                      their order: id and each company in the company and the person\n"
+    "                      output format, frozen copies of locked reports marked; --json adds\n"
+    "                      every field. Opens FILE as info does; exit codes as info.\n"
     "\n"
     "Options:\n"
     "  --yes               Answer questions with their affirmative default (without it every\n"
     "                      question takes its cancelling choice).\n"
-    "  --json              Machine-readable output (info, check).\n"
+    "  --json              Machine-readable output (info, check, companies).\n"
     "  -h, --help          This text.\n"
     "\n"
     "Set VARDUNA_DEBUG=1 to see the program's debug log on stderr.\n"
@@ -381,6 +386,8 @@ int main(int argc, char* argv[])
         result = cmdRestore(file);
     else if (command == QLatin1String("compact"))
         result = cmdCompact(file);
+    else if (command == QLatin1String("companies"))
+        result = cliListCompanies(file, json, out());
     else {
         err(QStringLiteral("varduna-cli: unknown command '%1'; see varduna-cli --help").arg(command));
         result = ExitUsage;

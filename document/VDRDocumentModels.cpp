@@ -42,8 +42,10 @@ VDRSqlTableModel* VDRDocument::createModel(VDRSqlTableModel::TABLE_NAMES table, 
         }
     }
 
+    model->initColumns();
+
     const int posColumn = model->fieldIndex(QStringLiteral("pos"));
-    if (posColumn >= 0 && sqlTable != QLatin1String("company"))
+    if (posColumn >= 0)
         model->setSort(posColumn, Qt::AscendingOrder);
     if (!model->select())
         qDebug().noquote() << "select failed:" << sqlTable << model->lastError().text();
@@ -103,7 +105,9 @@ void VDRDocument::initEntryModels(int entryId)
         const int type = VDRSqlTableModel::typeCondition(table);
         if (type > 0)
             filter += QStringLiteral(" AND type = '") + QString::number(type) + QLatin1Char('\'');
-        models.insert(table, createModel(table, filter));
+        VDRSqlTableModel* model = createModel(table, filter);
+        model->setEntryId(entryId);
+        models.insert(table, model);
     }
     m_entryModelsUsed.append(entryId);
     releaseEntryModels();

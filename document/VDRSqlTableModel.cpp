@@ -1,6 +1,10 @@
 #include "document/VDRSqlTableModel.h"
 
+#include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "document/VDRPrompt.h"
+
+#include <QMimeData>
 
 #include <QDate>
 #include <QDebug>
@@ -500,4 +504,415 @@ Qt::ItemFlags VDRSqlTableModel::flags(const QModelIndex& idx) const
     if (isDragEnabledTable())
         f |= Qt::ItemIsDragEnabled | Qt::ItemIsDropEnabled;
     return f;
+}
+
+// ---- Columns: editor numbers and header labels ----
+
+void VDRSqlTableModel::setEditorNumber(const QString& field, int number)
+{
+    const int column = fieldIndex(field);
+    if (column >= 0)
+        setEditorNumber(column, number);
+}
+
+namespace {
+struct ColumnInfo
+{
+    const char* field;
+    const char* label;
+    int editor;
+};
+
+// Header labels double as the column names of the suggestion lists.
+const ColumnInfo g_commonColumns[] = {
+    {"company_id", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Firma"), 2},
+    {"comment", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Bemerkung"), 0},
+    {"description", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Beschreibung"), 0},
+    {"date", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Datum"), 0},
+};
+
+QList<ColumnInfo> tableColumns(VDRSqlTableModel::TABLE_NAMES table)
+{
+    using M = VDRSqlTableModel;
+    switch (table) {
+    case M::TN_ATTENDEE:
+        return {{"company_id", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Name / Firma"), 17},
+                {"comment", nullptr, 24}};
+    case M::TN_WORKFORCE:
+        return {{"comment", nullptr, 25},
+                {"person_count", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Anz."), 38},
+                {"person_type", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Personen"), 38},
+                {"man_hours", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Std."), 38}};
+    case M::TN_DELAY:
+    case M::TN_OBSTRUCTION:
+    case M::TN_ACCEPTANCE:
+    case M::TN_DEFICIENCY: {
+        const int editor = table == M::TN_DELAY         ? 18
+                           : table == M::TN_OBSTRUCTION ? 19
+                           : table == M::TN_ACCEPTANCE  ? 20
+                                                        : 21;
+        return {{"roomname", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Raumname"), editor},
+                {"roombook_number", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Raumbuch-Nr."), editor},
+                {"description", nullptr, table == M::TN_DEFICIENCY ? 54 : editor},
+                {"date", nullptr, 35},
+                {"image_cnt", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Bilder"), 51}};
+    }
+    case M::TN_DIRECTIVE:
+        return {{"description", nullptr, 22}};
+    case M::TN_AUXILIARY_SERVICE:
+        return {{"description", nullptr, 23}};
+    case M::TN_CONSTRUCTION_MEASURE:
+        return {{"description", nullptr, 6},
+                {"timefrom", QT_TRANSLATE_NOOP("VDRSqlTableModel", "von"), 0},
+                {"timeto", QT_TRANSLATE_NOOP("VDRSqlTableModel", "bis"), 0},
+                {"location", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Ort"), 33},
+                {"kks", QT_TRANSLATE_NOOP("VDRSqlTableModel", "KKS"), 34}};
+    case M::TN_CONSTRUCTION_MATERIAL:
+        return {{"material", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Baustoff"), 7},
+                {"quantity", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Menge"), 39},
+                {"unit", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Einheit"), 45},
+                {"process", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Vorgang"), 8},
+                {"note", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Memo"), 9},
+                {"material_temperature", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Temp."), 15},
+                {"conditions", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Bedingungen"), 10},
+                {"workflow", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Arbeitsablauf"), 11},
+                {"document", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Dokument"), 31}};
+    case M::TN_SCHEDULED_DELIVERY:
+        return {{"deliverynumber", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Plan-Nr."), 26},
+                {"deliveryindex", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Index"), 27},
+                {"deliverydate", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Datum"), 0},
+                {"comment", nullptr, 28},
+                {"document", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Dokument"), 31}};
+    case M::TN_TELEPHONE_NOTICE:
+        return {{"company_id", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Name / Firma"), 17},
+                {"description", nullptr, 36},
+                {"time", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Uhrzeit"), 0}};
+    case M::TN_CONCERN:
+        return {{"description", nullptr, 37}};
+    case M::TN_TIME_RECORDING:
+        return {{"person_count", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Anzahl"), 15},
+                {"person_type", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Personen"), 5},
+                {"time_from", QT_TRANSLATE_NOOP("VDRSqlTableModel", "von"), 44},
+                {"time_to", QT_TRANSLATE_NOOP("VDRSqlTableModel", "bis"), 44},
+                {"breaks", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Pause"), 42},
+                {"hours", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Stunden"), 43}};
+    case M::TN_EQUIPMENT:
+        return {{"equipment", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Gerät"), 46},
+                {"operating_zone", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Einsatzbereich"), 46},
+                {"entry_time", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Beginn"), 47},
+                {"exit_time", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Ende"), 48},
+                {"operating_time", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Betriebszeit"), 49},
+                {"downtime", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Ausfallzeit"), 50},
+                {"downtime_reasons", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Ausfallgründe"), 46},
+                {"comment", nullptr, 46}};
+    case M::TN_PHOTO_PROGRESS:
+    case M::TN_PHOTO_DEFICIENCY:
+    case M::TN_PHOTO_OBSTRUCTION:
+    case M::TN_PHOTO_MEASURE:
+    case M::TN_PHOTO_MATERIAL:
+        return {{"caption", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Titel"), 0},
+                {"comment", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Kommentar"), 30},
+                {"relation_id", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Mangel"), 52}};
+    case M::TN_COMPANY1:
+    case M::TN_COMPANY2:
+        return {{"type", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Typ"), 56},
+                {"firstname", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Vorname"), 56},
+                {"lastname", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Nachname"), 56},
+                {"company", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Firma"), 56},
+                {"street", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Straße"), 56},
+                {"plz", QT_TRANSLATE_NOOP("VDRSqlTableModel", "PLZ"), 56},
+                {"city", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Ort"), 56},
+                {"telephone", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Telefon"), 56},
+                {"telefax", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Telefax"), 56},
+                {"mobile", QT_TRANSLATE_NOOP("VDRSqlTableModel", "Mobil"), 56},
+                {"email", QT_TRANSLATE_NOOP("VDRSqlTableModel", "E-Mail"), 56}};
+    default:
+        return {};
+    }
+}
+
+VDRSqlTableModel::DelegateFactory& delegateFactory()
+{
+    static VDRSqlTableModel::DelegateFactory factory;
+    return factory;
+}
+} // namespace
+
+void VDRSqlTableModel::initColumns()
+{
+    if (!sqlTableName(m_tableName).startsWith(QLatin1String("entry_")) && m_tableName != TN_COMPANY1 &&
+        m_tableName != TN_COMPANY2)
+        return;
+    // Value types first: dates, times and booleans have editors of their own.
+    for (auto it = m_types.constBegin(); it != m_types.constEnd(); ++it) {
+        if (it.value() == QVariant::Date)
+            setEditorNumber(it.key(), 13);
+        else if (it.value() == QVariant::Time)
+            setEditorNumber(it.key(), 14);
+        else if (it.value() == QVariant::Bool)
+            setEditorNumber(it.key(), 4);
+    }
+    for (const ColumnInfo& info : g_commonColumns) {
+        const int column = fieldIndex(QLatin1String(info.field));
+        if (column < 0)
+            continue;
+        setHeaderData(column, Qt::Horizontal, tr(info.label));
+        if (info.editor)
+            setEditorNumber(column, info.editor);
+        if (QLatin1String(info.field) == QLatin1String("company_id"))
+            setDisplayroleType(column, DRT_COMPANY);
+    }
+    for (const ColumnInfo& info : tableColumns(m_tableName)) {
+        const int column = fieldIndex(QLatin1String(info.field));
+        if (column < 0)
+            continue;
+        if (info.label)
+            setHeaderData(column, Qt::Horizontal, tr(info.label));
+        if (info.editor)
+            setEditorNumber(column, info.editor);
+    }
+}
+
+void VDRSqlTableModel::setDelegateFactory(DelegateFactory factory)
+{
+    delegateFactory() = std::move(factory);
+}
+
+QObject* VDRSqlTableModel::createItemDelegate(QObject* view, int column, bool enabled)
+{
+    const DelegateFactory& factory = delegateFactory();
+    return factory ? factory(this, view, column, enabled) : nullptr;
+}
+
+void VDRSqlTableModel::disable_editors(QObject* delegate)
+{
+    if (delegate)
+        QMetaObject::invokeMethod(delegate, "setEditorsEnabled", Q_ARG(bool, false));
+}
+
+// ---- Drag and drop ----
+
+QString VDRSqlTableModel::mimeTypeFor(const QString& sqlTable)
+{
+    return QStringLiteral("application/vnd.varduna2.") + sqlTable;
+}
+
+QStringList VDRSqlTableModel::mimeTypes() const
+{
+    return {mimeTypeFor(sqlTableName(m_tableName))};
+}
+
+Qt::DropActions VDRSqlTableModel::supportedDropActions() const
+{
+    return isDragEnabledTable() ? Qt::MoveAction : Qt::IgnoreAction;
+}
+
+Qt::DropActions VDRSqlTableModel::supportedDragActions() const
+{
+    return supportedDropActions();
+}
+
+namespace {
+// The payload: the dragged rows as decimal text, then the source type and the source report.
+struct DragPayload
+{
+    QList<int> rows;
+    int type = 0;
+    int entryId = 0;
+    int table = -1;
+    bool valid = false;
+};
+
+DragPayload readPayload(const QMimeData* data, const QString& mimeType)
+{
+    DragPayload payload;
+    if (!data || !data->hasFormat(mimeType))
+        return payload;
+    const QByteArray bytes = data->data(mimeType);
+    // A handful of row numbers; anything longer did not come from a view of ours.
+    if (bytes.size() > 1024 * 1024)
+        return payload;
+    const QStringList lines = QString::fromLatin1(bytes).split(QLatin1Char('\n'));
+    if (lines.size() < 4)
+        return payload;
+    bool ok = true;
+    for (const QString& part : lines.at(0).split(QLatin1Char(' '), Qt::SkipEmptyParts)) {
+        const int row = part.toInt(&ok);
+        if (!ok || row < 0)
+            return payload;
+        if (!payload.rows.contains(row))
+            payload.rows << row;
+    }
+    payload.type = lines.at(1).toInt(&ok);
+    if (!ok)
+        return payload;
+    payload.entryId = lines.at(2).toInt(&ok);
+    if (!ok)
+        return payload;
+    payload.table = lines.at(3).toInt(&ok);
+    payload.valid = ok && !payload.rows.isEmpty();
+    std::sort(payload.rows.begin(), payload.rows.end());
+    return payload;
+}
+
+VDRSqlTableModel::TABLE_NAMES tableOfType(const QString& sqlTable, int type)
+{
+    for (int t = 0; t < VDRSqlTableModel::TN_COUNT; ++t) {
+        const auto table = VDRSqlTableModel::TABLE_NAMES(t);
+        if (VDRSqlTableModel::sqlTableName(table) == sqlTable &&
+            VDRSqlTableModel::typeCondition(table) == type)
+            return table;
+    }
+    return VDRSqlTableModel::TN_COUNT;
+}
+} // namespace
+
+QMimeData* VDRSqlTableModel::mimeData(const QModelIndexList& indexes) const
+{
+    QList<int> rows;
+    for (const QModelIndex& index : indexes) {
+        if (index.isValid() && !rows.contains(index.row()))
+            rows << index.row();
+    }
+    if (rows.isEmpty())
+        return nullptr;
+    std::sort(rows.begin(), rows.end());
+    QStringList numbers;
+    for (int row : qAsConst(rows))
+        numbers << QString::number(row);
+    auto* data = new QMimeData;
+    data->setData(mimeTypes().constFirst(), numbers.join(QLatin1Char(' ')).toLatin1() + '\n' +
+                                                QByteArray::number(typeCondition(m_tableName)) + '\n' +
+                                                QByteArray::number(m_entryId) + '\n' +
+                                                QByteArray::number(int(m_tableName)));
+    return data;
+}
+
+bool VDRSqlTableModel::canDropMimeData(const QMimeData* data, Qt::DropAction action, int, int,
+                                       const QModelIndex&) const
+{
+    if (action != Qt::MoveAction || !isDragEnabledTable() || !m_document)
+        return false;
+    const DragPayload payload = readPayload(data, mimeTypes().constFirst());
+    if (!payload.valid || payload.entryId != m_entryId)
+        return false;
+    // A locked report keeps its rows as they are.
+    if (m_entryId > 0 && m_document->modelEntryAll() &&
+        m_document->modelEntryAll()->dataById(m_entryId, QStringLiteral("locked"), Qt::EditRole).toInt() == 1)
+        return false;
+    if (payload.table == m_tableName)
+        return true;
+    // Report rows may change their type within the table; nothing else changes its model.
+    return m_entryId > 0 && tableOfType(sqlTableName(m_tableName), payload.type) != TN_COUNT;
+}
+
+bool VDRSqlTableModel::dropMimeData(const QMimeData* data, Qt::DropAction action, int row, int column,
+                                    const QModelIndex& parent)
+{
+    if (!canDropMimeData(data, action, row, column, parent))
+        return false;
+    const DragPayload payload = readPayload(data, mimeTypes().constFirst());
+    VDRSqlTableModel* source = this;
+    if (payload.table != m_tableName) {
+        source = m_document->modelEntry(m_entryId, tableOfType(sqlTableName(m_tableName), payload.type));
+        if (!source)
+            return false;
+    }
+    if (sqlTableName(m_tableName) == QLatin1String("entry_photo") &&
+        payload.rows.constLast() - payload.rows.constFirst() + 1 != payload.rows.size()) {
+        VDRPrompt::warning(tr("Drag&Drop-Fehler"),
+                           tr("Sie können nur einzelne Bilder oder geschlossene Bereiche verschieben!"));
+        return false;
+    }
+    fetch_all();
+    int before = row;
+    if (before < 0)
+        before = parent.isValid() ? parent.row() : rowCount();
+    return moveRowsByPos(source, payload.rows, before);
+}
+
+bool VDRSqlTableModel::moveRowsByPos(VDRSqlTableModel* source, QList<int> rows, int beforeRow)
+{
+    const int posColumn = fieldIndex(QStringLiteral("pos"));
+    const int idColumn = fieldIndex(QStringLiteral("id"));
+    if (!source || posColumn < 0 || idColumn < 0)
+        return false;
+    fetch_all();
+    source->fetch_all();
+    const int count = rowCount();
+    beforeRow = qBound(0, beforeRow, count);
+    std::sort(rows.begin(), rows.end());
+    rows.erase(std::unique(rows.begin(), rows.end()), rows.end());
+    for (int r : qAsConst(rows)) {
+        if (r < 0 || r >= source->rowCount())
+            return false;
+    }
+    const auto idAt = [idColumn](VDRSqlTableModel* model, int r) {
+        return model->QSqlTableModel::data(model->QSqlTableModel::index(r, idColumn), Qt::EditRole).toInt();
+    };
+    const auto posAt = [posColumn](VDRSqlTableModel* model, int r) {
+        return model->QSqlTableModel::data(model->QSqlTableModel::index(r, posColumn), Qt::EditRole).toInt();
+    };
+    QList<int> movedIds;
+    for (int r : qAsConst(rows))
+        movedIds << idAt(source, r);
+
+    if (source == this) {
+        // The new order of the rows; the pos values they had are handed out again in that order,
+        // so only the rows between the old and the new place change.
+        QList<int> order;
+        QList<int> positions;
+        for (int r = 0; r < count; ++r) {
+            if (r == beforeRow)
+                order << rows;
+            if (!rows.contains(r))
+                order << r;
+            positions << posAt(this, r);
+        }
+        if (beforeRow == count)
+            order << rows;
+        std::sort(positions.begin(), positions.end());
+        bool changed = false;
+        for (int i = 0; i < order.size(); ++i) {
+            if (posAt(this, order.at(i)) != positions.at(i)) {
+                QSqlTableModel::setData(QSqlTableModel::index(order.at(i), posColumn), positions.at(i));
+                changed = true;
+            }
+        }
+        if (!changed)
+            return true;
+    } else {
+        // Rows of another type take the type of this model and consecutive pos values at the
+        // drop place; the rows behind the place move up by their number.
+        const int typeColumn = source->fieldIndex(QStringLiteral("type"));
+        if (typeColumn < 0)
+            return false;
+        const int firstPos = beforeRow < count ? posAt(this, beforeRow) : maxPos() + 1;
+        for (int r = beforeRow; r < count; ++r)
+            QSqlTableModel::setData(QSqlTableModel::index(r, posColumn), posAt(this, r) + rows.size());
+        if (!submitAll())
+            return false;
+        for (int i = 0; i < rows.size(); ++i) {
+            source->QSqlTableModel::setData(source->QSqlTableModel::index(rows.at(i), typeColumn),
+                                            typeCondition(m_tableName));
+            source->QSqlTableModel::setData(source->QSqlTableModel::index(rows.at(i), posColumn),
+                                            firstPos + i);
+        }
+        if (!source->submitAll())
+            return false;
+        select();
+        fetch_all();
+        const int focusRow = rowById(movedIds.constFirst());
+        if (focusRow >= 0)
+            emit setItemFocus(index(focusRow, std::max(0, fieldIndex(QStringLiteral("pos")))));
+        return true;
+    }
+    if (!submitAll())
+        return false;
+    if (m_tableName == TN_TIME_RECORDING)
+        emit calculateHours4TimeRecording();
+    const int focusRow = rowById(movedIds.constFirst());
+    if (focusRow >= 0)
+        emit setItemFocus(index(focusRow, std::max(0, fieldIndex(QStringLiteral("pos")))));
+    return true;
 }

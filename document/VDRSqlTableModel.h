@@ -6,6 +6,9 @@
 #include <QStringList>
 #include <QVariant>
 
+#include <functional>
+
+class QMimeData;
 class VDRDocument;
 
 // A table of the open diary: manual submission, addressed by field names and record ids.
@@ -138,6 +141,48 @@ public:
     bool setData(const QModelIndex& index, const QVariant& value, int role = Qt::EditRole) override;
     Qt::ItemFlags flags(const QModelIndex& index) const override;
 
+    // The report whose rows the model holds (0 for the models of the diary as a whole).
+    void setEntryId(int entryId) { m_entryId = entryId; }
+    int entryId() const { return m_entryId; }
+
+    // The editor kind of each column, shared with the delegates of the table views.
+    void setEditorNumber(const QString& field, int number);
+    void setEditorNumber(int column, int number) { m_editorNumbers.insert(column, number); }
+    int editorNumber(int column) const { return m_editorNumbers.value(column, 0); }
+    // Editor numbers, header labels and display types of the columns, after the table.
+    void initColumns();
+
+    // The delegates live with the widgets; the window installs the factory that builds them.
+    // 'column' -1 asks for a delegate of the whole view.
+    using DelegateFactory =
+        std::function<QObject*(VDRSqlTableModel* model, QObject* view, int column, bool enabled)>;
+    static void setDelegateFactory(DelegateFactory factory);
+    QObject* createItemDelegate(QObject* view, int column = -1, bool enabled = true);
+    // Switches the editors of a delegate built by createItemDelegate off.
+    static void disable_editors(QObject* delegate);
+
+    // Drag and drop of rows between views of the same table.
+    static QString mimeTypeFor(const QString& sqlTable);
+    QStringList mimeTypes() const override;
+    QMimeData* mimeData(const QModelIndexList& indexes) const override;
+    bool canDropMimeData(const QMimeData* data, Qt::DropAction action, int row, int column,
+                         const QModelIndex& parent) const override;
+    bool dropMimeData(const QMimeData* data, Qt::DropAction action, int row, int column,
+                      const QModelIndex& parent) override;
+    Qt::DropActions supportedDropActions() const override;
+    Qt::DropActions supportedDragActions() const override;
+    // Moves model rows (any order) in front of 'beforeRow' (rowCount() = to the end), renumbering
+    // `pos`; rows from 'source' (another type of the same table) change their type. Submits.
+    bool moveRowsByPos(VDRSqlTableModel* source, QList<int> rows, int beforeRow);
+
+signals:
+    // Forwarded from the delegates to the time recording.
+    void hoursChangedByUser(const QModelIndex& index);
+    void timeRecordingTimeChangedByUser(const QModelIndex& index, bool valid);
+    void calculateHours4TimeRecording();
+    // A row the views should show and select (a new or moved row).
+    void setItemFocus(const QModelIndex& index);
+
 protected:
     // Sub-table and company rows can be dragged between views.
     bool isDragEnabledTable() const;
@@ -161,6 +206,8 @@ private:
     // changes while m_cacheClean is true.
     QList<int> m_droppedQueryRows;
     bool m_cacheClean = false;
+    int m_entryId = 0;
+    QHash<int, int> m_editorNumbers;
     QHash<int, QVariant::Type> m_types;
     QHash<int, DISPLAYROLE_TYPE> m_displayTypes;
 };

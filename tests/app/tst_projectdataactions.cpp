@@ -1,0 +1,111 @@
+#include "VDRTestFixtures.h"
+#include "VDRTestPrompt.h"
+#include "app/VDRMainWindow.h"
+#include "document/VDRDocument.h"
+#include "editing/VDRProjectDataWidget.h"
+#include "editing/VDRProjectLogoWidget.h"
+
+#include <QAction>
+#include <QApplication>
+#include <QLabel>
+#include <QLineEdit>
+#include <QPushButton>
+#include <QTabWidget>
+#include <QTemporaryDir>
+#include <QTimer>
+#include <QtTest>
+
+#include <memory>
+
+// The main window's master-data actions open the dialog on their tab and show its result.
+class TestProjectDataActions : public QObject
+{
+    Q_OBJECT
+
+private slots:
+    void initTestCase()
+    {
+        QVERIFY(m_dir.isValid());
+        VDRTestFixtures::isolateSettings(m_dir.filePath(QStringLiteral("settings")));
+        qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
+    }
+
+    void actionsOpenTheirTab_data()
+    {
+        QTest::addColumn<QString>("action");
+        QTest::addColumn<int>("tab");
+        QTest::addColumn<QString>("button");
+        QTest::newRow("Projektdaten, OK") << "actionSettingsProjectData" << 0 << "pbOk";
+        QTest::newRow("Projektdaten, Abbrechen") << "actionSettingsProjectData" << 0 << "pbCancel";
+        QTest::newRow("Firmenliste") << "actionSettingsCompanyList" << 1 << "pbOk";
+        QTest::newRow("Firmendaten Ausgabeformat") << "actionFormatCompany" << 2 << "pbOk";
+    }
+
+    void actionsOpenTheirTab()
+    {
+        QFETCH(QString, action);
+        QFETCH(int, tab);
+        QFETCH(QString, button);
+        VDRTestPrompt prompt;
+        VDRMainWindow window;
+        window.show();
+        QAction* trigger = window.ui().action(action);
+        QVERIFY(trigger);
+        QVERIFY(!trigger->toolTip().contains("noch nicht verfügbar"));
+        QVERIFY(window.createDocument(true));
+        QVERIFY(trigger->isEnabled());
+
+        int shownTab = -1;
+        bool printShown = true;
+        QTimer::singleShot(0, this, [&] {
+            auto* dialog = qobject_cast<VDRProjectDataWidget*>(QApplication::activeModalWidget());
+            if (!dialog)
+                return;
+            shownTab = dialog->findChild<QTabWidget*>("tabWidget")->currentIndex();
+            printShown = dialog->findChild<QPushButton*>("pbPrint")->isVisible();
+            dialog->findChild<QLineEdit*>("lineEditProjectname")->setText("Brücke Nord");
+            dialog->findChild<QPushButton*>(button)->click();
+        });
+        trigger->trigger();
+        QCOMPARE(shownTab, tab);
+        QVERIFY(!printShown); // nothing prints the data sheet yet
+        const bool ok = button == QLatin1String("pbOk");
+        QCOMPARE(window.document()->projectName(), QString(ok ? "Brücke Nord" : "Neues Varduna"));
+        bool shown = false;
+        for (QLabel* label : window.findChildren<QLabel*>())
+            shown |= label->text().contains("Brücke Nord");
+        QCOMPARE(shown, ok);
+        window.document()->closeDocument();
+        window.updateGui();
+        QVERIFY(!trigger->isEnabled());
+        VDR_VERIFY_PROMPT(prompt);
+    }
+
+    void logoActionOpensLogoDialog()
+    {
+        VDRTestPrompt prompt;
+        VDRMainWindow window;
+        window.show();
+        QAction* trigger = window.ui().action("actionSettingsProjectLogo");
+        QVERIFY(!trigger->isEnabled());
+        QVERIFY(window.createDocument(true));
+        QVERIFY(trigger->isEnabled());
+        QString title;
+        QTimer::singleShot(0, this, [&] {
+            if (auto* dialog = qobject_cast<VDRProjectLogoWidget*>(QApplication::activeModalWidget())) {
+                title = dialog->windowTitle();
+                dialog->findChild<QPushButton*>("pbCancel")->click();
+            }
+        });
+        trigger->trigger();
+        QCOMPARE(title, QString("Projektlogo"));
+        window.document()->closeDocument();
+        VDR_VERIFY_PROMPT(prompt);
+    }
+
+private:
+    QTemporaryDir m_dir;
+};
+
+QTEST_MAIN(TestProjectDataActions)
+#include "tst_projectdataactions.moc"

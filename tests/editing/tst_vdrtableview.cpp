@@ -1,0 +1,731 @@
+#include "VDRTestFixtures.h"
+#include "VDRTestPrompt.h"
+#include "document/VDRAllEntryTableModel.h"
+#include "document/VDRDocument.h"
+#include "editing/VDRCompanyDialog.h"
+#include "editing/VDRItemDelegate.h"
+#include "editing/VDRTableView.h"
+#include "editing/VDRTimePickerWidget.h"
+#include "editing/VDRTimeRecordingWidget.h"
+#include "editing/VdEvent.h"
+#include "editing/VdEventsController.h"
+
+#include <QAbstractButton>
+#include <QApplication>
+#include <QClipboard>
+#include <QComboBox>
+#include <QLineEdit>
+#include <QMimeData>
+#include <QSettings>
+#include <QSpinBox>
+#include <QSqlError>
+#include <QSqlQuery>
+#include <QTextEdit>
+#include <QToolButton>
+#include <QtTest>
+
+#include <memory>
+
+using namespace VDRTestFixtures;
+using M = VDRSqlTableModel;
+
+namespace {
+const int kEntry = 1;
+
+QString valueText(const QVariant& v)
+{
+    if (v.isNull())
+        return QStringLiteral("NULL");
+    if (v.type() == QVariant::Time)
+        return v.toTime().toString(QStringLiteral("hh:mm"));
+    if (v.type() == QVariant::Date)
+        return v.toDate().toString(Qt::ISODate);
+    return v.toString();
+}
+
+// Opens a cell's editor with the edit key, replaces its text by typing, and commits with Return.
+// An editor that refuses the text stays open; Escape closes it then.
+void typeIntoCell(VDRTableView* view, int row, const QString& field, const QString& typed)
+{
+    const QModelIndex index = view->vdrModel()->index(row, field);
+    view->setCurrentIndex(index);
+    view->setFocus();
+    QTest::keyClick(view, Qt::Key_F2);
+    QWidget* editor = view->indexWidget(index);
+    QVERIFY2(editor, qPrintable(QStringLiteral("no editor for ") + field));
+    QWidget* target = editor;
+    if (auto* combo = qobject_cast<QComboBox*>(editor)) {
+        target = combo->lineEdit();
+        combo->lineEdit()->selectAll();
+    } else if (auto* spin = qobject_cast<QSpinBox*>(editor)) {
+        spin->selectAll();
+    } else if (auto* line = qobject_cast<QLineEdit*>(editor)) {
+        line->selectAll();
+    } else if (auto* text = qobject_cast<QTextEdit*>(editor)) {
+        text->selectAll();
+    }
+    if (typed.isEmpty())
+        QTest::keyClick(target, Qt::Key_Delete);
+    else
+        QTest::keyClicks(target, typed);
+    QTest::keyClick(target, Qt::Key_Return);
+    QTest::qWait(0);
+    QCoreApplication::processEvents();
+    if (view->indexWidget(index))
+        QTest::keyClick(view->indexWidget(index), Qt::Key_Escape);
+    QTRY_VERIFY(!view->indexWidget(index));
+}
+} // namespace
+
+// Takes drops without a running drag.
+class DropView : public VDRTableView
+{
+public:
+    using VDRTableView::dropEvent;
+};
+
+class TestVDRTableView : public QObject
+{
+    Q_OBJECT
+
+private slots:
+    void initTestCase()
+    {
+        QVERIFY(m_tmp.isValid());
+        isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
+        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
+    }
+
+    void init()
+    {
+        m_prompt.reset();
+        m_doc = std::make_unique<VDRDocument>();
+        QVERIFY(m_doc->createDocument(true));
+        QVERIFY(m_doc->appendCompany2());
+        M* companies = m_doc->modelCompany2();
+        const int row = companies->rowCount() - 1;
+        companies->setData(row, QStringLiteral("company"), QStringLiteral("Bau GmbH"));
+        companies->setData(row, QStringLiteral("type"), QStringLiteral("Rohbau"));
+        m_companyId = companies->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
+        QVERIFY(companies->submitAll());
+    }
+
+    void cleanup()
+    {
+        m_view.reset();
+        m_doc.reset();
+        VDR_VERIFY_PROMPT(m_prompt);
+    }
+
+    // Each editor kind writes what the user typed, in the form the column keeps.
+    void editCells_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QStringList>("edits");
+        QTest::addColumn<QString>("field");
+        QTest::addColumn<QString>("expected");
+        QTest::addColumn<QString>("message");
+
+        const QString today = QDate::currentDate().toString(Qt::ISODate);
+        QTest::newRow("company by name")
+            << int(M::TN_WORKFORCE) << QStringList{"company_id=Bau GmbH (Rohbau)"} << "company_id"
+            << "ID"
+            << "";
+        QTest::newRow("duration 0:05") << int(M::TN_EQUIPMENT) << QStringList{"downtime=0:05"} << "downtime"
+                                       << "5"
+                                       << "";
+        QTest::newRow("duration one-digit minutes refused")
+            << int(M::TN_EQUIPMENT) << QStringList{"operating_time=0:5"} << "operating_time"
+            << "NULL"
+            << "";
+        QTest::newRow("time 7") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=7"} << "time"
+                                << "07:00"
+                                << "";
+        QTest::newRow("time 7:5") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=7:5"} << "time"
+                                  << "07:05"
+                                  << "";
+        // The validator refuses the keystroke that would make the text invalid.
+        QTest::newRow("time 25:00") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=25:00"} << "time"
+                                    << "02:00"
+                                    << "";
+        QTest::newRow("time 12:60") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=12:60"} << "time"
+                                    << "12:06"
+                                    << "";
+        QTest::newRow("date 1.2.15") << int(M::TN_DELAY) << QStringList{"date=1.2.15"} << "date"
+                                     << "2015-02-01"
+                                     << "";
+        QTest::newRow("date 1.2.1999") << int(M::TN_DELAY) << QStringList{"date=1.2.1999"} << "date"
+                                       << "2099-02-01"
+                                       << "";
+        QTest::newRow("invalid date")
+            << int(M::TN_DELAY) << QStringList{"date=31.2.2020"} << "date" << today << "Format-Fehler";
+        QTest::newRow("text in a number cell")
+            << int(M::TN_CONSTRUCTION_MATERIAL) << QStringList{"quantity=abc"} << "quantity"
+            << "NULL"
+            << "";
+        QTest::newRow("decimal") << int(M::TN_CONSTRUCTION_MATERIAL) << QStringList{"quantity=12.5"}
+                                 << "quantity"
+                                 << "12.5"
+                                 << "";
+        QTest::newRow("empty comment") << int(M::TN_ATTENDEE) << QStringList{"comment="} << "comment"
+                                       << " "
+                                       << "";
+        QTest::newRow("blanks reduced")
+            << int(M::TN_CONCERN) << QStringList{"description=a   b  c"} << "description"
+            << "a b c"
+            << "";
+        QTest::newRow("one-line text")
+            << int(M::TN_EQUIPMENT) << QStringList{"equipment=Bagger"} << "equipment"
+            << "Bagger"
+            << "";
+        QTest::newRow("equipment over midnight")
+            << int(M::TN_EQUIPMENT) << QStringList{"entry_time=22:00", "exit_time=6"} << "operating_time"
+            << "480"
+            << "";
+        QTest::newRow("equipment exit cleared")
+            << int(M::TN_EQUIPMENT) << QStringList{"entry_time=8", "exit_time=9", "exit_time="}
+            << "entry_time"
+            << "NULL"
+            << "";
+        QTest::newRow("duplicate deficiency")
+            << int(M::TN_DEFICIENCY) << QStringList{"description=Riss", "description=Riss@1"}
+            << "description@1"
+            << "B"
+            << "Mängeltabelle";
+        QTest::newRow("spin box") << int(M::TN_TIME_RECORDING) << QStringList{"person_count=3"}
+                                  << "person_count"
+                                  << "3"
+                                  << "";
+    }
+
+    void editCells()
+    {
+        QFETCH(int, table);
+        QFETCH(QStringList, edits);
+        QFETCH(QString, field);
+        QFETCH(QString, expected);
+        QFETCH(QString, message);
+        M* model = showTable(M::TABLE_NAMES(table), 2);
+        if (!message.isEmpty())
+            m_prompt.expect(message);
+        for (const QString& edit : edits) {
+            const QString target = edit.section(QLatin1Char('='), 0, 0);
+            QString text = edit.section(QLatin1Char('='), 1);
+            // "@1" addresses the second row.
+            const int row = text.endsWith(QLatin1String("@1")) ? 1 : 0;
+            text.remove(QStringLiteral("@1"));
+            typeIntoCell(m_view.get(), row, target, text);
+        }
+        const int row = field.endsWith(QLatin1String("@1")) ? 1 : 0;
+        field.remove(QStringLiteral("@1"));
+        if (expected == QLatin1String("ID"))
+            expected = QString::number(m_companyId);
+        QTRY_COMPARE(m_prompt.messages.size(), message.isEmpty() ? 0 : 1);
+        QCOMPARE(valueText(model->data(row, field, Qt::EditRole)), expected);
+        QVERIFY(model->submitAll());
+    }
+
+    // "Neu..." creates the company in the list its dialog chose and writes its id into the cell.
+    void newCompany_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<bool>("person");
+        QTest::addColumn<bool>("accept");
+        QTest::addColumn<QString>("expected"); // category|company|type of the new row, or the cell's value
+        QTest::newRow("company") << int(M::TN_WORKFORCE) << false << true << "2|Neubau AG|Maler";
+        QTest::newRow("person of both lists") << int(M::TN_ATTENDEE) << true << true << "1|Neubau AG|Maler";
+        QTest::newRow("cancelled") << int(M::TN_WORKFORCE) << false << false << "NULL";
+    }
+
+    void newCompany()
+    {
+        QFETCH(int, table);
+        QFETCH(bool, person);
+        QFETCH(bool, accept);
+        QFETCH(QString, expected);
+        QSettings().setValue(VDRCompanyDialog::dontShowDataProtectionMsgSettingsKey(), true);
+        M* model = showTable(M::TABLE_NAMES(table), 1);
+        const QModelIndex index = model->index(0, QStringLiteral("company_id"));
+        m_view->setCurrentIndex(index);
+        QTest::keyClick(m_view.get(), Qt::Key_F2);
+        auto* combo = qobject_cast<QComboBox*>(m_view->indexWidget(index));
+        QVERIFY(combo);
+        QCOMPARE(combo->itemText(0), QStringLiteral("Neu..."));
+        QTimer::singleShot(0, [=] {
+            auto* dialog = qobject_cast<VDRCompanyDialog*>(QApplication::activeModalWidget());
+            if (!dialog)
+                return;
+            if (person)
+                dialog->findChild<QAbstractButton*>(QStringLiteral("radioButtonPerson"))->click();
+            dialog->findChild<QLineEdit*>(QStringLiteral("lineEditCompany"))
+                ->setText(QStringLiteral("Neubau AG"));
+            dialog->findChild<QComboBox*>(QStringLiteral("comboBoxType"))
+                ->setEditText(QStringLiteral("Maler"));
+            accept ? dialog->accept() : dialog->reject();
+        });
+        combo->setCurrentIndex(0);
+        emit combo->activated(0);
+        QTRY_VERIFY(!m_view->indexWidget(index) || combo->currentText().isEmpty());
+        if (!accept) {
+            QCOMPARE(combo->currentText(), QString());
+            QTest::keyClick(combo, Qt::Key_Escape);
+            QCOMPARE(valueText(model->data(0, QStringLiteral("company_id"), Qt::EditRole)), expected);
+            return;
+        }
+        const int id = model->data(0, QStringLiteral("company_id"), Qt::EditRole).toInt();
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(QStringLiteral("SELECT category, company, type FROM company WHERE id = %1").arg(id)));
+        QVERIFY(q.next());
+        QCOMPARE(QStringList({q.value(0).toString(), q.value(1).toString(), q.value(2).toString()}).join('|'),
+                 expected);
+    }
+
+    // A megabyte pasted into a cell is stored (or cut by a one-line field) and drawn without a freeze.
+    void hugePaste_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QString>("field");
+        QTest::addColumn<int>("storedLength");
+        QTest::newRow("multi-line") << int(M::TN_ATTENDEE) << "comment" << 1024 * 1024;
+        QTest::newRow("one-line") << int(M::TN_EQUIPMENT) << "equipment" << 32767;
+        QTest::newRow("time") << int(M::TN_TELEPHONE_NOTICE) << "time" << -1;
+    }
+
+    void hugePaste()
+    {
+        QFETCH(int, table);
+        QFETCH(QString, field);
+        QFETCH(int, storedLength);
+        M* model = showTable(M::TABLE_NAMES(table), 1);
+        const QVariant before = model->data(0, field, Qt::EditRole);
+        const QModelIndex index = model->index(0, field);
+        m_view->setCurrentIndex(index);
+        QTest::keyClick(m_view.get(), Qt::Key_F2);
+        QWidget* editor = m_view->indexWidget(index);
+        QVERIFY(editor);
+        QApplication::clipboard()->setText(QString(1024 * 1024, QLatin1Char('x')));
+        QWidget* target = editor;
+        if (auto* text = qobject_cast<QTextEdit*>(editor))
+            text->paste();
+        else if (auto* line = qobject_cast<QLineEdit*>(target))
+            line->paste();
+        QTest::keyClick(target, Qt::Key_Return);
+        QCoreApplication::processEvents();
+        if (m_view->indexWidget(index))
+            QTest::keyClick(m_view->indexWidget(index), Qt::Key_Escape);
+        QTRY_VERIFY(!m_view->indexWidget(index));
+        const QVariant after = model->data(0, field, Qt::EditRole);
+        if (storedLength < 0)
+            QCOMPARE(after.toTime().toString(QStringLiteral("hh:mm")),
+                     before.toTime().toString(QStringLiteral("hh:mm")));
+        else
+            QCOMPARE(after.toString().size(), storedLength);
+        QVERIFY(!m_view->grab().isNull());
+        QVERIFY(model->submitAll());
+    }
+
+    // Percent columns share what fixed and unlisted columns leave.
+    void columnWidths_data()
+    {
+        QTest::addColumn<int>("fixedPixels");
+        QTest::newRow("50/50") << 0;
+        QTest::newRow("50/50 and 70 px") << 70;
+    }
+
+    void columnWidths()
+    {
+        QFETCH(int, fixedPixels);
+        showTable(M::TN_EQUIPMENT, 0);
+        m_view->setAllColumnsHidden();
+        m_view->setColumnHidden(QStringLiteral("equipment"), false);
+        m_view->setColumnHidden(QStringLiteral("comment"), false);
+        m_view->setColumnWidth(QStringLiteral("equipment"), VDRTableView::CWT_PERCENT, 50);
+        m_view->setColumnWidth(QStringLiteral("comment"), VDRTableView::CWT_PERCENT, 50);
+        if (fixedPixels) {
+            m_view->setColumnHidden(QStringLiteral("entry_time"), false);
+            m_view->setColumnWidth(QStringLiteral("entry_time"), VDRTableView::CWT_PIXEL, fixedPixels);
+        }
+        m_view->resizeColumns();
+        const int share = (m_view->viewport()->width() - fixedPixels) * 50 / 100;
+        QCOMPARE(m_view->columnWidth(m_view->getColumnIndex("equipment")), share);
+        QCOMPARE(m_view->columnWidth(m_view->getColumnIndex("comment")), share);
+        if (fixedPixels)
+            QCOMPARE(m_view->columnWidth(m_view->getColumnIndex("entry_time")), fixedPixels);
+    }
+
+    // Removing a row takes what belongs to it along.
+    void removalCascades_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QString>("dependents");
+        QTest::addColumn<QStringList>("expected");
+        QTest::newRow("workforce") << int(M::TN_WORKFORCE)
+                                   << "SELECT workforce_id FROM entry_time_recording ORDER BY id"
+                                   << QStringList{"OTHER"};
+        QTest::newRow("deficiency") << int(M::TN_DEFICIENCY)
+                                    << "SELECT relation_id FROM entry_photo ORDER BY id"
+                                    << QStringList{"-1", "OTHER"};
+    }
+
+    void removalCascades()
+    {
+        QFETCH(int, table);
+        QFETCH(QString, dependents);
+        QFETCH(QStringList, expected);
+        M* model = showTable(M::TABLE_NAMES(table), 2);
+        const int removedId = model->data(0, QStringLiteral("id"), Qt::EditRole).toInt();
+        const int otherId = model->data(1, QStringLiteral("id"), Qt::EditRole).toInt();
+        if (table == M::TN_WORKFORCE) {
+            QVERIFY(m_doc->appendEntryTimeRecording(kEntry, removedId));
+            QVERIFY(m_doc->appendEntryTimeRecording(kEntry, removedId));
+            QVERIFY(m_doc->appendEntryTimeRecording(kEntry, otherId));
+            QVERIFY(m_doc->modelEntryTimeRecording(kEntry)->submitAll());
+        } else {
+            M* photos = m_doc->modelEntryPhoto2(kEntry);
+            for (int id : {removedId, otherId}) {
+                QVERIFY(m_doc->appendEntryPhoto2(kEntry, QDate::currentDate(), QStringLiteral("Bild"), 0));
+                photos->setData(photos->rowCount() - 1, QStringLiteral("relation_id"), id);
+            }
+            QVERIFY(photos->submitAll());
+            model->setData(0, QStringLiteral("image_cnt"), 1);
+        }
+        m_view->setFlagAutodelete(true);
+        m_view->selectRow(0);
+        QSignalSpy removed(m_view.get(), &VDRTableView::signalButtonDeleteClicked);
+        m_prompt.expect(QStringLiteral("Eintrag entfernen"), QString(), VDRPrompt::Yes);
+        QTest::mouseClick(m_view->buttonDelete(), Qt::LeftButton);
+        QCOMPARE(removed.count(), 1);
+        QVERIFY(model->submitAll());
+        expected.replaceInStrings(QStringLiteral("OTHER"), QString::number(otherId));
+        QStringList rows;
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(dependents));
+        while (q.next())
+            rows << q.value(0).toString();
+        QCOMPARE(rows, expected);
+        QCOMPARE(model->rowCount(), 1);
+    }
+
+    // A locked report: no editor opens, no drop lands, no row is added; unlocked, all is back.
+    void lockedReport()
+    {
+        M* model = showTable(M::TN_CONCERN, 3);
+        VDRTableView companies;
+        companies.setModel(m_doc->modelCompany2());
+        VdEventsController::instance()->send_event(VdEvent::EnableEditors, false);
+        QTRY_VERIFY(!m_view->editorsEnabled());
+        QVERIFY(companies.editorsEnabled());
+        const QModelIndex index = model->index(0, QStringLiteral("description"));
+        m_view->setCurrentIndex(index);
+        QTest::keyClick(m_view.get(), Qt::Key_F2);
+        QVERIFY(!m_view->indexWidget(index));
+        QSignalSpy added(m_view.get(), &VDRTableView::signalButtonAddClicked);
+        QTest::mouseDClick(m_view->viewport(), Qt::LeftButton, Qt::NoModifier,
+                           QPoint(5, m_view->viewport()->height() - 5));
+        QCOMPARE(added.count(), 0);
+        QVERIFY(!drop(m_view.get(), model, {0}));
+        QCOMPARE(positions(model), QStringList({"A|1", "B|2", "C|3"}));
+
+        VdEventsController::instance()->send_event(VdEvent::EnableEditors, true);
+        QTRY_VERIFY(m_view->editorsEnabled());
+        QTest::keyClick(m_view.get(), Qt::Key_F2);
+        QVERIFY(m_view->indexWidget(index));
+    }
+
+    // Rows move by their pos; photos move only as one block.
+    void dragAndDrop_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QList<int>>("rows");
+        QTest::addColumn<QStringList>("expected");
+        QTest::addColumn<QString>("message");
+        QTest::newRow("rows 2-3 of 5 to the end")
+            << int(M::TN_CONCERN) << QList<int>{1, 2} << QStringList{"A|1", "D|2", "E|3", "B|4", "C|5"} << "";
+        QTest::newRow("photos not one block")
+            << int(M::TN_PHOTO_PROGRESS) << QList<int>{0, 2} << QStringList{"A|1", "B|2", "C|3", "D|4", "E|5"}
+            << "Drag&Drop-Fehler";
+        QTest::newRow("photo block") << int(M::TN_PHOTO_PROGRESS) << QList<int>{0, 1}
+                                     << QStringList{"C|1", "D|2", "E|3", "A|4", "B|5"} << "";
+    }
+
+    void dragAndDrop()
+    {
+        QFETCH(int, table);
+        QFETCH(QList<int>, rows);
+        QFETCH(QStringList, expected);
+        QFETCH(QString, message);
+        M* model = showTable(M::TABLE_NAMES(table), 5);
+        if (!message.isEmpty())
+            m_prompt.expect(message, QStringLiteral("geschlossene Bereiche"));
+        drop(m_view.get(), model, rows);
+        QCOMPARE(positions(model), expected);
+        QCOMPARE(m_prompt.messages.size(), message.isEmpty() ? 0 : 1);
+    }
+
+    // A delay dropped on the obstructions becomes an obstruction at the drop place.
+    void dropOnAnotherType()
+    {
+        M* delays = showTable(M::TN_DELAY, 2);
+        DropView obstructionView;
+        M* obstructions = m_doc->modelEntryObstruction(kEntry);
+        fill(obstructions, 1, QStringLiteral("X"));
+        obstructionView.setModel(obstructions);
+        obstructionView.resize(600, 300);
+        obstructionView.show();
+        QVERIFY(QTest::qWaitForWindowExposed(&obstructionView));
+        QVERIFY(drop(&obstructionView, delays, {1}));
+        QCOMPARE(positions(delays), QStringList{"A|1"});
+        QCOMPARE(positions(obstructions), QStringList({"X|1", "B|2"}));
+    }
+
+    // Metrics are kept per report, and only by views that keep them; events 1003 and 1006 reach only
+    // the views they concern.
+    void metricsPerReport()
+    {
+        M* model = showTable(M::TN_CONCERN, 2);
+        Q_UNUSED(model)
+        m_view->setSaveMetricsFlag(true);
+        m_view->setRowHeight(0, 77);
+        VdEventsController::instance()->send_event(VdEvent::SaveMetrics, kEntry);
+        QTRY_VERIFY(m_view->hasMetrics(kEntry));
+        m_view->setRowHeight(0, 20);
+        VdEventsController::instance()->send_event(VdEvent::RestoreMetrics, kEntry);
+        QTRY_COMPARE(m_view->rowHeight(0), 77);
+        m_view->setSaveMetricsFlag(false);
+        VdEventsController::instance()->send_event(VdEvent::SaveMetrics, 99);
+        QVERIFY(!m_view->hasMetrics(99));
+        // Row selection is the report list's; a report's lists keep theirs.
+        QVERIFY(m_doc->appendEntry() > 0);
+        VDRTableView reports;
+        reports.setModel(m_doc->modelEntryAll());
+        m_view->set_current_row(0);
+        VdEventsController::instance()->send_event(VdEvent::SelectRow, 1);
+        QTRY_COMPARE(reports.currentIndex().row(), 1);
+        QCOMPARE(m_view->currentIndex().row(), 0);
+    }
+
+    // The time recording: the totals of its rows go into the workforce row on OK.
+    void timeRecording_data()
+    {
+        QTest::addColumn<QStringList>("rows"); // count|type|from|to|breaks
+        QTest::addColumn<QString>("typedHours");
+        QTest::addColumn<QString>("manHours");
+        QTest::addColumn<int>("persons");
+        QTest::addColumn<QString>("types");
+        QTest::newRow("3 persons 07:00-16:30, 30 min") << QStringList{"3|Maurer|7|16:30|30"} << ""
+                                                       << "27" << 3 << "Maurer";
+        QTest::newRow("over midnight") << QStringList{"1|Polier|22:00|6|"} << ""
+                                       << "8" << 1 << "Polier";
+        QTest::newRow("same time twice") << QStringList{"2||8|8|"} << ""
+                                         << "0" << 2 << "";
+        QTest::newRow("no times") << QStringList{"2|Helfer|||", "1|Helfer|||"} << ""
+                                  << "NULL" << 3 << "Helfer";
+        QTest::newRow("types united")
+            << QStringList{"1|Maurer|||", "1|Helfer|||", "1|Maurer|||", "1||||"} << ""
+            << "NULL" << 4 << "Maurer, Helfer";
+        QTest::newRow("typed hours clear the times") << QStringList{"2|Maurer|7|9|"} << "5"
+                                                     << "5" << 2 << "Maurer";
+    }
+
+    void timeRecording()
+    {
+        QFETCH(QStringList, rows);
+        QFETCH(QString, typedHours);
+        QFETCH(QString, manHours);
+        QFETCH(int, persons);
+        QFETCH(QString, types);
+        QVERIFY(m_doc->appendEntryWorkforce(kEntry));
+        M* workforce = m_doc->modelEntryWorkforce(kEntry);
+        const int workforceId = workforce->data(0, QStringLiteral("id"), Qt::EditRole).toInt();
+        VDRTimeRecordingWidget dialog;
+        dialog.setDocument(m_doc.get());
+        dialog.setEntryID(kEntry);
+        dialog.setWorkforceID(workforceId);
+        QVERIFY(dialog.prepare());
+        dialog.show();
+        QVERIFY(QTest::qWaitForWindowExposed(&dialog));
+        VDRTableView* view = dialog.view();
+        const QStringList fields = {"person_count", "person_type", "time_from", "time_to", "breaks"};
+        for (int row = 0; row < rows.size(); ++row) {
+            dialog.slot_addButtonClicked();
+            const QStringList values = rows.at(row).split(QLatin1Char('|'));
+            for (int i = 0; i < fields.size(); ++i) {
+                if (!values.at(i).isEmpty())
+                    typeIntoCell(view, row, fields.at(i), values.at(i));
+            }
+        }
+        if (!typedHours.isEmpty())
+            typeIntoCell(view, 0, QStringLiteral("hours"), typedHours);
+        M* times = m_doc->modelEntryTimeRecording(kEntry);
+        if (!typedHours.isEmpty())
+            QCOMPARE(valueText(times->data(0, QStringLiteral("time_from"), Qt::EditRole)),
+                     QStringLiteral("NULL"));
+        QCOMPARE(dialog.totalField()->text(), manHours == QLatin1String("NULL")
+                                                  ? QString()
+                                                  : QLocale().toString(manHours.toDouble(), 'f', 2));
+        dialog.accept();
+        dialog.writeWorkforceRow();
+        QCOMPARE(valueText(workforce->data(0, QStringLiteral("man_hours"), Qt::EditRole)), manHours);
+        QCOMPARE(workforce->data(0, QStringLiteral("person_count"), Qt::EditRole).toInt(), persons);
+        QCOMPARE(workforce->data(0, QStringLiteral("person_type"), Qt::EditRole).toString(), types);
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(QStringLiteral("SELECT count(*) FROM entry_time_recording")));
+        QVERIFY(q.next());
+        QCOMPARE(q.value(0).toInt(), rows.size());
+    }
+
+    // Cancel with changes asks; Abort keeps the dialog, OK discards the rows.
+    void timeRecordingCancel()
+    {
+        QVERIFY(m_doc->appendEntryWorkforce(kEntry));
+        VDRTimeRecordingWidget dialog;
+        dialog.setDocument(m_doc.get());
+        dialog.setEntryID(kEntry);
+        dialog.setWorkforceID(
+            m_doc->modelEntryWorkforce(kEntry)->data(0, QStringLiteral("id"), Qt::EditRole).toInt());
+        QVERIFY(dialog.prepare());
+        dialog.show();
+        dialog.slot_addButtonClicked();
+        QCOMPARE(dialog.view()->model()->rowCount(), 1);
+        m_prompt.expect(QStringLiteral("Änderungen verwerfen"), QString(), VDRPrompt::Abort);
+        dialog.reject();
+        QVERIFY(dialog.isVisible());
+        m_prompt.expect(QStringLiteral("Änderungen verwerfen"), QString(), VDRPrompt::Ok);
+        dialog.reject();
+        QVERIFY(!dialog.isVisible());
+        QCOMPARE(dialog.view()->model()->rowCount(), 0);
+    }
+
+    // The picker snaps the minute to the nearest five; 58 and 59 check no minute.
+    void timePicker_data()
+    {
+        QTest::addColumn<int>("minute");
+        QTest::addColumn<int>("checked");
+        QTest::newRow("2") << 2 << 0;
+        QTest::newRow("3") << 3 << 5;
+        QTest::newRow("57") << 57 << 55;
+        QTest::newRow("58") << 58 << -1;
+    }
+
+    void timePicker()
+    {
+        QFETCH(int, minute);
+        QFETCH(int, checked);
+        VDRTimePickerWidget picker;
+        picker.setTime(QTime(9, minute));
+        picker.show();
+        QVERIFY(picker.hourButton(9)->isChecked());
+        for (int m = 0; m < 60; m += 5)
+            QCOMPARE(picker.minuteButton(m)->isChecked(), m == checked);
+        QSignalSpy ok(&picker, &VDRTimePickerWidget::okClicked);
+        QTest::mouseClick(picker.hourButton(14), Qt::LeftButton);
+        QTest::mouseClick(picker.minuteButton(35), Qt::LeftButton);
+        QCOMPARE(ok.count(), 1);
+        QCOMPARE(ok.at(0).at(0).toTime(), QTime(14, 35));
+        QVERIFY(!picker.isVisible());
+    }
+
+private:
+    // Shows a view on the report's model with 'rows' rows whose first text column reads A, B, C...
+    M* showTable(M::TABLE_NAMES table, int rows)
+    {
+        M* model = m_doc->modelEntry(kEntry, table);
+        fill(model, rows, QStringLiteral("A"));
+        m_view = std::make_unique<DropView>();
+        m_view->setModel(model);
+        m_view->resize(800, 400);
+        m_view->show();
+        QApplication::setActiveWindow(m_view.get());
+        if (!QTest::qWaitForWindowExposed(m_view.get()))
+            qWarning("view not exposed");
+        return model;
+    }
+
+    void fill(M* model, int rows, const QString& first)
+    {
+        for (int i = 0; i < rows; ++i) {
+            const QString text(QChar(first.at(0).unicode() + i));
+            bool ok = false;
+            switch (model->tableNameId()) {
+            case M::TN_PHOTO_PROGRESS:
+                ok = m_doc->appendEntryPhoto1(kEntry, QDate::currentDate(), text, 0);
+                break;
+            case M::TN_TIME_RECORDING:
+                ok = m_doc->appendEntryTimeRecording(kEntry, 1);
+                break;
+            case M::TN_ATTENDEE:
+                ok = m_doc->appendEntryAttendee(kEntry);
+                break;
+            case M::TN_WORKFORCE:
+                ok = m_doc->appendEntryWorkforce(kEntry);
+                break;
+            case M::TN_DELAY:
+                ok = m_doc->appendEntryDelay(kEntry);
+                break;
+            case M::TN_OBSTRUCTION:
+                ok = m_doc->appendEntryObstruction(kEntry);
+                break;
+            case M::TN_DEFICIENCY:
+                ok = m_doc->appendEntryDfcy(kEntry);
+                break;
+            case M::TN_CONSTRUCTION_MATERIAL:
+                ok = m_doc->appendEntryConstructionmaterial(kEntry);
+                break;
+            case M::TN_TELEPHONE_NOTICE:
+                ok = m_doc->appendEntryTelephoneNotice(kEntry);
+                break;
+            case M::TN_CONCERN:
+                ok = m_doc->appendEntryConcern(kEntry);
+                break;
+            case M::TN_EQUIPMENT:
+                ok = m_doc->appendEntryEquipment(kEntry);
+                break;
+            default:
+                break;
+            }
+            if (model->fieldIndex(QStringLiteral("description")) >= 0)
+                model->setData(model->rowCount() - 1, QStringLiteral("description"), text);
+            QVERIFY(ok);
+        }
+        QVERIFY2(model->submitAll(), qPrintable(model->lastError().text()));
+    }
+
+    // "text|pos" per row, in the model's order.
+    QStringList positions(M* model)
+    {
+        model->fetch_all();
+        const QString field = model->fieldIndex(QStringLiteral("caption")) >= 0
+                                  ? QStringLiteral("caption")
+                                  : QStringLiteral("description");
+        QStringList result;
+        for (int row = 0; row < model->rowCount(); ++row)
+            result << model->data(row, field, Qt::EditRole).toString() + QLatin1Char('|') +
+                          model->data(row, QStringLiteral("pos"), Qt::EditRole).toString();
+        return result;
+    }
+
+    // Drops rows of 'source' below the last row of 'view', as a drag would.
+    bool drop(VDRTableView* view, M* source, const QList<int>& rows)
+    {
+        QModelIndexList indexes;
+        for (int row : rows)
+            indexes << source->index(row, 0);
+        std::unique_ptr<QMimeData> data(source->mimeData(indexes));
+        const int last = view->model()->rowCount() - 1;
+        const QPoint below(5, last < 0 ? 5 : view->rowViewportPosition(last) + view->rowHeight(last) + 5);
+        QDropEvent event(below, Qt::MoveAction, data.get(), Qt::LeftButton, Qt::NoModifier);
+        // Delivered the way the view's viewport passes it on; a synthetic drop never reaches it
+        // through the application, which only takes drops from a running drag.
+        static_cast<DropView*>(view)->dropEvent(&event);
+        return event.isAccepted();
+    }
+
+    QTemporaryDir m_tmp;
+    VDRTestPrompt m_prompt;
+    std::unique_ptr<VDRDocument> m_doc;
+    std::unique_ptr<VDRTableView> m_view;
+    int m_companyId = 0;
+};
+
+QTEST_MAIN(TestVDRTableView)
+#include "tst_vdrtableview.moc"
