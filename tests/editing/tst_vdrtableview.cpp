@@ -521,6 +521,7 @@ private slots:
         m_prompt.expect(QStringLiteral("Eintrag entfernen"), QString(), VDRPrompt::Yes);
         QTest::mouseClick(m_view->buttonDelete(), Qt::LeftButton);
         QCOMPARE(removed.count(), 1);
+        QVERIFY(m_view->isRowHidden(0));
         QVERIFY(model->submitAll());
         expected.replaceInStrings(QStringLiteral("OTHER"), QString::number(otherId));
         QStringList rows;
