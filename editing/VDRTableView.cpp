@@ -217,10 +217,8 @@ void VDRTableView::resizeColumns()
     if (!model())
         return;
     updateHint();
+    // The viewport already leaves out the vertical header and the scroll bar.
     int available = viewport()->width();
-    if (verticalScrollBar()->isVisible() && verticalScrollBarPolicy() != Qt::ScrollBarAlwaysOff &&
-        viewport()->width() == width() - frameWidth() * 2)
-        available -= verticalScrollBar()->width();
     const int minimum = horizontalHeader()->minimumSectionSize();
     for (int column = 0; column < model()->columnCount(); ++column) {
         if (isColumnHidden(column))
