@@ -4,9 +4,12 @@
 #include "document/VDRDocument.h"
 #include "editing/VDRCompanyDialog.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDRIntModel.h"
 #include "editing/VDRItemDelegate.h"
 #include "editing/VDRTableView.h"
 #include "editing/VDRTableViewDialog.h"
+#include "editing/VDRTextEditComboBox.h"
+#include "editing/VDRTextEditComboBoxListView.h"
 #include "editing/VDRTimePickerWidget.h"
 #include "editing/VDRTimeRecordingWidget.h"
 #include "editing/VdEvent.h"
@@ -404,6 +407,37 @@ private slots:
         m_view->buttonDelete()->click();
         QCOMPARE(queryTexts(documents, QStringLiteral("SELECT documentname, status FROM documents")),
                  QStringList{"plan.pdf|3"});
+    }
+
+    // Assigning a photo to a deficiency counts the deficiency's photos, old and new.
+    void photoRelation()
+    {
+        M* deficiencies = m_doc->modelEntryDfcy(kEntry);
+        fill(deficiencies, 2, QStringLiteral("A"));
+        M* photos = showTable(M::TN_PHOTO_DEFICIENCY, 0);
+        QVERIFY(m_doc->appendEntryPhoto2(kEntry, QDate::currentDate(), QStringLiteral("Bild"), 0));
+        const QModelIndex index = photos->index(0, QStringLiteral("relation_id"));
+        const auto pick = [&](int row) {
+            m_view->setCurrentIndex(index);
+            QTest::keyClick(m_view.get(), Qt::Key_F2);
+            auto* picker = qobject_cast<VDRTextEditComboBox*>(m_view->indexWidget(index));
+            QVERIFY(picker);
+            picker->showList();
+            picker->listView()->setCurrentIndex(picker->model()->index(row));
+            QTest::keyClick(picker->listView(), Qt::Key_Return);
+            QTRY_VERIFY(!m_view->indexWidget(index));
+        };
+        const auto counts = [&] {
+            return QStringList{valueText(deficiencies->data(0, QStringLiteral("image_cnt"), Qt::EditRole)),
+                               valueText(deficiencies->data(1, QStringLiteral("image_cnt"), Qt::EditRole))};
+        };
+        pick(1);
+        QCOMPARE(photos->data(0, QStringLiteral("relation_id"), Qt::EditRole),
+                 deficiencies->data(1, QStringLiteral("id"), Qt::EditRole));
+        QCOMPARE(counts(), QStringList({"0", "1"}));
+        QCOMPARE(m_view->vdrDelegate()->cellText(index), QStringLiteral("B"));
+        pick(0);
+        QCOMPARE(counts(), QStringList({"1", "0"}));
     }
 
     // A megabyte pasted into a cell is stored (or cut by a one-line field) and drawn without a freeze.
