@@ -730,6 +730,7 @@ private slots:
                                                   ? QString()
                                                   : QLocale().toString(manHours.toDouble(), 'f', 2));
         dialog.accept();
+        QCOMPARE(QSettings().value(VDRTimeRecordingWidget::ColumnsSettingsKey).toList().size(), 6);
         dialog.writeWorkforceRow();
         QCOMPARE(valueText(workforce->data(0, QStringLiteral("man_hours"), Qt::EditRole)), manHours);
         QCOMPARE(workforce->data(0, QStringLiteral("person_count"), Qt::EditRole).toInt(), persons);
