@@ -8,6 +8,7 @@
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDRItemDelegate.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
@@ -789,6 +790,7 @@ void VDRMainWindow::on_actionNumberOfBackups_triggered()
 void VDRMainWindow::setSpellChecker(VDRSpellChecker* checker)
 {
     m_spellChecker = checker;
+    VDRItemDelegate::setSpellChecker(checker);
     QAction* action = m_ui.action(QStringLiteral("actionStartSpellChecking"));
     action->setEnabled(checker && checker->isValid());
     action->setText(checker && checker->isActive() ? tr("Rechtschreibprüfung aus")

@@ -114,6 +114,8 @@ bool VDRSqlTableModel::insertRow(int row, const QHash<QString, QVariant>& values
         if (!setData(row, it.key(), it.value()))
             qWarning().noquote() << "setData failed:" << sqlTableName(m_tableName) << it.key();
     }
+    // The views show the new row.
+    emit setItemFocus(QSqlTableModel::index(row, 0));
     return true;
 }
 

@@ -34,6 +34,8 @@ public:
     static QString check_text(const QString& text);
     // Minutes as "h:mm", negative values as "-h:mm"; empty for null.
     static QString formatMinutes(const QVariant& minutes);
+    // The text a cell shows.
+    QString cellText(const QModelIndex& index) const;
 
     QWidget* createEditor(QWidget* parent, const QStyleOptionViewItem& option,
                           const QModelIndex& index) const override;
@@ -61,7 +63,6 @@ private:
     bool checkDfcyDescription(VDRSqlTableModel* model, const QModelIndex& index, const QString& text) const;
     void writeEquipmentTime(VDRSqlTableModel* model, const QModelIndex& index, const QTime& time) const;
     void writePhotoRelation(VDRSqlTableModel* model, const QModelIndex& index, int deficiencyId) const;
-    QString cellText(const QModelIndex& index) const;
 
     int m_regIdx;
     bool m_enabled = true;

@@ -98,6 +98,8 @@ void VDRTableView::setModel(QAbstractItemModel* model)
         connect(model, &QAbstractItemModel::rowsRemoved, this, &VDRTableView::updateHint);
         connect(model, &QAbstractItemModel::modelReset, this, &VDRTableView::updateHint);
         connect(model, &QAbstractItemModel::layoutChanged, this, &VDRTableView::updateHint);
+        connect(model, &QAbstractItemModel::headerDataChanged, this, &VDRTableView::updateRemovedRows);
+        connect(model, &QAbstractItemModel::modelReset, this, &VDRTableView::updateRemovedRows);
     }
     updateHint();
 }
@@ -142,6 +144,18 @@ void VDRTableView::placeButtons()
         button->move(x, y);
         button->raise();
         x -= 2;
+    }
+}
+
+void VDRTableView::updateRemovedRows()
+{
+    // Removed rows stay in the model, marked, until it is submitted or reverted.
+    if (!model())
+        return;
+    for (int row = 0; row < model()->rowCount(); ++row) {
+        const bool removed = model()->headerData(row, Qt::Vertical).toString() == QLatin1String("!");
+        if (isRowHidden(row) != removed)
+            setRowHidden(row, removed);
     }
 }
 
@@ -203,10 +217,8 @@ void VDRTableView::resizeColumns()
     if (!model())
         return;
     updateHint();
+    // The viewport already leaves out the vertical header and the scroll bar.
     int available = viewport()->width();
-    if (verticalScrollBar()->isVisible() && verticalScrollBarPolicy() != Qt::ScrollBarAlwaysOff &&
-        viewport()->width() == width() - frameWidth() * 2)
-        available -= verticalScrollBar()->width();
     const int minimum = horizontalHeader()->minimumSectionSize();
     for (int column = 0; column < model()->columnCount(); ++column) {
         if (isColumnHidden(column))
@@ -296,7 +308,14 @@ void VDRTableView::slotSetItemFocus(int row, int column)
 {
     if (!model() || row < 0 || row >= model()->rowCount())
         return;
-    const QModelIndex index = model()->index(row, std::max(0, column));
+    // A hidden column (the id, say) gives way to the first shown one.
+    column = std::max(0, column);
+    if (isColumnHidden(column)) {
+        column = 0;
+        while (column < model()->columnCount() - 1 && isColumnHidden(column))
+            ++column;
+    }
+    const QModelIndex index = model()->index(row, column);
     setCurrentIndex(index);
     scrollTo(index);
     setFocus();

@@ -88,6 +88,7 @@ protected:
 
 private slots:
     void updateHint();
+    void updateRemovedRows();
 
 private:
     void placeButtons();

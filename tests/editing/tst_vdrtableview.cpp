@@ -3,8 +3,13 @@
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRCompanyDialog.h"
+#include "editing/VDRCompleter.h"
+#include "editing/VDRIntModel.h"
 #include "editing/VDRItemDelegate.h"
 #include "editing/VDRTableView.h"
+#include "editing/VDRTableViewDialog.h"
+#include "editing/VDRTextEditComboBox.h"
+#include "editing/VDRTextEditComboBoxListView.h"
 #include "editing/VDRTimePickerWidget.h"
 #include "editing/VDRTimeRecordingWidget.h"
 #include "editing/VdEvent.h"
@@ -280,6 +285,161 @@ private slots:
                  expected);
     }
 
+    // What a cell shows for what it holds.
+    void display_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QString>("field");
+        QTest::addColumn<QVariant>("value");
+        QTest::addColumn<QString>("shown");
+        QTest::newRow("duration") << int(M::TN_EQUIPMENT) << "operating_time" << QVariant(480) << "8:00";
+        QTest::newRow("negative duration") << int(M::TN_EQUIPMENT) << "downtime" << QVariant(-65) << "-1:05";
+        QTest::newRow("no images") << int(M::TN_DEFICIENCY) << "image_cnt" << QVariant(0) << "";
+        QTest::newRow("images") << int(M::TN_DEFICIENCY) << "image_cnt" << QVariant(3) << "3";
+        QTest::newRow("date") << int(M::TN_DELAY) << "date" << QVariant(QDate(2015, 2, 1)) << "01.02.2015";
+        QTest::newRow("time") << int(M::TN_TELEPHONE_NOTICE) << "time" << QVariant(QTime(7, 5)) << "07:05";
+        QTest::newRow("company") << int(M::TN_WORKFORCE) << "company_id" << QVariant(-1)
+                                 << "Bau GmbH (Rohbau)";
+        QTest::newRow("company unknown") << int(M::TN_WORKFORCE) << "company_id" << QVariant(999) << "";
+    }
+
+    void display()
+    {
+        QFETCH(int, table);
+        QFETCH(QString, field);
+        QFETCH(QVariant, value);
+        QFETCH(QString, shown);
+        M* model = showTable(M::TABLE_NAMES(table), 1);
+        model->setData(0, field, value.toInt() == -1 ? QVariant(m_companyId) : value);
+        QCOMPARE(m_view->vdrDelegate()->cellText(model->index(0, field)), shown);
+    }
+
+    // Clicks into the workforce totals and the deficiency images open their dialogs instead of an
+    // editor; a double click below the rows adds one.
+    void mouseShortcuts_data()
+    {
+        QTest::addColumn<int>("table");
+        QTest::addColumn<QString>("field");
+        QTest::addColumn<bool>("timeRecording");
+        QTest::newRow("persons") << int(M::TN_WORKFORCE) << "person_count" << true;
+        QTest::newRow("man-hours") << int(M::TN_WORKFORCE) << "man_hours" << true;
+        QTest::newRow("images") << int(M::TN_DEFICIENCY) << "image_cnt" << false;
+    }
+
+    void mouseShortcuts()
+    {
+        QFETCH(int, table);
+        QFETCH(QString, field);
+        QFETCH(bool, timeRecording);
+        M* model = showTable(M::TABLE_NAMES(table), 2);
+        QSignalSpy times(m_view.get(), &VDRTableView::mouseClick4TimeRecording);
+        QSignalSpy images(m_view.get(), &VDRTableView::mouseClick4DeficienyImageDialog);
+        const QModelIndex index = model->index(1, field);
+        QTest::mouseClick(m_view->viewport(), Qt::LeftButton, Qt::NoModifier,
+                          m_view->visualRect(index).center());
+        QSignalSpy& spy = timeRecording ? times : images;
+        QCOMPARE(times.count() + images.count(), 1);
+        QCOMPARE(spy.count(), 1);
+        QCOMPARE(spy.at(0).at(0).toInt(), 1);
+        QCOMPARE(spy.at(0).at(1).toInt(), model->data(1, QStringLiteral("id"), Qt::EditRole).toInt());
+        QCOMPARE(spy.at(0).at(2).toInt(), kEntry);
+        QVERIFY(!m_view->indexWidget(index));
+        QSignalSpy added(m_view.get(), &VDRTableView::signalButtonAddClicked);
+        QTest::mouseDClick(m_view->viewport(), Qt::LeftButton, Qt::NoModifier,
+                           QPoint(5, m_view->viewport()->height() - 5));
+        QCOMPARE(added.count(), 1);
+    }
+
+    // The enlarged table works on the same model, delegate and columns as the small one.
+    void enlargedTable()
+    {
+        M* model = showTable(M::TN_CONCERN, 2);
+        m_view->setAllColumnsHidden();
+        m_view->setColumnHidden(QStringLiteral("description"), false);
+        m_view->setColumnWidth(QStringLiteral("description"), VDRTableView::CWT_PERCENT, 100);
+        VDRTableViewDialog dialog(m_view.get());
+        QCOMPARE(dialog.view()->model(), model);
+        QCOMPARE(dialog.view()->itemDelegate(), m_view->itemDelegate());
+        for (int column = 0; column < model->columnCount(); ++column)
+            QCOMPARE(dialog.view()->isColumnHidden(column), m_view->isColumnHidden(column));
+        QSignalSpy added(m_view.get(), &VDRTableView::signalButtonAddClicked);
+        dialog.view()->buttonAdd()->click();
+        QCOMPARE(added.count(), 1);
+        QVERIFY(dialog.view()->buttonBigview()->isHidden());
+    }
+
+    // A multi-line suggestion field learns its text when the edit is committed.
+    void multiLineLearns()
+    {
+        M* model = showTable(M::TN_CONCERN, 1);
+        typeIntoCell(m_view.get(), 0, QStringLiteral("description"), QStringLiteral("Geruest fehlt"));
+        const int column = model->fieldIndex(QStringLiteral("description"));
+        VDRCompleter list(VDRItemDelegate::registerIndexFor(M::TN_CONCERN), model->objectName(),
+                          M::TN_CONCERN, model->headerData(column, Qt::Horizontal).toString(), column,
+                          nullptr);
+        QVERIFY(list.entries().contains(QStringLiteral("Geruest fehlt")));
+    }
+
+    // A file typed into a document cell is attached; removing the row marks the attachment removed.
+    void documentOfRemovedRow()
+    {
+        const QString diary = m_tmp.filePath(QStringLiteral("documents.vd2"));
+        QVERIFY(createDiary(diary));
+        m_doc = std::make_unique<VDRDocument>();
+        bool showError = true;
+        QVERIFY(m_doc->openDocument(diary, showError));
+        QCOMPARE(queryTexts(diary, QStringLiteral("SELECT id FROM entry")),
+                 QStringList{QString::number(kEntry)});
+        const QString plan = m_tmp.filePath(QStringLiteral("plan.pdf"));
+        QFile file(plan);
+        QVERIFY(file.open(QIODevice::WriteOnly) && file.write("%PDF") == 4);
+        file.close();
+        M* model = showTable(M::TN_CONSTRUCTION_MATERIAL, 1);
+        typeIntoCell(m_view.get(), 0, QStringLiteral("document"), plan);
+        QTRY_COMPARE(model->data(0, QStringLiteral("document"), Qt::EditRole).toString(),
+                     QStringLiteral("plan.pdf"));
+        const QString documents = VDRDocument::documentsDbPathFor(diary);
+        QCOMPARE(queryTexts(documents, QStringLiteral("SELECT documentname, status FROM documents")),
+                 QStringList{"plan.pdf|1"});
+        m_view->setFlagAutodelete(true);
+        m_view->selectRow(0);
+        m_prompt.expect(QStringLiteral("Eintrag entfernen"), QString(), VDRPrompt::Yes);
+        m_view->buttonDelete()->click();
+        QCOMPARE(queryTexts(documents, QStringLiteral("SELECT documentname, status FROM documents")),
+                 QStringList{"plan.pdf|3"});
+    }
+
+    // Assigning a photo to a deficiency counts the deficiency's photos, old and new.
+    void photoRelation()
+    {
+        M* deficiencies = m_doc->modelEntryDfcy(kEntry);
+        fill(deficiencies, 2, QStringLiteral("A"));
+        M* photos = showTable(M::TN_PHOTO_DEFICIENCY, 0);
+        QVERIFY(m_doc->appendEntryPhoto2(kEntry, QDate::currentDate(), QStringLiteral("Bild"), 0));
+        const QModelIndex index = photos->index(0, QStringLiteral("relation_id"));
+        const auto pick = [&](int row) {
+            m_view->setCurrentIndex(index);
+            QTest::keyClick(m_view.get(), Qt::Key_F2);
+            auto* picker = qobject_cast<VDRTextEditComboBox*>(m_view->indexWidget(index));
+            QVERIFY(picker);
+            picker->showList();
+            picker->listView()->setCurrentIndex(picker->model()->index(row));
+            QTest::keyClick(picker->listView(), Qt::Key_Return);
+            QTRY_VERIFY(!m_view->indexWidget(index));
+        };
+        const auto counts = [&] {
+            return QStringList{valueText(deficiencies->data(0, QStringLiteral("image_cnt"), Qt::EditRole)),
+                               valueText(deficiencies->data(1, QStringLiteral("image_cnt"), Qt::EditRole))};
+        };
+        pick(1);
+        QCOMPARE(photos->data(0, QStringLiteral("relation_id"), Qt::EditRole),
+                 deficiencies->data(1, QStringLiteral("id"), Qt::EditRole));
+        QCOMPARE(counts(), QStringList({"0", "1"}));
+        QCOMPARE(m_view->vdrDelegate()->cellText(index), QStringLiteral("B"));
+        pick(0);
+        QCOMPARE(counts(), QStringList({"1", "0"}));
+    }
+
     // A megabyte pasted into a cell is stored (or cut by a one-line field) and drawn without a freeze.
     void hugePaste_data()
     {
@@ -395,6 +555,7 @@ private slots:
         m_prompt.expect(QStringLiteral("Eintrag entfernen"), QString(), VDRPrompt::Yes);
         QTest::mouseClick(m_view->buttonDelete(), Qt::LeftButton);
         QCOMPARE(removed.count(), 1);
+        QVERIFY(m_view->isRowHidden(0));
         QVERIFY(model->submitAll());
         expected.replaceInStrings(QStringLiteral("OTHER"), QString::number(otherId));
         QStringList rows;
@@ -554,16 +715,22 @@ private slots:
                     typeIntoCell(view, row, fields.at(i), values.at(i));
             }
         }
-        if (!typedHours.isEmpty())
-            typeIntoCell(view, 0, QStringLiteral("hours"), typedHours);
         M* times = m_doc->modelEntryTimeRecording(kEntry);
-        if (!typedHours.isEmpty())
+        if (typedHours == QLatin1String("remove")) {
+            view->selectRow(0);
+            m_prompt.expect(QStringLiteral("Eintrag entfernen"), QString(), VDRPrompt::Yes);
+            view->buttonDelete()->click();
+            rows.removeFirst();
+        } else if (!typedHours.isEmpty()) {
+            typeIntoCell(view, 0, QStringLiteral("hours"), typedHours);
             QCOMPARE(valueText(times->data(0, QStringLiteral("time_from"), Qt::EditRole)),
                      QStringLiteral("NULL"));
+        }
         QCOMPARE(dialog.totalField()->text(), manHours == QLatin1String("NULL")
                                                   ? QString()
                                                   : QLocale().toString(manHours.toDouble(), 'f', 2));
         dialog.accept();
+        QCOMPARE(QSettings().value(VDRTimeRecordingWidget::ColumnsSettingsKey).toList().size(), 6);
         dialog.writeWorkforceRow();
         QCOMPARE(valueText(workforce->data(0, QStringLiteral("man_hours"), Qt::EditRole)), manHours);
         QCOMPARE(workforce->data(0, QStringLiteral("person_count"), Qt::EditRole).toInt(), persons);
