@@ -4,6 +4,7 @@
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
+#include "sync/VDRReportSynchronisation.h"
 
 #include <QCoreApplication>
 #include <QDate>
@@ -61,6 +62,11 @@ const char* const kHelp =
     "                      is kept under its ERROR name, which is printed.\n"
     "  compact FILE        Remove unreferenced images, rebuild the database and save; prints the\n"
     "                      size before and after in bytes.\n"
+    "  import FILE EXCHANGE.vdx... [--delete]\n"
+    "                      Import the reports (and newer master data) of the mobile app's exchange\n"
+    "                      files, in the order given, and save the diary. The summary goes to\n"
+    "                      stdout. With --delete, the files that were imported are deleted after\n"
+    "                      the diary was saved; refused files always stay.\n"
     "\n"
     "Options:\n"
     "  --yes               Answer questions with their affirmative default (without it every\n"
@@ -76,6 +82,14 @@ const char* const kHelp =
     "  2  refused or failed (the message on stderr says why)\n"
     "  3  not saved: a question was answered with its cancelling choice (try --yes),\n"
     "     or the file cannot be saved (demo project, no write permission)\n"
+    "\n"
+    "Exit codes of import:\n"
+    "  0  every file imported, diary saved\n"
+    "  1  usage error\n"
+    "  2  the diary could not be opened or saved\n"
+    "  3  not saved: a question was answered with its cancelling choice (try --yes)\n"
+    "  4  some files were refused or not fully imported (the message on stderr says why);\n"
+    "     what was imported is saved\n"
     "\n"
     "Exit codes of restore:\n"
     "  0  restored\n"
@@ -334,6 +348,45 @@ int cmdCheck(const QString& file, bool json)
     return exitCodes[r.status];
 }
 
+int cmdImport(const QString& file, const QStringList& exchangeFiles, bool deleteImported)
+{
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    QStringList paths;
+    for (const QString& path : exchangeFiles)
+        paths << QFileInfo(path).absoluteFilePath();
+    VDRReportSynchronisation sync(&doc);
+    sync.setShowSummary(false);
+    bool projectDataChanged = false;
+    // Files are deleted only once the diary holding their reports is saved.
+    const int failed = sync.importReportExchangeFiles(paths, false, projectDataChanged);
+    out() << sync.lastSummary();
+    out().flush();
+    int result = 0;
+    if (!sync.importedFiles().isEmpty() || doc.isStateModified()) {
+        const int shown = VDRPrompt::messagesShown();
+        result = doc.saveDocument(QString());
+        if (result == 2 && VDRPrompt::messagesShown() == shown)
+            VDRPrompt::critical(QObject::tr("Fehler"),
+                                QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
+    }
+    doc.closeDocument();
+    if (result != 0)
+        return result == 1 ? 3 : ExitRefused;
+    if (deleteImported) {
+        for (const QString& path : sync.importedFiles()) {
+            if (!VDRFileOps::remove(path))
+                VDRPrompt::warning(
+                    QObject::tr("Dateifehler"),
+                    QObject::tr("Die importierte Austauschdatei\n%1\nkonnte nicht gelöscht werden.\n"
+                                "Bitte löschen Sie diese Datei manuell.")
+                        .arg(path));
+        }
+    }
+    return failed > 0 ? 4 : ExitOk;
+}
+
 // The user hears from the program through the prompt; Qt's own log lines are for developers.
 void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QString& message)
 {
@@ -354,11 +407,20 @@ int main(int argc, char* argv[])
     QStringList args = QCoreApplication::arguments().mid(1);
     const bool yes = args.removeAll(QStringLiteral("--yes")) > 0;
     const bool json = args.removeAll(QStringLiteral("--json")) > 0;
+    const bool deleteImported = args.removeAll(QStringLiteral("--delete")) > 0;
     if (args.contains(QStringLiteral("-h")) || args.contains(QStringLiteral("--help"))) {
         std::fputs(kHelp, stdout);
         return ExitOk;
     }
-    if (args.size() != 2 || args[1].startsWith(QLatin1String("--"))) {
+    // Commands that take more than one file.
+    const QString first = args.value(0);
+    const bool manyFiles = first == QLatin1String("import") && args.size() >= 3;
+    const bool twoFiles =
+        (first == QLatin1String("export-masterdata") || first == QLatin1String("follow-up")) &&
+        args.size() == 3;
+    const auto isOption = [](const QString& a) { return a.startsWith(QLatin1String("--")); };
+    if ((args.size() != 2 && !manyFiles && !twoFiles) ||
+        std::any_of(args.begin() + 1, args.end(), isOption)) {
         err(QStringLiteral("varduna-cli: expected COMMAND FILE; see varduna-cli --help"));
         return ExitUsage;
     }
@@ -381,6 +443,8 @@ int main(int argc, char* argv[])
         result = cmdRestore(file);
     else if (command == QLatin1String("compact"))
         result = cmdCompact(file);
+    else if (command == QLatin1String("import") && manyFiles)
+        result = cmdImport(file, args.mid(2), deleteImported);
     else {
         err(QStringLiteral("varduna-cli: unknown command '%1'; see varduna-cli --help").arg(command));
         result = ExitUsage;

@@ -1,0 +1,584 @@
+#include "VDRExchangeFileBuilder.h"
+#include "VDRTestFixtures.h"
+#include "VDRTestPrompt.h"
+#include "document/VDRAllEntryTableModel.h"
+#include "document/VDRDocument.h"
+#include "sync/VDRReportSynchronisation.h"
+
+#include <QColor>
+#include <QProcess>
+#include <QSqlError>
+#include <QSqlQuery>
+#include <QSqlRecord>
+#include <QtTest>
+
+#include <memory>
+
+using namespace VDRTestFixtures;
+
+namespace {
+const QDateTime kT1(QDate(2026, 3, 7), QTime(16, 5, 9));
+const QDateTime kT2(QDate(2026, 3, 7), QTime(16, 5, 10));
+const QDateTime kCreated(QDate(2026, 3, 1), QTime(7, 30, 0));
+const QString kSync = QStringLiteral("Synchronisationsfehler");
+const QString kDbError = QStringLiteral("Datenbankfehler");
+const QString kNotice = QStringLiteral("Cloud Synchronisation");
+} // namespace
+
+class TestVDRReportSync : public QObject
+{
+    Q_OBJECT
+
+private slots:
+    void initTestCase();
+    void init();
+    void cleanup();
+
+    void newReportWithAllLists();
+    void replacing_data();
+    void replacing();
+    void refusedFiles_data();
+    void refusedFiles();
+    void untrustedRows_data();
+    void untrustedRows();
+    void failureLeavesDiaryAsBefore_data();
+    void failureLeavesDiaryAsBefore();
+    void renumbering_data();
+    void renumbering();
+    void cloudFolder();
+    void commandLine();
+
+private:
+    QString exchangePath(const QDateTime& stamp = kT1) const;
+    // A file with one report numbered 'number', created on the app at kCreated, with every list.
+    void writeFullFile(const QString& path, const QDateTime& version,
+                       const QString& progress = QStringLiteral("Rohbau"));
+    // Imports files as a cloud run would (summary not shown) and returns the summary.
+    QString import(const QStringList& paths, const std::function<void()>& expectations = nullptr);
+    QStringList rows(const QString& sql);
+    QVariant value(const QString& sql);
+    // Every row of every table of the working copy, with the structure: equal dumps, equal diaries.
+    QStringList dump();
+
+    QTemporaryDir m_tmp;
+    QString m_dir;
+    QString m_diary;
+    VDRTestPrompt m_prompt;
+    std::unique_ptr<VDRDocument> m_doc;
+    int m_case = 0;
+};
+
+void TestVDRReportSync::initTestCase()
+{
+    QVERIFY(m_tmp.isValid());
+    isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
+    qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
+}
+
+void TestVDRReportSync::init()
+{
+    m_prompt.reset();
+    m_dir = m_tmp.filePath(QStringLiteral("case%1").arg(++m_case));
+    QVERIFY(QDir().mkpath(m_dir));
+    m_diary = m_dir + QStringLiteral("/Baustelle.vd2");
+    QVERIFY(createDiary(m_diary));
+    m_doc = std::make_unique<VDRDocument>();
+    bool showError = true;
+    QVERIFY(m_doc->openDocument(m_diary, showError));
+    // Start without reports: the app's reports are the only ones unless a test adds some.
+    QVERIFY(QSqlQuery(m_doc->database()).exec(QStringLiteral("DELETE FROM entry")));
+    m_doc->modelEntryAll()->select();
+}
+
+void TestVDRReportSync::cleanup()
+{
+    m_doc.reset();
+    VDR_VERIFY_PROMPT(m_prompt);
+}
+
+QString TestVDRReportSync::exchangePath(const QDateTime& stamp) const
+{
+    return m_dir + QStringLiteral("/Baustelle.") + stamp.toString(QStringLiteral("yyyy-MM-ddThh-mm-ss")) +
+           QStringLiteral(".vdx");
+}
+
+void TestVDRReportSync::writeFullFile(const QString& path, const QDateTime& version, const QString& progress)
+{
+    VDRExchangeFileBuilder file(path, QStringLiteral("Baustelle.vd2"), version);
+    QVERIFY(file.isOk());
+    const int entry = file.addReport(QStringLiteral("001 (Entwurf)"), QDate(2026, 3, 7), kCreated,
+                                     {{"progress", progress}, {"notice", QVariant()}});
+    QVERIFY(entry > 0);
+    QVERIFY(file.addFullReportContent(entry));
+}
+
+QString TestVDRReportSync::import(const QStringList& paths, const std::function<void()>& expectations)
+{
+    VDRReportSynchronisation sync(m_doc.get());
+    sync.setShowSummary(false);
+    bool projectChanged = false;
+    m_prompt.expect(kNotice);
+    if (expectations)
+        expectations();
+    sync.importReportExchangeFiles(paths, false, projectChanged);
+    return sync.lastSummary();
+}
+
+QStringList TestVDRReportSync::rows(const QString& sql)
+{
+    QStringList result;
+    QSqlQuery q(m_doc->database());
+    if (!q.exec(sql))
+        return {QStringLiteral("ERROR ") + q.lastError().text()};
+    while (q.next()) {
+        QStringList values;
+        for (int i = 0; i < q.record().count(); ++i)
+            values << (q.value(i).isNull() ? QStringLiteral("NULL") : q.value(i).toString());
+        result << values.join(QLatin1Char('|'));
+    }
+    return result;
+}
+
+QVariant TestVDRReportSync::value(const QString& sql)
+{
+    QSqlQuery q(m_doc->database());
+    return q.exec(sql) && q.next() ? q.value(0) : QVariant();
+}
+
+QStringList TestVDRReportSync::dump()
+{
+    QStringList result = rows(QStringLiteral("SELECT type, name, sql FROM sqlite_master ORDER BY name"));
+    for (const QString& table :
+         rows(QStringLiteral("SELECT name FROM sqlite_master WHERE type = 'table' ORDER BY name"))) {
+        for (const QString& row : rows(QStringLiteral("SELECT * FROM \"%1\" ORDER BY rowid").arg(table)))
+            result << table + QLatin1Char(':') + row;
+    }
+    return result;
+}
+
+// A report with every list, photos and a dictation arrives under new ids with consistent references,
+// and the exchange file is left exactly as it was.
+void TestVDRReportSync::newReportWithAllLists()
+{
+    const QString path = exchangePath();
+    writeFullFile(path, kT1);
+    const QByteArray before = fileHash(path);
+    const QString summary = import({path});
+    QVERIFY2(summary.contains(QStringLiteral("Folgende Bauberichte wurden erfolgreich importiert:\n\nBericht "
+                                             "001 (Entwurf)-AB als Bericht 001 (Entwurf)-AB \n\n")),
+             qPrintable(summary));
+    QCOMPARE(fileHash(path), before);
+
+    QCOMPARE(rows(QStringLiteral("SELECT count(*) FROM entry")), QStringList{QStringLiteral("1")});
+    const int id = value(QStringLiteral("SELECT id FROM entry")).toInt();
+    QVERIFY(id > 0 && id < 700);
+    QCOMPARE(rows(QStringLiteral(
+                 "SELECT number, user_id, exported_by_app, import_version, notice, progress FROM entry")),
+             QStringList{QStringLiteral("001 (Entwurf)|AB|0|2026-03-07T16:05:09||Rohbau")});
+    QCOMPARE(value(QStringLiteral("SELECT entrycounter FROM vdr WHERE id = 1")).toInt(), id);
+    // Every list, each row under a new id of the diary's counters.
+    const QString counts = QStringLiteral(
+        "SELECT (SELECT count(*) FROM entry_attendee), (SELECT count(*) FROM entry_workforce), "
+        "(SELECT count(*) FROM entry_time_recording), (SELECT group_concat(type) FROM (SELECT type FROM "
+        "entry_progress "
+        "ORDER BY type)), (SELECT group_concat(type) FROM (SELECT type FROM entry_photo ORDER BY type)), "
+        "(SELECT group_concat(type) FROM (SELECT type FROM entry_task ORDER BY type)), "
+        "(SELECT count(*) FROM entry_constructionmeasure), (SELECT count(*) FROM "
+        "entry_constructionmaterial), "
+        "(SELECT count(*) FROM entry_scheduleddelivery), (SELECT count(*) FROM entry_telephone_notice), "
+        "(SELECT count(*) FROM entry_concern), (SELECT count(*) FROM entry_equipment), (SELECT count(*) FROM "
+        "image), "
+        "(SELECT count(*) FROM audio)");
+    QCOMPARE(rows(counts), QStringList{QStringLiteral("1|1|1|1,2,3,4|1,2,5|1,2|1|1|1|1|1|1|2|1")});
+    QCOMPARE(
+        value(QStringLiteral("SELECT count(*) FROM entry_attendee WHERE id >= 700 OR entry_id <> %1").arg(id))
+            .toInt(),
+        0);
+    // References point at the new rows.
+    QCOMPARE(value(QStringLiteral("SELECT count(*) FROM entry_time_recording t JOIN entry_workforce w ON "
+                                  "w.id = t.workforce_id WHERE t.time_from = '07:00:00.000'"))
+                 .toInt(),
+             1);
+    QCOMPARE(value(QStringLiteral(
+                       "SELECT count(*) FROM entry_photo p JOIN entry_progress d ON d.id = p.relation_id "
+                       "WHERE d.type = 4 AND p.type = 2"))
+                 .toInt(),
+             1);
+    QCOMPARE(
+        value(QStringLiteral("SELECT count(*) FROM entry_photo p JOIN image i ON i.id = p.photo_image_id"))
+            .toInt(),
+        3);
+    QCOMPARE(value(QStringLiteral("SELECT i.image FROM entry_photo p JOIN image i ON i.id = p.photo_image_id "
+                                  "WHERE p.caption = 'Riss'"))
+                 .toByteArray(),
+             VDRExchangeFileBuilder::jpeg(Qt::green));
+    QCOMPARE(
+        value(QStringLiteral("SELECT a.recording FROM entry e JOIN audio a ON a.id = e.progress_audio_id"))
+            .toByteArray(),
+        QByteArray("RIFF-audio"));
+    // Values keep their types: a real stays a real, a time is a time of the diary's form.
+    QCOMPARE(rows(QStringLiteral("SELECT typeof(quantity), quantity, unit FROM entry_constructionmaterial")),
+             QStringList{QStringLiteral("real|12.5|m3")});
+    QCOMPARE(rows(QStringLiteral("SELECT typeof(operating_time), entry_time, location FROM entry_equipment, "
+                                 "entry_constructionmeasure")),
+             QStringList{QStringLiteral("integer|NULL|Achse 4")});
+    // The report list shows it.
+    QCOMPARE(m_doc->modelEntryAll()->rowCount(), 1);
+}
+
+// The same file twice, a later edit on the app, a report the desktop locked meanwhile, an older file.
+void TestVDRReportSync::replacing_data()
+{
+    QTest::addColumn<QString>("second");
+    QTest::addColumn<QString>("section");
+    QTest::addColumn<QString>("progress");
+    QTest::newRow("same file twice") << "same"
+                                     << "erfolgreich importiert"
+                                     << "Rohbau";
+    QTest::newRow("edited on the app") << "edited"
+                                       << "erfolgreich importiert"
+                                       << "Dach";
+    QTest::newRow("locked on the desktop") << "locked"
+                                           << "da der Baubericht abgeschlossen ist"
+                                           << "Rohbau";
+    QTest::newRow("older file") << "older"
+                                << "bereits eine aktuellere Version"
+                                << "Rohbau";
+}
+
+void TestVDRReportSync::replacing()
+{
+    QFETCH(QString, second);
+    QFETCH(QString, section);
+    QFETCH(QString, progress);
+    const QDateTime first = second == QLatin1String("older") ? kT2 : kT1;
+    const QString path1 = exchangePath(first);
+    writeFullFile(path1, first);
+    import({path1});
+    const int id = value(QStringLiteral("SELECT id FROM entry")).toInt();
+    // The diary numbers the report on its own meanwhile.
+    QVERIFY(QSqlQuery(m_doc->database()).exec(QStringLiteral("UPDATE entry SET number = '007 (Entwurf)'")));
+    if (second == QLatin1String("locked")) {
+        m_doc->modelEntryAll()->select();
+        QVERIFY(m_doc->lockEntry(0, true));
+    }
+    const QStringList before = dump();
+
+    const QDateTime later = second == QLatin1String("same")    ? kT1
+                            : second == QLatin1String("older") ? kT1
+                                                               : kT2;
+    const QString path2 = second == QLatin1String("same") ? path1 : exchangePath(later);
+    if (path2 != path1)
+        writeFullFile(path2, later,
+                      second == QLatin1String("edited") ? QStringLiteral("Dach") : QStringLiteral("Rohbau"));
+    const QString summary = import({path2});
+    QVERIFY2(summary.contains(section), qPrintable(summary));
+
+    QCOMPARE(value(QStringLiteral("SELECT count(*) FROM entry")).toInt(), 1);
+    QCOMPARE(value(QStringLiteral("SELECT id FROM entry")).toInt(), id);
+    QCOMPARE(value(QStringLiteral("SELECT progress FROM entry")).toString(), progress);
+    QVERIFY(value(QStringLiteral("SELECT number FROM entry")).toString().startsWith(QLatin1String("007")));
+    if (section.contains(QLatin1String("erfolgreich"))) {
+        QVERIFY2(summary.contains(QStringLiteral("als Bericht 007-AB")), qPrintable(summary));
+        // No duplicates, and the replaced report's pictures and dictation are gone.
+        QCOMPARE(
+            rows(QStringLiteral("SELECT (SELECT count(*) FROM entry_photo), (SELECT count(*) FROM image), "
+                                "(SELECT count(*) FROM audio), (SELECT count(*) FROM entry_workforce)")),
+            QStringList{QStringLiteral("3|2|1|1")});
+    } else {
+        QCOMPARE(dump(), before);
+    }
+}
+
+// Files refused as a whole: nothing of them arrives, and the file stays as it was.
+void TestVDRReportSync::refusedFiles_data()
+{
+    QTest::addColumn<QString>("change");
+    QTest::addColumn<QString>("title");
+    QTest::addColumn<QString>("text");
+    QTest::newRow("version 0.1") << "fileversion=0.1" << kSync << "mit einer älteren Version";
+    QTest::newRow("version 1.0") << "fileversion=1.0" << kSync << "ein Update der Varduna Software";
+    QTest::newRow("version 0.10") << "fileversion=0.10" << kSync << "ein Update der Varduna Software";
+    QTest::newRow("version missing") << "fileversion=" << kSync << "keine gültige Austauschdatei";
+    QTest::newRow("version text") << "fileversion=zwei" << kSync << "keine gültige Austauschdatei";
+    QTest::newRow("renamed diary") << "database=Altname.vd2" << kSync
+                                   << "nur in das Varduna Altname.vd2 importiert";
+    QTest::newRow("database missing") << "database=" << kSync << "keine gültige Austauschdatei";
+    QTest::newRow("no creation date")
+        << "creationDateTime=" << kSync << "Das Erstelldatum der Austauschdatei fehlt";
+    QTest::newRow("bad creation date") << "creationDateTime=2026-02-30T10:00:00" << kSync << "Erstelldatum";
+    QTest::newRow("missing table") << "sql=DROP TABLE entry_concern" << kSync
+                                   << "Die Tabelle 'entry_concern' fehlt";
+    QTest::newRow("missing column") << "sql=ALTER TABLE entry_equipment RENAME COLUMN downtime TO pause"
+                                    << kSync << "Die Spalte 'downtime' der Tabelle 'entry_equipment' fehlt";
+    QTest::newRow("not SQLite") << "garbage" << kDbError << "Fehler beim Öffnen der Datei";
+    QTest::newRow("missing file") << "missing" << kDbError << "Fehler beim Öffnen der Datei";
+}
+
+void TestVDRReportSync::refusedFiles()
+{
+    QFETCH(QString, change);
+    QFETCH(QString, title);
+    QFETCH(QString, text);
+    const QString path = exchangePath();
+    writeFullFile(path, kT1);
+    {
+        const QString key = change.section(QLatin1Char('='), 0, 0);
+        const QString val = change.section(QLatin1Char('='), 1);
+        if (key == QLatin1String("sql")) {
+            QVERIFY(execSql(path, {val}));
+        } else if (change == QLatin1String("garbage")) {
+            QFile f(path);
+            QVERIFY(f.open(QIODevice::WriteOnly));
+            f.write(QByteArray(4096, 'x'));
+        } else if (change == QLatin1String("missing")) {
+            QVERIFY(QFile::remove(path));
+        } else {
+            QVERIFY(execSql(
+                path, {val.isEmpty()
+                           ? QStringLiteral("DELETE FROM meta WHERE key = '%1'").arg(key)
+                           : QStringLiteral("UPDATE meta SET value = '%1' WHERE key = '%2'").arg(val, key)}));
+        }
+    }
+    const QByteArray hash = fileHash(path);
+    const QStringList before = dump();
+    const QString summary = import({path}, [&]() {
+        m_prompt.expect(title, text);
+        if (title == kDbError)
+            m_prompt.expect(kSync, QStringLiteral("wurde die Synchronisation abgebrochen"));
+    });
+    QVERIFY2(summary.contains(QStringLiteral("nicht oder nur teilweise importiert:\n\n") + path),
+             qPrintable(summary));
+    QCOMPARE(dump(), before);
+    QCOMPARE(fileHash(path), hash);
+    QVERIFY(!QSqlDatabase::contains(VDRReportSynchronisation::connectionName()));
+}
+
+// Rows the app should never send: the report goes whole or not at all, with a clear message.
+void TestVDRReportSync::untrustedRows_data()
+{
+    QTest::addColumn<QString>("sql");
+    QTest::addColumn<QString>("text"); // empty: imported without a message
+    QTest::addColumn<QString>("check");
+    QTest::addColumn<QString>("expected");
+    QTest::newRow("photo type 6, progress type 5")
+        << "UPDATE entry_photo SET type = 6 WHERE caption = 'Beton';; "
+           "UPDATE entry_progress SET type = 5 WHERE type = 3"
+        << ""
+        << "SELECT (SELECT group_concat(type) FROM entry_photo), (SELECT "
+           "count(*) FROM entry_progress), (SELECT count(*) FROM image)"
+        << "1,2|3|2";
+    QTest::newRow("image pointing nowhere")
+        << "UPDATE entry_photo SET photo_image_id = 9999 WHERE caption = 'Rohbau'"
+        << ""
+        << "SELECT photo_image_id FROM entry_photo WHERE caption = 'Rohbau'"
+        << "0";
+    QTest::newRow("relation pointing nowhere") << "UPDATE entry_photo SET relation_id = 9999"
+                                               << ""
+                                               << "SELECT group_concat(relation_id) FROM entry_photo"
+                                               << "0,0,0";
+    QTest::newRow("apostrophes and SQL in texts")
+        << "UPDATE entry_concern SET description = 'O''Brien''); DROP TABLE entry; --'"
+        << ""
+        << "SELECT description FROM entry_concern"
+        << "O'Brien'); DROP TABLE entry; --";
+    QTest::newRow("invalid date") << "UPDATE entry_scheduleddelivery SET deliverydate = '2026-02-30'"
+                                  << "Die Tabelle 'entry_scheduleddelivery' der Datei"
+                                  << ""
+                                  << "";
+    QTest::newRow("empty NOT NULL date") << "UPDATE entry SET inspection_date = ''"
+                                         << "enthält keinen gültigen Bericht"
+                                         << ""
+                                         << "";
+    QTest::newRow("text for a number") << "UPDATE entry_workforce SET person_count = 'drei'"
+                                       << "Die Spalte 'person_count' enthält einen ungültigen Wert"
+                                       << ""
+                                       << "";
+    QTest::newRow("50 MB text") << "UPDATE entry_equipment SET comment = zeroblob(50000000) || ''"
+                                << "ist zu lang"
+                                << ""
+                                << "";
+    QTest::newRow("text as picture") << "UPDATE image SET image = 'kein Bild'"
+                                     << "Die Tabelle 'image' der Datei"
+                                     << ""
+                                     << "";
+    QTest::newRow("number above 99999") << "UPDATE entry SET number = '100000 (Entwurf)'"
+                                        << "größer 99999"
+                                        << ""
+                                        << "";
+}
+
+void TestVDRReportSync::untrustedRows()
+{
+    QFETCH(QString, sql);
+    QFETCH(QString, text);
+    QFETCH(QString, check);
+    QFETCH(QString, expected);
+    const QString path = exchangePath();
+    writeFullFile(path, kT1);
+    QVERIFY(execSql(path, sql.split(QStringLiteral(";; "))));
+    const QStringList before = dump();
+    const QString summary = import({path}, [&]() {
+        if (!text.isEmpty())
+            m_prompt.expect(text.contains(QLatin1String("99999"))
+                                ? QStringLiteral("Bauberichtnummer ungültig ")
+                                : kDbError,
+                            text);
+    });
+    if (text.isEmpty()) {
+        QVERIFY2(summary.contains(QStringLiteral("erfolgreich importiert")), qPrintable(summary));
+        QCOMPARE(rows(check).join(QLatin1Char('\n')), expected);
+    } else {
+        QVERIFY2(
+            summary.contains(QStringLiteral("aufgrund von Datenbankfehlern nicht importiert:\n\nBericht ")),
+            qPrintable(summary));
+        QCOMPARE(dump(), before);
+    }
+}
+
+// A failure of the diary itself in the middle of a report's rows undoes everything of that report.
+void TestVDRReportSync::failureLeavesDiaryAsBefore_data()
+{
+    QTest::addColumn<bool>("replace");
+    QTest::newRow("new report") << false;
+    QTest::newRow("replacing a report") << true;
+}
+
+void TestVDRReportSync::failureLeavesDiaryAsBefore()
+{
+    QFETCH(bool, replace);
+    if (replace) {
+        const QString path = exchangePath(kT1);
+        writeFullFile(path, kT1);
+        import({path});
+    }
+    // The diary refuses the last list of the report, after every other row was written.
+    QVERIFY(QSqlQuery(m_doc->database())
+                .exec(QStringLiteral("CREATE TRIGGER fail_equipment BEFORE INSERT ON entry_equipment BEGIN "
+                                     "SELECT RAISE(ABORT, 'disk on fire'); END")));
+    const QStringList before = dump();
+    const QString path = exchangePath(kT2);
+    writeFullFile(path, kT2, QStringLiteral("Dach"));
+    const QString summary =
+        import({path}, [&]() { m_prompt.expect(kDbError, QStringLiteral("disk on fire")); });
+    QVERIFY2(summary.contains(QStringLiteral("Datenbankfehlern")), qPrintable(summary));
+    QCOMPARE(dump(), before);
+    QCOMPARE(m_doc->modelEntryAll()->rowCount(), replace ? 1 : 0);
+}
+
+// A new app report dated after the highest-numbered report but numbered lower.
+void TestVDRReportSync::renumbering_data()
+{
+    QTest::addColumn<bool>("forAll");
+    QTest::addColumn<int>("answer");
+    QTest::addColumn<QStringList>("numbers");
+    QTest::newRow("rename, for all") << true << 0 << QStringList{"001", "002", "003", "004", "005"};
+    QTest::newRow("keep, asked each time") << false << 1 << QStringList{"001", "002", "003", "002", "003"};
+}
+
+void TestVDRReportSync::renumbering()
+{
+    QFETCH(bool, forAll);
+    QFETCH(int, answer);
+    QFETCH(QStringList, numbers);
+    for (int i = 1; i <= 3; ++i) {
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(
+            QStringLiteral("INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+                           "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, "
+                           "env_temperature, env_humidity, progress, deficiencies, "
+                           "construction_material_sample, print_notice, print_telephone_notice) VALUES "
+                           "(%1, 1, '00%1', '2026-03-0%1', '07:00', '08:00', '08:00', '', '', '', '', '', "
+                           "'', '', 0, 1, 1)")
+                .arg(i)));
+    }
+    QVERIFY(QSqlQuery(m_doc->database())
+                .exec(QStringLiteral("UPDATE id_generator SET id_counter = 3 WHERE id_table = 'entry'")));
+    const QString path = exchangePath();
+    {
+        VDRExchangeFileBuilder file(path, QStringLiteral("Baustelle.vd2"), kT1);
+        file.addReport(QStringLiteral("002"), QDate(2026, 3, 5), kCreated, {{"locked", 1}});
+        file.addReport(QStringLiteral("003"), QDate(2026, 3, 6), kCreated.addSecs(60), {{"locked", 1}});
+    }
+    const QString question = QStringLiteral("Baubericht-Synchronisation");
+    const QString summary = import({path}, [&]() {
+        if (forAll) {
+            m_prompt.expectTicked(
+                question,
+                QStringLiteral("Der importierte Baubericht 002 ist neuer als der Baubericht "
+                               "mit der höchsten Bauberichts-Nummer: 003.\nSoll er fortlaufend "
+                               "nummeriert und in 004 umbenannt werden?"),
+                answer);
+        } else {
+            m_prompt.expect(question, QStringLiteral("in 004 umbenannt"), answer);
+            m_prompt.expect(question, QStringLiteral("Baubericht 003 ist neuer"), answer);
+        }
+    });
+    QCOMPARE(rows(QStringLiteral("SELECT number FROM entry ORDER BY inspection_date")), numbers);
+    if (forAll)
+        QVERIFY2(summary.contains(QStringLiteral("Bericht 003-AB als Bericht 005-AB \n")),
+                 qPrintable(summary));
+}
+
+// Files found by their stamp, imported in stamp order, deleted once imported; links out of the
+// folder are not the app's.
+void TestVDRReportSync::cloudFolder()
+{
+    const QString cloud = m_dir + QStringLiteral("/cloud");
+    QVERIFY(QDir().mkpath(cloud));
+    const QString outside = m_dir + QStringLiteral("/outside.vdx");
+    writeFullFile(outside, kT1);
+    QVERIFY(QFile::link(outside, cloud + QStringLiteral("/Baustelle.2026-03-07T16-05-08.vdx")));
+    writeFullFile(cloud + QStringLiteral("/Baustelle.2026-03-07T16-05-10.vdx"), kT2,
+                  QStringLiteral("zweite"));
+    writeFullFile(cloud + QStringLiteral("/Baustelle.2026-03-07T16-05-09.vdx"), kT1, QStringLiteral("erste"));
+    for (const char* other : {"Baustelle.2026-03-07.vdx", "Baustelle.2026-03-07T16-65-09.vdx",
+                              "Andere.2026-03-07T16-05-09.vdx", "Baustelle.2026-03-07T16-05-09.vdx.bak"})
+        QVERIFY(QFile::copy(outside, cloud + QLatin1Char('/') + QLatin1String(other)));
+
+    const QStringList found = VDRReportSynchronisation::getCloudReportExchangeFiles(m_diary, cloud);
+    QCOMPARE(found, (QStringList{"Baustelle.2026-03-07T16-05-09.vdx", "Baustelle.2026-03-07T16-05-10.vdx"}));
+    QVERIFY(VDRReportSynchronisation::getCloudReportExchangeFiles(QString(), cloud).isEmpty());
+
+    VDRReportSynchronisation sync(m_doc.get());
+    bool imported = false;
+    bool changed = false;
+    m_prompt.expect(kNotice);
+    m_prompt.expect(QStringLiteral("Ergebnis der Synchronisation"),
+                    QStringLiteral("Folgende Austauschdateien wurden importiert"));
+    QCOMPARE(sync.importCloudReportExchangeFiles(cloud, found, imported, changed), 0);
+    QVERIFY(imported);
+    // Had the later file come first, the earlier would have been refused as older.
+    QCOMPARE(value(QStringLiteral("SELECT progress FROM entry")).toString(), QStringLiteral("zweite"));
+    QVERIFY(!QFileInfo::exists(cloud + QLatin1Char('/') + found[0]));
+    QVERIFY(!QFileInfo::exists(cloud + QLatin1Char('/') + found[1]));
+    QVERIFY(QFileInfo::exists(outside));
+}
+
+// varduna-cli import: the summary on stdout, the diary saved, imported files deleted on request.
+void TestVDRReportSync::commandLine()
+{
+    m_doc.reset();
+    const QString good = exchangePath(kT1);
+    writeFullFile(good, kT1);
+    const QString refused = exchangePath(kT2);
+    writeFullFile(refused, kT2);
+    QVERIFY(execSql(refused, {QStringLiteral("UPDATE meta SET value = '0.1' WHERE key = 'fileversion'")}));
+
+    QProcess p;
+    p.start(QString::fromLocal8Bit(qgetenv("VARDUNA_CLI")),
+            {QStringLiteral("import"), m_diary, good, refused, QStringLiteral("--delete")});
+    QVERIFY(p.waitForFinished(120000));
+    const QString out = QString::fromUtf8(p.readAllStandardOutput());
+    const QString err = QString::fromLocal8Bit(p.readAllStandardError());
+    QCOMPARE(p.exitCode(), 4);
+    QVERIFY2(out.contains(QStringLiteral("Folgende Bauberichte wurden erfolgreich importiert")),
+             qPrintable(out));
+    QVERIFY2(err.contains(QStringLiteral("mit einer älteren Version")), qPrintable(err));
+    QVERIFY(!QFileInfo::exists(good));
+    QVERIFY(QFileInfo::exists(refused));
+    QCOMPARE(queryValue(m_diary, QStringLiteral("SELECT count(*) FROM entry_photo")).toInt(), 3);
+}
+
+QTEST_GUILESS_MAIN(TestVDRReportSync)
+#include "tst_vdrreportsync.moc"
