@@ -1,4 +1,5 @@
 #include "sync/VDRReportSynchronisation.h"
+#include "sync/VDRExchangeValues.h"
 
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
@@ -22,27 +23,179 @@
 #include <cmath>
 #include <vector>
 
+namespace VDRExchangeValues {
+
+namespace {
+QString tr(const char* text)
+{
+    return VDRReportSynchronisation::tr(text);
+}
+
+QString shortened(const QString& text)
+{
+    return text.size() > 40 ? text.left(40) + QStringLiteral("...") : text;
+}
+} // namespace
+
+QDateTime parseDateTime(const QString& text)
+{
+    QString t = text.trimmed();
+    if (t.size() > 10 && t.at(10) == QLatin1Char(' '))
+        t[10] = QLatin1Char('T');
+    QDateTime result = QDateTime::fromString(t, Qt::ISODateWithMs);
+    if (!result.isValid())
+        result = QDateTime::fromString(t, Qt::ISODate);
+    return result;
+}
+
+QString versionText(const QDateTime& dateTime)
+{
+    QString text = dateTime.toString(QStringLiteral("yyyy-MM-ddThh:mm:ss"));
+    if (dateTime.time().msec() != 0)
+        text += dateTime.toString(QStringLiteral(".zzz"));
+    return text;
+}
+
+// Checks one value of the exchange file against its column and turns it into what the diary's
+// own models would bind. False with 'error' set when the value cannot be taken.
+bool convertValue(const QVariant& raw, const Column& column, QVariant& out, QString& error)
+{
+    const QString name = QLatin1String(column.name);
+    const bool null = raw.isNull();
+    const auto invalid = [&]() {
+        error = tr("Die Spalte '%1' enthält einen ungültigen Wert: %2")
+                    .arg(name, shortened(raw.type() == QVariant::ByteArray ? QStringLiteral("<BLOB>")
+                                                                           : raw.toString()));
+        return false;
+    };
+    const auto missing = [&]() {
+        error = tr("Die Spalte '%1' enthält keinen Wert.").arg(name);
+        return false;
+    };
+    switch (column.kind) {
+    case KInt: {
+        if (null) {
+            out = column.notNull ? QVariant(0) : QVariant(QVariant::Int);
+            return true;
+        }
+        bool ok = false;
+        qint64 value = 0;
+        if (raw.type() == QVariant::Double) {
+            const double d = raw.toDouble();
+            ok = std::isfinite(d) && d == std::floor(d) && std::fabs(d) < 1e15;
+            value = static_cast<qint64>(d);
+        } else if (raw.type() != QVariant::ByteArray) {
+            value = raw.toString().trimmed().toLongLong(&ok);
+        }
+        if (!ok || value < INT_MIN || value > INT_MAX)
+            return invalid();
+        out = static_cast<int>(value);
+        return true;
+    }
+    case KReal: {
+        if (null) {
+            out = column.notNull ? QVariant(0.0) : QVariant(QVariant::Double);
+            return true;
+        }
+        bool ok = false;
+        const double value = raw.type() == QVariant::ByteArray ? 0.0 : raw.toString().trimmed().toDouble(&ok);
+        if (!ok || !std::isfinite(value))
+            return invalid();
+        out = value;
+        return true;
+    }
+    case KText:
+    case KTextOrNull: {
+        if (null) {
+            out = column.kind == KTextOrNull ? QVariant(QVariant::String) : QVariant(QStringLiteral(""));
+            return true;
+        }
+        const QString text =
+            raw.type() == QVariant::ByteArray ? QString::fromUtf8(raw.toByteArray()) : raw.toString();
+        if (text.size() > VDRReportSynchronisation::maxTextChars()) {
+            error = tr("Der Text der Spalte '%1' ist zu lang (%2 Zeichen).").arg(name).arg(text.size());
+            return false;
+        }
+        out = text;
+        return true;
+    }
+    case KDate: {
+        if (null || raw.toString().trimmed().isEmpty()) {
+            if (column.notNull)
+                return missing();
+            out = QVariant(QVariant::Date);
+            return true;
+        }
+        QString text = raw.toString().trimmed();
+        if (text.size() > 10 && (text.at(10) == QLatin1Char('T') || text.at(10) == QLatin1Char(' ')))
+            text.truncate(10);
+        const QDate date = QDate::fromString(text, Qt::ISODate);
+        if (!date.isValid() || text.size() != 10)
+            return invalid();
+        out = date;
+        return true;
+    }
+    case KTime: {
+        if (null || raw.toString().trimmed().isEmpty()) {
+            if (column.notNull)
+                return missing();
+            out = QVariant(QVariant::Time);
+            return true;
+        }
+        QString text = raw.toString().trimmed();
+        const int t = text.indexOf(QLatin1Char('T'));
+        if (t >= 0)
+            text = text.mid(t + 1);
+        QTime time = QTime::fromString(text, Qt::ISODateWithMs);
+        if (!time.isValid())
+            time = QTime::fromString(text, Qt::ISODate);
+        if (!time.isValid())
+            return invalid();
+        out = time;
+        return true;
+    }
+    case KDateTime: {
+        if (null || raw.toString().trimmed().isEmpty()) {
+            if (column.notNull)
+                return missing();
+            out = QVariant(QVariant::String);
+            return true;
+        }
+        const QDateTime dateTime = parseDateTime(raw.toString());
+        if (!dateTime.isValid())
+            return invalid();
+        out = versionText(dateTime);
+        return true;
+    }
+    case KBlob: {
+        if (null) {
+            if (column.notNull)
+                return missing();
+            out = QVariant(QVariant::ByteArray);
+            return true;
+        }
+        if (raw.type() != QVariant::ByteArray)
+            return invalid();
+        const QByteArray bytes = raw.toByteArray();
+        if (bytes.size() > VDRReportSynchronisation::maxBlobBytes()) {
+            error =
+                tr("Der Inhalt der Spalte '%1' ist zu groß (%2 MB).").arg(name).arg(bytes.size() / 1024000);
+            return false;
+        }
+        if (column.notNull && bytes.isEmpty())
+            return missing();
+        out = bytes;
+        return true;
+    }
+    }
+    return invalid();
+}
+
+} // namespace VDRExchangeValues
+
 namespace {
 
-// How a value of the exchange file is checked and bound.
-enum Kind
-{
-    KInt,
-    KReal,
-    KText,       // NULL becomes the empty text
-    KTextOrNull, // NULL stays NULL
-    KDate,
-    KTime,
-    KDateTime,
-    KBlob,
-};
-
-struct Column
-{
-    const char* name;
-    Kind kind;
-    bool notNull;
-};
+using namespace VDRExchangeValues;
 
 struct Table
 {
@@ -195,13 +348,7 @@ const char* const kReportTables[] = {"entry_attendee",
                                      "entry_concern",
                                      "entry_equipment"};
 
-const char* const kVersionFormat = "yyyy-MM-ddThh:mm:ss";
 const QString kDraftSuffix = QStringLiteral(" (Entwurf)");
-
-QString tr(const char* text)
-{
-    return VDRReportSynchronisation::tr(text);
-}
 
 QString columnList(const Table& table, bool withEntryId)
 {
@@ -211,165 +358,6 @@ QString columnList(const Table& table, bool withEntryId)
     for (const Column& c : table.columns)
         names << QLatin1String(c.name);
     return names.join(QStringLiteral(", "));
-}
-
-QDateTime parseDateTime(const QString& text)
-{
-    QString t = text.trimmed();
-    if (t.size() > 10 && t.at(10) == QLatin1Char(' '))
-        t[10] = QLatin1Char('T');
-    QDateTime result = QDateTime::fromString(t, Qt::ISODateWithMs);
-    if (!result.isValid())
-        result = QDateTime::fromString(t, Qt::ISODate);
-    return result;
-}
-
-QString versionText(const QDateTime& dateTime)
-{
-    QString text = dateTime.toString(QLatin1String(kVersionFormat));
-    if (dateTime.time().msec() != 0)
-        text += dateTime.toString(QStringLiteral(".zzz"));
-    return text;
-}
-
-QString shortened(const QString& text)
-{
-    return text.size() > 40 ? text.left(40) + QStringLiteral("...") : text;
-}
-
-// Checks one value of the exchange file against its column and turns it into what the diary's
-// own models would bind. False with 'error' set when the value cannot be taken.
-bool convertValue(const QVariant& raw, const Column& column, QVariant& out, QString& error)
-{
-    const QString name = QLatin1String(column.name);
-    const bool null = raw.isNull();
-    const auto invalid = [&]() {
-        error = tr("Die Spalte '%1' enthält einen ungültigen Wert: %2")
-                    .arg(name, shortened(raw.type() == QVariant::ByteArray ? QStringLiteral("<BLOB>")
-                                                                           : raw.toString()));
-        return false;
-    };
-    const auto missing = [&]() {
-        error = tr("Die Spalte '%1' enthält keinen Wert.").arg(name);
-        return false;
-    };
-    switch (column.kind) {
-    case KInt: {
-        if (null) {
-            out = column.notNull ? QVariant(0) : QVariant(QVariant::Int);
-            return true;
-        }
-        bool ok = false;
-        qint64 value = 0;
-        if (raw.type() == QVariant::Double) {
-            const double d = raw.toDouble();
-            ok = std::isfinite(d) && d == std::floor(d) && std::fabs(d) < 1e15;
-            value = static_cast<qint64>(d);
-        } else if (raw.type() != QVariant::ByteArray) {
-            value = raw.toString().trimmed().toLongLong(&ok);
-        }
-        if (!ok || value < INT_MIN || value > INT_MAX)
-            return invalid();
-        out = static_cast<int>(value);
-        return true;
-    }
-    case KReal: {
-        if (null) {
-            out = column.notNull ? QVariant(0.0) : QVariant(QVariant::Double);
-            return true;
-        }
-        bool ok = false;
-        const double value = raw.type() == QVariant::ByteArray ? 0.0 : raw.toString().trimmed().toDouble(&ok);
-        if (!ok || !std::isfinite(value))
-            return invalid();
-        out = value;
-        return true;
-    }
-    case KText:
-    case KTextOrNull: {
-        if (null) {
-            out = column.kind == KTextOrNull ? QVariant(QVariant::String) : QVariant(QStringLiteral(""));
-            return true;
-        }
-        const QString text =
-            raw.type() == QVariant::ByteArray ? QString::fromUtf8(raw.toByteArray()) : raw.toString();
-        if (text.size() > VDRReportSynchronisation::maxTextChars()) {
-            error = tr("Der Text der Spalte '%1' ist zu lang (%2 Zeichen).").arg(name).arg(text.size());
-            return false;
-        }
-        out = text;
-        return true;
-    }
-    case KDate: {
-        if (null || raw.toString().trimmed().isEmpty()) {
-            if (column.notNull)
-                return missing();
-            out = QVariant(QVariant::Date);
-            return true;
-        }
-        QString text = raw.toString().trimmed();
-        if (text.size() > 10 && (text.at(10) == QLatin1Char('T') || text.at(10) == QLatin1Char(' ')))
-            text.truncate(10);
-        const QDate date = QDate::fromString(text, Qt::ISODate);
-        if (!date.isValid() || text.size() != 10)
-            return invalid();
-        out = date;
-        return true;
-    }
-    case KTime: {
-        if (null || raw.toString().trimmed().isEmpty()) {
-            if (column.notNull)
-                return missing();
-            out = QVariant(QVariant::Time);
-            return true;
-        }
-        QString text = raw.toString().trimmed();
-        const int t = text.indexOf(QLatin1Char('T'));
-        if (t >= 0)
-            text = text.mid(t + 1);
-        QTime time = QTime::fromString(text, Qt::ISODateWithMs);
-        if (!time.isValid())
-            time = QTime::fromString(text, Qt::ISODate);
-        if (!time.isValid())
-            return invalid();
-        out = time;
-        return true;
-    }
-    case KDateTime: {
-        if (null || raw.toString().trimmed().isEmpty()) {
-            if (column.notNull)
-                return missing();
-            out = QVariant(QVariant::String);
-            return true;
-        }
-        const QDateTime dateTime = parseDateTime(raw.toString());
-        if (!dateTime.isValid())
-            return invalid();
-        out = versionText(dateTime);
-        return true;
-    }
-    case KBlob: {
-        if (null) {
-            if (column.notNull)
-                return missing();
-            out = QVariant(QVariant::ByteArray);
-            return true;
-        }
-        if (raw.type() != QVariant::ByteArray)
-            return invalid();
-        const QByteArray bytes = raw.toByteArray();
-        if (bytes.size() > VDRReportSynchronisation::maxBlobBytes()) {
-            error =
-                tr("Der Inhalt der Spalte '%1' ist zu groß (%2 MB).").arg(name).arg(bytes.size() / 1024000);
-            return false;
-        }
-        if (column.notNull && bytes.isEmpty())
-            return missing();
-        out = bytes;
-        return true;
-    }
-    }
-    return invalid();
 }
 
 // The checked values of one row of 'table', by column name.

@@ -109,6 +109,14 @@ VDRExchangeFileBuilder::VDRExchangeFileBuilder(const QString& path, const QStrin
            setMeta(QStringLiteral("creationDateTime"), created.toString(Qt::ISODate));
 }
 
+VDRExchangeFileBuilder::VDRExchangeFileBuilder(const QString& existingPath)
+    : m_name(QStringLiteral("EXCHANGE_BUILDER_%1").arg(++g_builders))
+{
+    QSqlDatabase db = QSqlDatabase::addDatabase(QStringLiteral("QSQLITE"), m_name);
+    db.setDatabaseName(existingPath);
+    m_ok = db.open() && QSqlQuery(db).exec(QStringLiteral("BEGIN"));
+}
+
 VDRExchangeFileBuilder::~VDRExchangeFileBuilder()
 {
     close();

@@ -15,6 +15,8 @@ public:
     // 'diaryFileName' is the meta key `database` (file name of the diary, with extension).
     VDRExchangeFileBuilder(const QString& path, const QString& diaryFileName,
                            const QDateTime& created = QDateTime(QDate(2026, 3, 7), QTime(16, 5, 9)));
+    // Adds to a file written before.
+    explicit VDRExchangeFileBuilder(const QString& existingPath);
     ~VDRExchangeFileBuilder();
     VDRExchangeFileBuilder(const VDRExchangeFileBuilder&) = delete;
     VDRExchangeFileBuilder& operator=(const VDRExchangeFileBuilder&) = delete;

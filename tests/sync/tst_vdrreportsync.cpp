@@ -46,6 +46,8 @@ private slots:
     void renumbering_data();
     void renumbering();
     void cloudFolder();
+    void masterData_data();
+    void masterData();
     void commandLine();
 
 private:
@@ -553,6 +555,102 @@ void TestVDRReportSync::cloudFolder()
     QVERIFY(!QFileInfo::exists(cloud + QLatin1Char('/') + found[0]));
     QVERIFY(!QFileInfo::exists(cloud + QLatin1Char('/') + found[1]));
     QVERIFY(QFileInfo::exists(outside));
+}
+
+// The app's project data and companies: imported only when newer, never half, and never over
+// companies frozen for reports the app does not know as locked.
+void TestVDRReportSync::masterData_data()
+{
+    QTest::addColumn<QString>("setup");
+    QTest::addColumn<QString>("title");
+    QTest::addColumn<QString>("text");
+    QTest::addColumn<int>("answer");
+    QTest::addColumn<QString>("companies"); // empty: the diary stays as before
+    QTest::newRow("newer") << ""
+                           << ""
+                           << "" << -1 << "7|O'Neill & Söhne|7|8|Kran-Verleih|8|9|Alt'Firma|9";
+    QTest::newRow("older") << "older"
+                           << "Stammdaten Synchronisation"
+                           << "bereits aktuellere Stammdaten" << -1 << "1|Bau AG|1|2|Elektro|2";
+    QTest::newRow("frozen companies unknown to the app")
+        << "frozen" << kSync << "nach dem Abschließen von Berichten" << -1 << "";
+    QTest::newRow("empty list, delete") << "empty"
+                                        << "Stammdaten Synchronisation"
+                                        << "Firmenliste in der Importdatei ist leer" << 0 << "";
+    QTest::newRow("empty list, keep")
+        << "empty"
+        << "Stammdaten Synchronisation"
+        << "Firmenliste in der Importdatei ist leer" << 1 << "1|Bau AG|1|2|Elektro|2";
+    QTest::newRow("invalid category")
+        << "category" << kSync << "Die Spalte 'category' enthält einen ungültigen Wert" << -1 << "";
+    QTest::newRow("failure in the middle of the list")
+        << "trigger" << kSync << "Das Anlegen eines Firmeneintrags" << -1 << "";
+}
+
+void TestVDRReportSync::masterData()
+{
+    QFETCH(QString, setup);
+    QFETCH(QString, title);
+    QFETCH(QString, text);
+    QFETCH(int, answer);
+    QFETCH(QString, companies);
+    QSqlDatabase db = m_doc->database();
+    QVERIFY(QSqlQuery(db).exec(QStringLiteral("DELETE FROM company")));
+    for (const QString& sql :
+         {QStringLiteral(
+              "INSERT INTO company (id, category, type, firstname, lastname, company, street, plz, city, "
+              "telephone, telefax, mobile, email, pos) VALUES (1, 1, '', '', '', 'Bau AG', '', '', '', '', "
+              "'', '', '', 1), (2, 2, '', '', '', 'Elektro', '', '', '', '', '', '', '', 2)"),
+          QStringLiteral("UPDATE id_generator SET id_counter = 20 WHERE id_table = 'company'")})
+        QVERIFY(QSqlQuery(db).exec(sql));
+    if (setup == QLatin1String("frozen"))
+        QVERIFY(QSqlQuery(db).exec(QStringLiteral("UPDATE company SET category = -category")));
+    if (setup == QLatin1String("older"))
+        QVERIFY(m_doc->setMasterDataImportVersion(kT2));
+    if (setup == QLatin1String("trigger"))
+        QVERIFY(QSqlQuery(db).exec(
+            QStringLiteral("CREATE TRIGGER fail_company BEFORE INSERT ON company WHEN NEW.id = 8 "
+                           "BEGIN SELECT RAISE(ABORT, 'disk on fire'); END")));
+    m_doc->modelCompany1()->select();
+    m_doc->modelCompany2()->select();
+    const QString path = exchangePath();
+    writeFullFile(path, kT1);
+    {
+        VDRExchangeFileBuilder file(path);
+        file.addRow(QStringLiteral("vdr"), {{"id", 1}, {"name", "App-Projekt"}, {"headline_left", "Kopf's"}});
+        if (setup != QLatin1String("empty")) {
+            file.addRow(QStringLiteral("company"),
+                        {{"id", 7}, {"category", 1}, {"company", "O'Neill & Söhne"}});
+            file.addRow(QStringLiteral("company"), {{"id", 8}, {"category", 2}, {"company", "Kran-Verleih"}});
+            file.addRow(QStringLiteral("company"), {{"id", 9},
+                                                    {"category", setup == QLatin1String("category") ? 7 : -1},
+                                                    {"company", "Alt'Firma"}});
+        }
+    }
+    const QStringList before = dump();
+    const QString projectBefore = value(QStringLiteral("SELECT name FROM vdr")).toString();
+    const QString summary = import({path}, [&]() {
+        if (!title.isEmpty())
+            m_prompt.expect(title, text, answer);
+    });
+    const bool refused = companies.isEmpty() && setup != QLatin1String("empty");
+    if (refused) {
+        QVERIFY2(summary.contains(QStringLiteral("nicht oder nur teilweise importiert")),
+                 qPrintable(summary));
+        QCOMPARE(dump(), before);
+        return;
+    }
+    QVERIFY2(summary.contains(QStringLiteral("erfolgreich importiert")), qPrintable(summary));
+    QCOMPARE(rows(QStringLiteral("SELECT id, company, pos FROM company ORDER BY id")).join(QLatin1Char('|')),
+             companies);
+    const bool imported = setup != QLatin1String("older");
+    QCOMPARE(value(QStringLiteral("SELECT name FROM vdr")).toString(),
+             imported ? QStringLiteral("App-Projekt") : projectBefore);
+    QCOMPARE(m_doc->masterDataImportVersion(), imported ? kT1 : kT2);
+    QCOMPARE(value(QStringLiteral("SELECT id_counter FROM id_generator WHERE id_table = 'company'")).toInt(),
+             20);
+    QCOMPARE(m_doc->modelCompany1()->rowCount() + m_doc->modelCompany2()->rowCount(),
+             companies.isEmpty() ? 0 : companies.count(QLatin1Char('|')) / 3 + 1);
 }
 
 // varduna-cli import: the summary on stdout, the diary saved, imported files deleted on request.
