@@ -9,6 +9,7 @@
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRSpellChecker.h"
+#include "sync/VDRReportSynchronisation.h"
 
 #include <QAction>
 #include <QCalendarWidget>
@@ -58,9 +59,12 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionStartSpellChecking",
                                      "actionVorschlagtexte",
                                      "actionHelpShowHelp",
-                                     "actionHelpInfoDialog"};
+                                     "actionHelpInfoDialog",
+                                     "actionExchangeReport",
+                                     "actionExchangeReport_2"};
 // Commands that need an open document.
-const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB"};
+const char* const kDocumentActions[] = {"actionFileSave", "actionFileSaveAs", "actionCompactDB",
+                                        "actionExchangeReport", "actionExchangeReport_2"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -828,5 +832,43 @@ void VDRMainWindow::on_actionCompactDB_triggered()
     if (m_document->isStateNew() && saveDocument(true, true) != 0)
         return;
     m_document->compactDB(true);
+    updateGui();
+}
+
+void VDRMainWindow::on_actionExchangeReport_triggered()
+{
+    if (!m_document->isStateValid())
+        return;
+    const QString path = VDRPrompt::instance()->openFileName(
+        tr("Austauschdatei importieren"), QFileInfo(m_document->getFilepath()).absolutePath(),
+        tr("Austauschdatei (*.vdx)"));
+    if (!path.isEmpty())
+        importExchangeFile(path);
+}
+
+void VDRMainWindow::on_actionExchangeReport_2_triggered()
+{
+    on_actionExchangeReport_triggered();
+}
+
+int VDRMainWindow::importExchangeFile(const QString& path)
+{
+    VDRReportSynchronisation sync(m_document);
+    bool projectDataChanged = false;
+    const int result = sync.importManualReportExchangeFile(path, projectDataChanged);
+    if (sync.saveNowRequested()) {
+        // A diary with a file is compacted as it is saved; a new one asks for its name first.
+        const bool saved = m_document->isStateNew() || m_document->getFilepath().isEmpty()
+                               ? saveDocument(false, true) == 0 && !m_document->isStateModified()
+                               : m_document->compactDB(false) == 0;
+        if (saved)
+            sync.deleteRequestedFile();
+    }
+    updateGui4ManualReportExchangeFileImport();
+    return result;
+}
+
+void VDRMainWindow::updateGui4ManualReportExchangeFileImport()
+{
     updateGui();
 }

@@ -1,3 +1,4 @@
+#include "VDRExchangeFileBuilder.h"
 #include "VDRTestFixtures.h"
 #include "VDRTestPrompt.h"
 #include "app/KeyPressEater.h"
@@ -20,6 +21,7 @@
 #include <QPushButton>
 #include <QScreen>
 #include <QSettings>
+#include <QSqlQuery>
 #include <QStatusBar>
 #include <QTemporaryDir>
 #include <QToolBar>
@@ -580,8 +582,8 @@ private slots:
         QTest::addColumn<QString>("kind");
         QTest::addColumn<bool>("opened");
         QTest::newRow("diary") << "diary" << true;
-        // Until reports can be imported, an exchange file is explained and left untouched.
-        QTest::newRow("exchange file") << "vdx" << false;
+        // An exchange file is imported into a new diary and left untouched.
+        QTest::newRow("exchange file") << "vdx" << true;
         QTest::newRow("missing exchange file") << "missing vdx" << false;
         QTest::newRow("missing file") << "missing" << false;
     }
@@ -597,9 +599,15 @@ private slots:
         } else if (kind == QLatin1String("vdx")) {
             path = m_dir.filePath(QStringLiteral("vom Handy.vdx"));
             QFile::remove(path);
-            QVERIFY(createDiary(path));
+            {
+                VDRExchangeFileBuilder file(path, QStringLiteral("vom Handy.vd2"));
+                QVERIFY(file.addReport(QStringLiteral("004"), QDate(2026, 3, 7),
+                                       QDateTime(QDate(2026, 3, 7), QTime(7, 0)), {{"locked", 1}}) > 0);
+            }
             hash = fileHash(path);
-            m_prompt.expect(QStringLiteral("Import von Bauberichten"), QStringLiteral("noch nicht möglich"));
+            m_prompt.expect(QStringLiteral("Import einer Austauschdatei"));
+            m_prompt.expect(QStringLiteral("Ergebnis der Synchronisation"),
+                            QStringLiteral("Bericht 004-AB als Bericht 004-AB"), 1);
         } else {
             if (kind == QLatin1String("missing vdx"))
                 path = m_dir.filePath(QStringLiteral("nicht da.vdx"));
@@ -609,6 +617,11 @@ private slots:
         }
         QCOMPARE(VDRStartup::openFirstDocument(*m_window, path), opened);
         QCOMPARE(m_window->document()->isStateValid(), opened);
+        if (kind == QLatin1String("vdx")) {
+            QSqlQuery q(m_window->document()->database());
+            QVERIFY(q.exec(QStringLiteral("SELECT count(*) FROM entry WHERE number = '004'")) && q.next());
+            QCOMPARE(q.value(0).toInt(), 1);
+        }
         if (!hash.isEmpty()) {
             QCOMPARE(fileHash(path), hash);
             QCOMPARE(QDir(m_dir.path()).entryList({QStringLiteral("vom Handy*")}, QDir::Files),
