@@ -4,6 +4,7 @@
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
+#include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
 #include <QCoreApplication>
@@ -67,6 +68,14 @@ const char* const kHelp =
     "                      files, in the order given, and save the diary. The summary goes to\n"
     "                      stdout. With --delete, the files that were imported are deleted after\n"
     "                      the diary was saved; refused files always stay.\n"
+    "  export-masterdata FILE OUT.mdd\n"
+    "                      Write the master-data file for the mobile app (project data, companies,\n"
+    "                      locked reports). FILE is only read.\n"
+    "  follow-up FILE NEW.vd2\n"
+    "                      Start a follow-up diary NEW.vd2 with FILE's project data, companies and\n"
+    "                      address lists, knowing FILE's report numbers, with one first report;\n"
+    "                      FILE records where its master data went and is saved. An existing\n"
+    "                      NEW.vd2 is refused.\n"
     "\n"
     "Options:\n"
     "  --yes               Answer questions with their affirmative default (without it every\n"
@@ -90,6 +99,12 @@ const char* const kHelp =
     "  3  not saved: a question was answered with its cancelling choice (try --yes)\n"
     "  4  some files were refused or not fully imported (the message on stderr says why);\n"
     "     what was imported is saved\n"
+    "\n"
+    "Exit codes of export-masterdata and follow-up:\n"
+    "  0  written\n"
+    "  1  usage error\n"
+    "  2  refused or failed (the message on stderr says why)\n"
+    "  3  cancelled: a question was answered with its cancelling choice (try --yes)\n"
     "\n"
     "Exit codes of restore:\n"
     "  0  restored\n"
@@ -387,6 +402,54 @@ int cmdImport(const QString& file, const QStringList& exchangeFiles, bool delete
     return failed > 0 ? 4 : ExitOk;
 }
 
+int cmdExportMasterData(const QString& file, const QString& target)
+{
+    VDRDocument doc;
+    // Reading only: the diary and anything beside it stay as they are.
+    doc.setInspecting(true);
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    const bool ok = VDRMasterDataExport::writeMasterDataFile(&doc, QFileInfo(target).absoluteFilePath());
+    doc.closeDocument();
+    if (!ok)
+        return ExitRefused;
+    out() << QFileInfo(target).absoluteFilePath() << "\n";
+    return ExitOk;
+}
+
+int cmdFollowUp(const QString& file, const QString& target)
+{
+    if (QFileInfo::exists(target)) {
+        VDRPrompt::critical(
+            QObject::tr("Dateifehler"),
+            QObject::tr("Die Datei\n%1\nexistiert bereits.").arg(QFileInfo(target).absoluteFilePath()));
+        return ExitRefused;
+    }
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    bool exported = false;
+    QString exportedTo;
+    VDRMasterDataExport::check4ExportedMasterData(&doc, exported, exportedTo);
+    if (exported && VDRPrompt::instance()->question(
+                        VDRPrompt::Question, QObject::tr("Hinweis"),
+                        QObject::tr("Die Stammdaten dieser Datei wurden bereits exportiert nach "
+                                    "%0.\nExport der Stammdaten fortsetzen?")
+                            .arg(exportedTo),
+                        VDRPrompt::Yes | VDRPrompt::No, VDRPrompt::Yes, VDRPrompt::No) != VDRPrompt::Yes) {
+        doc.closeDocument();
+        return 3;
+    }
+    int result = VDRMasterDataExport::createFollowUpDiary(&doc, target);
+    if (result == 0)
+        result = doc.saveDocument(QString()) == 0 ? 0 : 2;
+    doc.closeDocument();
+    if (result != 0)
+        return result == 1 ? ExitRefused : ExitRefused;
+    out() << QFileInfo(target).absoluteFilePath() << "\n";
+    return ExitOk;
+}
+
 // The user hears from the program through the prompt; Qt's own log lines are for developers.
 void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QString& message)
 {
@@ -443,6 +506,10 @@ int main(int argc, char* argv[])
         result = cmdRestore(file);
     else if (command == QLatin1String("compact"))
         result = cmdCompact(file);
+    else if (command == QLatin1String("export-masterdata") && twoFiles)
+        result = cmdExportMasterData(file, args[2]);
+    else if (command == QLatin1String("follow-up") && twoFiles)
+        result = cmdFollowUp(file, args[2]);
     else if (command == QLatin1String("import") && manyFiles)
         result = cmdImport(file, args.mid(2), deleteImported);
     else {

@@ -280,9 +280,3 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
     m_document->setModified(true);
     return 0;
 }
-
-bool VDRReportSynchronisation::exportMasterData4Synch(QSqlDatabase target)
-{
-    Q_UNUSED(target)
-    return false;
-}

@@ -3,9 +3,11 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
 #include <QColor>
+#include <QImage>
 #include <QProcess>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -49,6 +51,9 @@ private slots:
     void masterData_data();
     void masterData();
     void commandLine();
+    void masterDataForTheApp();
+    void followUpDiary_data();
+    void followUpDiary();
 
 private:
     QString exchangePath(const QDateTime& stamp = kT1) const;
@@ -61,6 +66,10 @@ private:
     QVariant value(const QString& sql);
     // Every row of every table of the working copy, with the structure: equal dumps, equal diaries.
     QStringList dump();
+    // Reports 001 to 'count' (locked, the last 'open' ones not), a frozen company, a logo.
+    void fillDiary(int count, int open);
+    // Runs varduna-cli; returns the exit code.
+    int cli(const QStringList& arguments, QString* out = nullptr, QString* err = nullptr);
 
     QTemporaryDir m_tmp;
     QString m_dir;
@@ -676,6 +685,151 @@ void TestVDRReportSync::commandLine()
     QVERIFY(!QFileInfo::exists(good));
     QVERIFY(QFileInfo::exists(refused));
     QCOMPARE(queryValue(m_diary, QStringLiteral("SELECT count(*) FROM entry_photo")).toInt(), 3);
+}
+
+void TestVDRReportSync::fillDiary(int count, int open)
+{
+    QSqlDatabase db = m_doc->database();
+    QSqlQuery q(db);
+    q.prepare(QStringLiteral(
+        "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+        "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, env_temperature, "
+        "env_humidity, progress, deficiencies, construction_material_sample, print_notice, "
+        "print_telephone_notice, user_id, creation_date) VALUES (?, ?, ?, '2026-03-01', '07:00', "
+        "'08:00', '08:00', '', '', '', '', '', '', '', 0, 1, 1, 'AB', ?)"));
+    for (int i = 1; i <= count; ++i) {
+        const bool locked = i <= count - open;
+        q.addBindValue(i);
+        q.addBindValue(locked ? 1 : 0);
+        q.addBindValue(QString::number(i).rightJustified(3, QLatin1Char('0')) +
+                       (locked ? QString() : QStringLiteral(" (Entwurf)")));
+        q.addBindValue(QStringLiteral("2026-03-01T07:%1:00").arg(i % 60, 2, 10, QLatin1Char('0')));
+        QVERIFY2(q.exec(), qPrintable(q.lastError().text()));
+    }
+    QImage logo(40, 20, QImage::Format_RGB32);
+    logo.fill(Qt::blue);
+    const int logoId = m_doc->createImage(logo);
+    QVERIFY(logoId > 0);
+    for (const QString& sql :
+         {QStringLiteral("UPDATE id_generator SET id_counter = %1 WHERE id_table = 'entry'").arg(count),
+          QStringLiteral("UPDATE vdr SET logo_image_id = %1, logo2_image_id = 0, name = 'Haus ''Süd''', "
+                         "projectnumber = NULL")
+              .arg(logoId),
+          QStringLiteral(
+              "UPDATE company SET company = 'Bau''s & Co' WHERE id = (SELECT min(id) FROM company)"),
+          QStringLiteral(
+              "INSERT INTO company (id, category, type, firstname, lastname, company, street, plz, city, "
+              "telephone, telefax, mobile, email, pos) SELECT 90, -1, type, firstname, lastname, 'Gefroren', "
+              "street, plz, city, telephone, telefax, mobile, email, 90 FROM company WHERE category = 1 "
+              "LIMIT 1")})
+        QVERIFY2(QSqlQuery(db).exec(sql), qPrintable(sql));
+    m_doc->modelEntryAll()->select();
+    m_doc->modelVdr()->select();
+}
+
+int TestVDRReportSync::cli(const QStringList& arguments, QString* out, QString* err)
+{
+    QProcess p;
+    p.start(QString::fromLocal8Bit(qgetenv("VARDUNA_CLI")), arguments);
+    if (!p.waitForFinished(120000))
+        return -1;
+    if (out)
+        *out = QString::fromUtf8(p.readAllStandardOutput());
+    if (err)
+        *err = QString::fromLocal8Bit(p.readAllStandardError());
+    return p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
+}
+
+// The master-data file the app reads: typed values, apostrophes, the locked reports.
+void TestVDRReportSync::masterDataForTheApp()
+{
+    fillDiary(3, 1);
+    const QString mdd = m_dir + QStringLiteral("/Baustelle.mdd");
+    QVERIFY(VDRMasterDataExport::writeMasterDataFile(m_doc.get(), mdd));
+    QCOMPARE(queryTexts(mdd, QStringLiteral("SELECT key, value FROM meta ORDER BY key")),
+             (QStringList{"database|Baustelle.vd2", "fileversion|0.1"}));
+    QCOMPARE(queryTexts(mdd, QStringLiteral("SELECT name, typeof(id) FROM vdr")),
+             QStringList{"Haus 'Süd'|integer"});
+    QCOMPARE(queryValue(mdd, QStringLiteral("SELECT count(*) FROM company WHERE company = 'Bau''s & Co' AND "
+                                            "typeof(category) = 'integer' AND typeof(pos) = 'integer'"))
+                 .toInt(),
+             1);
+    QCOMPARE(queryValue(mdd, QStringLiteral("SELECT count(*) FROM company WHERE category = -1")).toInt(), 1);
+    QCOMPARE(
+        queryTexts(mdd, QStringLiteral("SELECT id, user_id, creation_date FROM locked_reports ORDER BY id")),
+        (QStringList{"1|AB|2026-03-01T07:01:00", "2|AB|2026-03-01T07:02:00"}));
+    QVERIFY(!QFileInfo::exists(mdd + QStringLiteral("-journal")));
+}
+
+// The follow-up diary of reports 1 to 37: same master data, the old numbers known, 038 (Entwurf).
+void TestVDRReportSync::followUpDiary_data()
+{
+    QTest::addColumn<bool>("commandLine");
+    QTest::newRow("in the program") << false;
+    QTest::newRow("varduna-cli follow-up") << true;
+}
+
+void TestVDRReportSync::followUpDiary()
+{
+    QFETCH(bool, commandLine);
+    fillDiary(37, 0);
+    const QString next = m_dir + QStringLiteral("/Baustelle 2.vd2");
+    QByteArray logo;
+    {
+        QSqlQuery q(m_doc->database());
+        QVERIFY(q.exec(QStringLiteral("SELECT i.image FROM image i JOIN vdr v ON v.logo_image_id = i.id")) &&
+                q.next());
+        logo = q.value(0).toByteArray();
+    }
+    if (commandLine) {
+        QCOMPARE(m_doc->saveDocument(), 0);
+        m_doc.reset();
+        QString out, err;
+        QCOMPARE(cli({QStringLiteral("follow-up"), m_diary, next}, &out, &err), 0);
+        QCOMPARE(cli({QStringLiteral("follow-up"), m_diary, next}, &out, &err), 2); // exists: refused
+        QCOMPARE(
+            queryValue(m_diary, QStringLiteral("SELECT value FROM meta WHERE key = 'exportedTo'")).toString(),
+            next);
+    } else {
+        m_prompt.expect(QStringLiteral("Stammdaten Export"),
+                        QStringLiteral("nicht in die Originaldatei exportieren"));
+        QCOMPARE(VDRMasterDataExport::createFollowUpDiary(m_doc.get(), m_diary), 1);
+        QCOMPARE(VDRMasterDataExport::createFollowUpDiary(m_doc.get(), next), 0);
+        bool exported = false;
+        QString to;
+        QVERIFY(VDRMasterDataExport::check4ExportedMasterData(m_doc.get(), exported, to));
+        QVERIFY(exported);
+        QCOMPARE(to, next);
+        m_doc.reset();
+    }
+    QCOMPARE(queryTexts(next, QStringLiteral("SELECT number, locked FROM entry")),
+             QStringList{"038 (Entwurf)|0"});
+    QCOMPARE(queryTexts(next, QStringLiteral(
+                                  "SELECT count(DISTINCT number), min(number), max(number), "
+                                  "min(filepath) = max(filepath), min(filepath) FROM external_entry_number")),
+             QStringList{"37|001|037|1|" + m_diary});
+    QCOMPARE(queryTexts(next, QStringLiteral(
+                                  "SELECT key, value FROM meta WHERE key IN ('exportedFrom', 'exportedTo', "
+                                  "'fileversion') ORDER BY key")),
+             (QStringList{"exportedFrom|" + m_diary, "fileversion|0.4"}));
+    // NULLs stay NULL, numbers numbers, quotes quotes, pictures bytes; frozen companies stay behind.
+    QCOMPARE(queryTexts(next, QStringLiteral("SELECT name, typeof(projectnumber), typeof(logo2_image_id), "
+                                             "typeof(logo_image_id) FROM vdr")),
+             QStringList{"Haus 'Süd'|null|integer|integer"});
+    QCOMPARE(queryValue(next, QStringLiteral("SELECT count(*) FROM company WHERE category < 0")).toInt(), 0);
+    QCOMPARE(queryValue(next, QStringLiteral("SELECT count(*) FROM company WHERE company = 'Bau''s & Co'"))
+                 .toInt(),
+             1);
+    QCOMPARE(
+        queryValue(next, QStringLiteral("SELECT i.image FROM image i JOIN vdr v ON v.logo_image_id = i.id"))
+            .toByteArray(),
+        logo);
+    // The new diary opens and goes on from 038.
+    VDRDocument follow;
+    bool showError = true;
+    QVERIFY(follow.openDocument(next, showError));
+    QCOMPARE(follow.maxEntryNumber(), 38);
+    follow.closeDocument();
 }
 
 QTEST_GUILESS_MAIN(TestVDRReportSync)
