@@ -98,6 +98,7 @@ private slots:
     void on_actionHelpInfoDialog_triggered();
     void on_actionExchangeReport_triggered();
     void on_actionExchangeReport_2_triggered();
+    void on_actionExportMasterData_triggered();
     void slotReportDatesChanged(const QList<QDate>& dates);
 
 protected:

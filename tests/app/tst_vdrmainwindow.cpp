@@ -485,6 +485,54 @@ private slots:
         QVERIFY(m_window->closeDocument(true));
     }
 
+    void exchangeAndFollowUpCommands_data()
+    {
+        QTest::addColumn<bool>("saveNow");
+        QTest::newRow("save now, delete the file") << true;
+        QTest::newRow("save later, keep the file") << false;
+    }
+
+    // Importing an exchange file from the menu, and copying the master data into a follow-up diary.
+    void exchangeAndFollowUpCommands()
+    {
+        QFETCH(bool, saveNow);
+        const QString path = diary(QStringLiteral("Haus.vd2"));
+        QCOMPARE(m_window->openDocument(path, false, true), 0);
+        const QString vdx = m_dir.filePath(QStringLiteral("Haus.2026-03-07T16-05-09.vdx"));
+        QFile::remove(vdx);
+        {
+            VDRExchangeFileBuilder file(vdx, QStringLiteral("Haus.vd2"));
+            QVERIFY(file.addReport(QStringLiteral("002"), QDate(2026, 3, 7),
+                                   QDateTime(QDate(2026, 3, 7), QTime(7, 0)), {{"locked", 1}}) > 0);
+        }
+        QAction* import = m_window->ui().action(QStringLiteral("actionExchangeReport_2"));
+        QVERIFY(import->isEnabled());
+        m_prompt.expectFileName(vdx);
+        m_prompt.expect(QStringLiteral("Import einer Austauschdatei"));
+        m_prompt.expectTicked(
+            QStringLiteral("Ergebnis der Synchronisation"),
+            QStringLiteral("\nNach dem Import von Berichten sollte das Varduna gespeichert werden.\n"),
+            saveNow ? 0 : 1);
+        if (saveNow)
+            m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("wird jetzt bereinigt"));
+        import->trigger();
+        QCOMPARE(m_window->document()->modelEntryAll()->rowCount(), 2);
+        QVERIFY(!QFileInfo::exists(vdx)); // ticked: deleted, after saving when saving now
+        QCOMPARE(queryValue(path, QStringLiteral("SELECT count(*) FROM entry")).toInt(), saveNow ? 2 : 1);
+
+        const QString next = m_dir.filePath(QStringLiteral("Haus 2.vd2"));
+        QFile::remove(next);
+        if (!saveNow)
+            m_prompt.expect(QStringLiteral("Stammdaten Export"), QStringLiteral("vor dem Exportieren"),
+                            VDRPrompt::Yes);
+        m_prompt.expectFileName(next);
+        m_window->ui().action(QStringLiteral("actionExportMasterData"))->trigger();
+        QCOMPARE(queryTexts(next, QStringLiteral("SELECT number FROM entry")), QStringList{"003 (Entwurf)"});
+        QCOMPARE(
+            queryValue(path, QStringLiteral("SELECT value FROM meta WHERE key = 'exportedTo'")).toString(),
+            next);
+    }
+
     void sessionEndKeepsUnsavedWorkForNextOpening_data()
     {
         QTest::addColumn<bool>("modified");
