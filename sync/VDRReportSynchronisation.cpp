@@ -17,7 +17,6 @@
 #include <QSqlError>
 #include <QSqlQuery>
 #include <QSqlRecord>
-#include <QTemporaryDir>
 
 #include <climits>
 #include <cmath>
@@ -623,16 +622,10 @@ bool VDRReportSynchronisation::openExchangeFile(const QString& path)
     if (fi.size() > maxExchangeFileBytes())
         return refuse(tr("Die Datei ist zu groß (%1 MB).").arg(fi.size() / 1024000));
 
-    // The file stays exactly as the app wrote it: everything reads a private copy.
-    m_tempDir = std::make_unique<QTemporaryDir>();
-    if (!m_tempDir->isValid())
-        return refuse(m_tempDir->errorString());
-    m_exchangeCopy = m_tempDir->filePath(QStringLiteral("exchange.vdx"));
-    if (!QFile::copy(path, m_exchangeCopy))
-        return refuse(VDRFileOps::withReason(tr("Die Datei konnte nicht gelesen werden.")));
-    QFile::setPermissions(m_exchangeCopy, QFileDevice::ReadOwner | QFileDevice::WriteOwner);
-
-    m_connection = std::make_unique<VDRScopedConnection>(connectionName(), m_exchangeCopy);
+    // The file stays exactly as the app wrote it: opened read-only, and the exclusive locking mode
+    // keeps the shared lock of the first read until the file is closed, so nobody writes meanwhile.
+    m_connection = std::make_unique<VDRScopedConnection>(connectionName(), path,
+                                                         QStringLiteral("QSQLITE_OPEN_READONLY"));
     if (!m_connection->isOpen())
         return refuse(m_connection->lastError().text());
     QString failure;
@@ -649,8 +642,6 @@ bool VDRReportSynchronisation::openExchangeFile(const QString& path)
 void VDRReportSynchronisation::closeExchangeFile()
 {
     m_connection.reset();
-    m_tempDir.reset();
-    m_exchangeCopy.clear();
 }
 
 int VDRReportSynchronisation::countReports(const QString& path)
@@ -747,7 +738,10 @@ int VDRReportSynchronisation::importOpenedFile(QSqlDatabase db, const QString& p
     }
 
     int count = 0;
+    // The file is one transaction, each report a savepoint in it: one commit, not one per report.
+    m_document->beginTransaction();
     const int reports = importReports(db, path, totalReports, reportsBefore, count, importVersion);
+    m_document->endTransaction();
     importedCount += count;
     return done(reports == 0 ? FileImported : FileRefused);
 }

@@ -13,15 +13,14 @@
 
 #include <memory>
 
-class QTemporaryDir;
 class VDRDocument;
 class VDRScopedConnection;
 
 // Merges the reports of exchange files written by the mobile app into the open diary, and
 // exchanges master data with the app. One object per import run.
 //
-// Exchange files are foreign input: each is read from a private copy (the file itself is never
-// written), every value is checked against its column before it is bound, and every report is
+// Exchange files are foreign input: each is opened read-only (the file itself is never written),
+// every value is checked against its column before it is bound, and every report is
 // written inside one savepoint, so that a failure at any row leaves the diary as it was.
 class VDRReportSynchronisation : public QObject
 {
@@ -121,7 +120,7 @@ private:
         QString name;
     };
 
-    // Opens a private copy of 'path' on the exchange connection; false (the user told) when refused.
+    // Opens 'path' read-only on the exchange connection; false (the user told) when refused.
     bool openExchangeFile(const QString& path);
     void closeExchangeFile();
     int importOpenedFile(QSqlDatabase db, const QString& path, int totalReports, int reportsBefore,
@@ -157,9 +156,7 @@ private:
     bool m_renameForAll = false;
     bool m_renameAnswer = false;
     int m_busy = 0;
-    std::unique_ptr<QTemporaryDir> m_tempDir;
     std::unique_ptr<VDRScopedConnection> m_connection;
-    QString m_exchangeCopy;
     QString m_currentPath;
     // Set during a cloud run: files must lie in this folder (no links out of it).
     QString m_confineTo;
