@@ -769,6 +769,8 @@ int VDRReportSynchronisation::importReports(QSqlDatabase exchangeFile, const QSt
         ++count;
         VDRPrompt::instance()->noticeText(
             tr("Baubericht %1 von %2 wird importiert ...").arg(reportsBefore + count).arg(totalReports));
+        if (totalReports > 0)
+            VDRPrompt::instance()->noticeProgress((reportsBefore + count) * 100 / totalReports);
         QVariantHash row;
         const QSqlRecord record = q.record();
         for (int i = 0; i < record.count(); ++i)

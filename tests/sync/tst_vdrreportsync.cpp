@@ -3,6 +3,7 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "document/VDRDocumentsDb.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
@@ -47,6 +48,7 @@ private slots:
     void failureLeavesDiaryAsBefore();
     void renumbering_data();
     void renumbering();
+    void documentsFollowReplacedRows();
     void cloudFolder();
     void masterData_data();
     void masterData();
@@ -529,6 +531,47 @@ void TestVDRReportSync::renumbering()
     if (forAll)
         QVERIFY2(summary.contains(QStringLiteral("Bericht 003-AB als Bericht 005-AB \n")),
                  qPrintable(summary));
+}
+
+// Attached documents follow the rows of a replaced report; a document whose row did not come back
+// is a pending removal, which discarding the working copy undoes.
+void TestVDRReportSync::documentsFollowReplacedRows()
+{
+    const QString path1 = exchangePath(kT1);
+    writeFullFile(path1, kT1);
+    QVERIFY(
+        execSql(path1, {QStringLiteral("UPDATE entry_constructionmaterial SET document = 'Plan.pdf'"),
+                        QStringLiteral("UPDATE entry_scheduleddelivery SET document = 'Lieferschein.pdf'")}));
+    import({path1});
+    const int entry = value(QStringLiteral("SELECT id FROM entry")).toInt();
+    const int material = value(QStringLiteral("SELECT id FROM entry_constructionmaterial")).toInt();
+    const int delivery = value(QStringLiteral("SELECT id FROM entry_scheduleddelivery")).toInt();
+    QVERIFY(VDRDocumentsDb::createDocumentsDb(m_diary));
+    const QString documents = VDRDocument::documentsDbPathFor(m_diary);
+    QVERIFY(execSql(documents,
+                    {QStringLiteral("INSERT INTO documents (id, entry_id, tablename, documentname, "
+                                    "document_content, record_id, status) VALUES (1, %1, "
+                                    "'entry_constructionmaterial', 'Plan.pdf', x'25504446', %2, 0), (2, %1, "
+                                    "'entry_scheduleddelivery', 'Lieferschein.pdf', x'25504446', %3, 0)")
+                         .arg(entry)
+                         .arg(material)
+                         .arg(delivery)}));
+
+    const QString path2 = exchangePath(kT2);
+    writeFullFile(path2, kT2);
+    QVERIFY(execSql(path2, {QStringLiteral("UPDATE entry_constructionmaterial SET document = 'Plan.pdf'")}));
+    import({path2});
+    const int newMaterial = value(QStringLiteral("SELECT id FROM entry_constructionmaterial")).toInt();
+    QVERIFY(newMaterial != material);
+    QCOMPARE(queryTexts(documents,
+                        QStringLiteral("SELECT record_id, entry_id, status, orig_record_id FROM documents "
+                                       "ORDER BY id")),
+             (QStringList{QStringLiteral("%1|%2|0|%3").arg(newMaterial).arg(entry).arg(material),
+                          QStringLiteral("%1|%2|2|-1").arg(delivery).arg(entry)}));
+    m_doc.reset();
+    QVERIFY(VDRDocumentsDb::resetChangesOnDocumentsDb(m_diary));
+    QCOMPARE(queryTexts(documents, QStringLiteral("SELECT record_id, status FROM documents ORDER BY id")),
+             (QStringList{QStringLiteral("%1|0").arg(material), QStringLiteral("%1|0").arg(delivery)}));
 }
 
 // Files found by their stamp, imported in stamp order, deleted once imported; links out of the
