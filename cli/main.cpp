@@ -482,7 +482,9 @@ int main(int argc, char* argv[])
         (first == QLatin1String("export-masterdata") || first == QLatin1String("follow-up")) &&
         args.size() == 3;
     const auto isOption = [](const QString& a) { return a.startsWith(QLatin1String("--")); };
-    if ((args.size() != 2 && !manyFiles && !twoFiles) ||
+    const bool needsMore = first == QLatin1String("import") || first == QLatin1String("export-masterdata") ||
+                           first == QLatin1String("follow-up");
+    if ((args.size() != 2 && !manyFiles && !twoFiles) || (needsMore && !manyFiles && !twoFiles) ||
         std::any_of(args.begin() + 1, args.end(), isOption)) {
         err(QStringLiteral("varduna-cli: expected COMMAND FILE; see varduna-cli --help"));
         return ExitUsage;

@@ -40,6 +40,8 @@ private slots:
     void newReportWithAllLists();
     void replacing_data();
     void replacing();
+    void reportsWithoutIdentity_data();
+    void reportsWithoutIdentity();
     void refusedFiles_data();
     void refusedFiles();
     void untrustedRows_data();
@@ -301,6 +303,53 @@ void TestVDRReportSync::replacing()
     } else {
         QCOMPARE(dump(), before);
     }
+}
+
+// Reports from before the identity are known by their id: deleted in the diary, still there, new.
+void TestVDRReportSync::reportsWithoutIdentity_data()
+{
+    QTest::addColumn<int>("appId");
+    QTest::addColumn<bool>("keepInDiary");
+    QTest::addColumn<QString>("section");
+    QTest::addColumn<QString>("ids");
+    QTest::newRow("deleted in the diary") << 5 << false << "da sie bereits gelöscht wurden:\n\nBericht 005\n"
+                                          << "";
+    QTest::newRow("still in the diary") << 5 << true << "Bericht 005 als Bericht 005 \n"
+                                        << "5|Dach";
+    QTest::newRow("beyond the diary's counter") << 9 << false << "Bericht 005 als Bericht 005 \n"
+                                                << "6|Dach";
+}
+
+void TestVDRReportSync::reportsWithoutIdentity()
+{
+    QFETCH(int, appId);
+    QFETCH(bool, keepInDiary);
+    QFETCH(QString, section);
+    QFETCH(QString, ids);
+    QSqlDatabase db = m_doc->database();
+    QVERIFY(QSqlQuery(db).exec(QStringLiteral(
+        "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, inspection_time_to, "
+        "env_time, "
+        "env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, deficiencies, "
+        "construction_material_sample, print_notice, print_telephone_notice) VALUES (5, 0, '005 (Entwurf)', "
+        "'2026-03-01', '07:00', '08:00', '08:00', '', '', '', '', '', 'alt', '', 0, 1, 1)")));
+    QVERIFY(QSqlQuery(db).exec(
+        QStringLiteral("UPDATE id_generator SET id_counter = 5 WHERE id_table = 'entry'")));
+    if (!keepInDiary)
+        QVERIFY(QSqlQuery(db).exec(QStringLiteral("DELETE FROM entry")));
+    m_doc->modelEntryAll()->select();
+    const QString path = exchangePath();
+    {
+        VDRExchangeFileBuilder file(path, QStringLiteral("Baustelle.vd2"));
+        QVERIFY(file.addReport(QStringLiteral("005"), QDate(2026, 3, 1), QDateTime(),
+                               {{"id", appId},
+                                {"user_id", QVariant()},
+                                {"creation_date", QVariant()},
+                                {"progress", "Dach"}}) > 0);
+    }
+    const QString summary = import({path});
+    QVERIFY2(summary.contains(section), qPrintable(summary));
+    QCOMPARE(rows(QStringLiteral("SELECT id, progress FROM entry")).join(QLatin1Char('|')), ids);
 }
 
 // Files refused as a whole: nothing of them arrives, and the file stays as it was.
