@@ -19,6 +19,7 @@
 
 #include <algorithm>
 #include <climits>
+#include <sys/stat.h>
 
 namespace {
 
@@ -80,6 +81,12 @@ bool writeDatabaseFile(const QString& connection, const QString& path,
     if (ok && !VDRFileOps::flush(temporary)) {
         ok = false;
         error = VDRFileOps::withReason(QString()).trimmed();
+    }
+    // A new file gets the usual permissions, not those of a private temporary file.
+    if (ok && !QFileInfo::exists(path)) {
+        const mode_t mask = ::umask(0);
+        ::umask(mask);
+        ::chmod(QFile::encodeName(temporary).constData(), 0666 & ~mask);
     }
     if (ok && !VDRFileOps::replaceFile(temporary, path)) {
         ok = false;
