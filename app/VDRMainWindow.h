@@ -40,6 +40,9 @@ public:
     int saveDocument(bool saveAs, bool withoutQuestion);
     // True when no document is open afterwards.
     bool closeDocument(bool askToSave);
+    // Imports one exchange file of the mobile app into the open diary, with the manual summary.
+    int importExchangeFile(const QString& path);
+    void updateGui4ManualReportExchangeFileImport();
 
     void addRecentFile(const QString& path);
     void removeRecentFile(const QString& path);
@@ -93,6 +96,9 @@ private slots:
     void on_actionVorschlagtexte_triggered();
     void on_actionHelpShowHelp_triggered();
     void on_actionHelpInfoDialog_triggered();
+    void on_actionExchangeReport_triggered();
+    void on_actionExchangeReport_2_triggered();
+    void on_actionExportMasterData_triggered();
     void slotReportDatesChanged(const QList<QDate>& dates);
     void on_actionSettingsProjectData_triggered();
     void on_actionSettingsCompanyList_triggered();

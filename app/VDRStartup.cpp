@@ -36,8 +36,15 @@ bool VDRStartup::openFirstDocument(VDRMainWindow& window, const QString& path)
     if (path.isEmpty())
         return false;
     if (isExchangeFile(path)) {
-        refuseExchangeFile(path);
-        return false;
+        if (!QFileInfo(path).isFile()) {
+            refuseExchangeFile(path);
+            return false;
+        }
+        // The app's reports go into a new diary, which the user then saves under a name.
+        if (!window.createDocument(true))
+            return false;
+        window.importExchangeFile(QFileInfo(path).absoluteFilePath());
+        return true;
     }
     return window.openDocument(path, false, true) == 0;
 }
@@ -50,15 +57,7 @@ bool VDRStartup::isExchangeFile(const QString& path)
 void VDRStartup::refuseExchangeFile(const QString& path)
 {
     const QString native = QDir::toNativeSeparators(QFileInfo(path).absoluteFilePath());
-    if (!QFileInfo(path).isFile()) {
-        VDRPrompt::critical(tr("Dateifehler"), tr("Die Datei\n%1\nexistiert nicht.").arg(native));
-        return;
-    }
-    VDRPrompt::information(
-        tr("Import von Bauberichten"),
-        tr("Die Datei\n%1\nist eine Austauschdatei der mobilen App.\nDas Importieren von Bauberichten aus "
-           "Austauschdateien ist in dieser Version noch nicht möglich. Die Datei bleibt unverändert.")
-            .arg(native));
+    VDRPrompt::critical(tr("Dateifehler"), tr("Die Datei\n%1\nexistiert nicht.").arg(native));
 }
 
 QPair<QString, QStringList> VDRStartup::restartCommand(const QStringList& arguments,

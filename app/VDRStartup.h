@@ -27,12 +27,12 @@ public:
     static QString firstDocumentPath(const QString& desktopFile, QSettings& settings,
                                      const QStringList& arguments);
 
-    // Opens it; true when a document is open. An exchange file is explained, not opened.
+    // Opens it; true when a document is open. An exchange file is imported into a new diary.
     static bool openFirstDocument(VDRMainWindow& window, const QString& path);
 
     // An exchange file (".vdx") of the mobile app.
     static bool isExchangeFile(const QString& path);
-    // Until reports can be imported, says so (or that the file is missing) and leaves the file alone.
+    // Says that the exchange file given at start-up is missing.
     static void refuseExchangeFile(const QString& path);
 
     // What to start when the event loop ended with the restart code: this very program, with the

@@ -125,7 +125,7 @@ int main(int argc, char* argv[])
         QObject::connect(&app, &QGuiApplication::lastWindowClosed, &app, &QCoreApplication::quit);
         QObject::connect(&app, &VDRApplication::fileOpenRequested, &window, [&window](const QString& path) {
             if (VDRStartup::isExchangeFile(path))
-                VDRStartup::refuseExchangeFile(path);
+                VDRStartup::openFirstDocument(window, path);
             else
                 window.openDocument(path, false, false);
         });

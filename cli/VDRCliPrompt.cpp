@@ -12,7 +12,7 @@ void print(const QString& line)
 
 void VDRCliPrompt::message(Kind, const QString& title, const QString& text)
 {
-    print(title.trimmed() + QStringLiteral(": ") + text);
+    print(title.trimmed().isEmpty() ? text : title.trimmed() + QStringLiteral(": ") + text);
 }
 
 VDRPrompt::StandardButton VDRCliPrompt::question(Kind kind, const QString& title, const QString& text,

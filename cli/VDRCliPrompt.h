@@ -22,6 +22,8 @@ public:
         message(Information, title, text);
     }
     void endNotice() override {}
+    // One line per step, so that a long import shows where it is.
+    void noticeText(const QString& text) override { message(Information, QString(), text); }
     void setBusy(bool) override {}
 
 private:

@@ -5,6 +5,8 @@
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
+#include "sync/VDRMasterDataExport.h"
+#include "sync/VDRReportSynchronisation.h"
 
 #include <QCoreApplication>
 #include <QDate>
@@ -66,6 +68,19 @@ const char* const kHelp =
     "                      their order: id and each company in the company and the person\n"
     "                      output format, frozen copies of locked reports marked; --json adds\n"
     "                      every field. Opens FILE as info does; exit codes as info.\n"
+    "  import FILE EXCHANGE.vdx... [--delete]\n"
+    "                      Import the reports (and newer master data) of the mobile app's exchange\n"
+    "                      files, in the order given, and save the diary. The summary goes to\n"
+    "                      stdout. With --delete, the files that were imported are deleted after\n"
+    "                      the diary was saved; refused files always stay.\n"
+    "  export-masterdata FILE OUT.mdd\n"
+    "                      Write the master-data file for the mobile app (project data, companies,\n"
+    "                      locked reports). FILE is only read.\n"
+    "  follow-up FILE NEW.vd2\n"
+    "                      Start a follow-up diary NEW.vd2 with FILE's project data, companies and\n"
+    "                      address lists, knowing FILE's report numbers, with one first report;\n"
+    "                      FILE records where its master data went and is saved. An existing\n"
+    "                      NEW.vd2 is refused.\n"
     "\n"
     "Options:\n"
     "  --yes               Answer questions with their affirmative default (without it every\n"
@@ -81,6 +96,20 @@ const char* const kHelp =
     "  2  refused or failed (the message on stderr says why)\n"
     "  3  not saved: a question was answered with its cancelling choice (try --yes),\n"
     "     or the file cannot be saved (demo project, no write permission)\n"
+    "\n"
+    "Exit codes of import:\n"
+    "  0  every file imported, diary saved\n"
+    "  1  usage error\n"
+    "  2  the diary could not be opened or saved\n"
+    "  3  not saved: a question was answered with its cancelling choice (try --yes)\n"
+    "  4  some files were refused or not fully imported (the message on stderr says why);\n"
+    "     what was imported is saved\n"
+    "\n"
+    "Exit codes of export-masterdata and follow-up:\n"
+    "  0  written\n"
+    "  1  usage error\n"
+    "  2  refused or failed (the message on stderr says why)\n"
+    "  3  cancelled: a question was answered with its cancelling choice (try --yes)\n"
     "\n"
     "Exit codes of restore:\n"
     "  0  restored\n"
@@ -339,6 +368,93 @@ int cmdCheck(const QString& file, bool json)
     return exitCodes[r.status];
 }
 
+int cmdImport(const QString& file, const QStringList& exchangeFiles, bool deleteImported)
+{
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    QStringList paths;
+    for (const QString& path : exchangeFiles)
+        paths << QFileInfo(path).absoluteFilePath();
+    VDRReportSynchronisation sync(&doc);
+    sync.setShowSummary(false);
+    bool projectDataChanged = false;
+    // Files are deleted only once the diary holding their reports is saved.
+    const int failed = sync.importReportExchangeFiles(paths, false, projectDataChanged);
+    out() << sync.lastSummary();
+    out().flush();
+    int result = 0;
+    if (!sync.importedFiles().isEmpty() || doc.isStateModified()) {
+        const int shown = VDRPrompt::messagesShown();
+        result = doc.saveDocument(QString());
+        if (result == 2 && VDRPrompt::messagesShown() == shown)
+            VDRPrompt::critical(QObject::tr("Fehler"),
+                                QObject::tr("Beim Speichern des Dokuments ist ein Fehler aufgetreten!"));
+    }
+    doc.closeDocument();
+    if (result != 0)
+        return result == 1 ? 3 : ExitRefused;
+    if (deleteImported) {
+        for (const QString& path : sync.importedFiles()) {
+            if (!VDRFileOps::remove(path))
+                VDRPrompt::warning(
+                    QObject::tr("Dateifehler"),
+                    QObject::tr("Die importierte Austauschdatei\n%1\nkonnte nicht gelöscht werden.\n"
+                                "Bitte löschen Sie diese Datei manuell.")
+                        .arg(path));
+        }
+    }
+    return failed > 0 ? 4 : ExitOk;
+}
+
+int cmdExportMasterData(const QString& file, const QString& target)
+{
+    VDRDocument doc;
+    // Reading only: the diary and anything beside it stay as they are.
+    doc.setInspecting(true);
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    const bool ok = VDRMasterDataExport::writeMasterDataFile(&doc, QFileInfo(target).absoluteFilePath());
+    doc.closeDocument();
+    if (!ok)
+        return ExitRefused;
+    out() << QFileInfo(target).absoluteFilePath() << "\n";
+    return ExitOk;
+}
+
+int cmdFollowUp(const QString& file, const QString& target)
+{
+    if (QFileInfo::exists(target)) {
+        VDRPrompt::critical(
+            QObject::tr("Dateifehler"),
+            QObject::tr("Die Datei\n%1\nexistiert bereits.").arg(QFileInfo(target).absoluteFilePath()));
+        return ExitRefused;
+    }
+    VDRDocument doc;
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    bool exported = false;
+    QString exportedTo;
+    VDRMasterDataExport::check4ExportedMasterData(&doc, exported, exportedTo);
+    if (exported && VDRPrompt::instance()->question(
+                        VDRPrompt::Question, QObject::tr("Hinweis"),
+                        QObject::tr("Die Stammdaten dieser Datei wurden bereits exportiert nach "
+                                    "%0.\nExport der Stammdaten fortsetzen?")
+                            .arg(exportedTo),
+                        VDRPrompt::Yes | VDRPrompt::No, VDRPrompt::Yes, VDRPrompt::No) != VDRPrompt::Yes) {
+        doc.closeDocument();
+        return 3;
+    }
+    int result = VDRMasterDataExport::createFollowUpDiary(&doc, target);
+    if (result == 0)
+        result = doc.saveDocument(QString()) == 0 ? 0 : 2;
+    doc.closeDocument();
+    if (result != 0)
+        return result == 1 ? ExitRefused : ExitRefused;
+    out() << QFileInfo(target).absoluteFilePath() << "\n";
+    return ExitOk;
+}
+
 // The user hears from the program through the prompt; Qt's own log lines are for developers.
 void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QString& message)
 {
@@ -359,11 +475,22 @@ int main(int argc, char* argv[])
     QStringList args = QCoreApplication::arguments().mid(1);
     const bool yes = args.removeAll(QStringLiteral("--yes")) > 0;
     const bool json = args.removeAll(QStringLiteral("--json")) > 0;
+    const bool deleteImported = args.removeAll(QStringLiteral("--delete")) > 0;
     if (args.contains(QStringLiteral("-h")) || args.contains(QStringLiteral("--help"))) {
         std::fputs(kHelp, stdout);
         return ExitOk;
     }
-    if (args.size() != 2 || args[1].startsWith(QLatin1String("--"))) {
+    // Commands that take more than one file.
+    const QString first = args.value(0);
+    const bool manyFiles = first == QLatin1String("import") && args.size() >= 3;
+    const bool twoFiles =
+        (first == QLatin1String("export-masterdata") || first == QLatin1String("follow-up")) &&
+        args.size() == 3;
+    const auto isOption = [](const QString& a) { return a.startsWith(QLatin1String("--")); };
+    const bool needsMore = first == QLatin1String("import") || first == QLatin1String("export-masterdata") ||
+                           first == QLatin1String("follow-up");
+    if ((args.size() != 2 && !manyFiles && !twoFiles) || (needsMore && !manyFiles && !twoFiles) ||
+        std::any_of(args.begin() + 1, args.end(), isOption)) {
         err(QStringLiteral("varduna-cli: expected COMMAND FILE; see varduna-cli --help"));
         return ExitUsage;
     }
@@ -388,6 +515,12 @@ int main(int argc, char* argv[])
         result = cmdCompact(file);
     else if (command == QLatin1String("companies"))
         result = cliListCompanies(file, json, out());
+    else if (command == QLatin1String("export-masterdata") && twoFiles)
+        result = cmdExportMasterData(file, args[2]);
+    else if (command == QLatin1String("follow-up") && twoFiles)
+        result = cmdFollowUp(file, args[2]);
+    else if (command == QLatin1String("import") && manyFiles)
+        result = cmdImport(file, args.mid(2), deleteImported);
     else {
         err(QStringLiteral("varduna-cli: unknown command '%1'; see varduna-cli --help").arg(command));
         result = ExitUsage;

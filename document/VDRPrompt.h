@@ -66,6 +66,8 @@ public:
     virtual void endNotice() = 0;
     // How far the work of the open notice has come, 0 to 100.
     virtual void noticeProgress(int percent) { Q_UNUSED(percent) }
+    // Replaces the text of the open notice (a running count, say).
+    virtual void noticeText(const QString& text) { Q_UNUSED(text) }
 
     // Nesting busy cursor.
     virtual void setBusy(bool busy) = 0;

@@ -129,6 +129,14 @@ void VDRWidgetPrompt::noticeProgress(int percent)
     m_notice->setValue(qBound(0, percent, 100));
 }
 
+void VDRWidgetPrompt::noticeText(const QString& text)
+{
+    if (!m_notice)
+        return;
+    m_notice->setLabelText(text);
+    QApplication::processEvents(QEventLoop::ExcludeUserInputEvents);
+}
+
 void VDRWidgetPrompt::endNotice()
 {
     if (!m_notice)

@@ -25,6 +25,7 @@ public:
     void beginNotice(const QString& title, const QString& text) override;
     void endNotice() override;
     void noticeProgress(int percent) override;
+    void noticeText(const QString& text) override;
     void setBusy(bool busy) override;
 
 private:

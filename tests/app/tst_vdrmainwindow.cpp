@@ -1,3 +1,4 @@
+#include "VDRExchangeFileBuilder.h"
 #include "VDRTestFixtures.h"
 #include "VDRTestPrompt.h"
 #include "app/KeyPressEater.h"
@@ -20,6 +21,7 @@
 #include <QPushButton>
 #include <QScreen>
 #include <QSettings>
+#include <QSqlQuery>
 #include <QStatusBar>
 #include <QTemporaryDir>
 #include <QToolBar>
@@ -483,6 +485,54 @@ private slots:
         QVERIFY(m_window->closeDocument(true));
     }
 
+    void exchangeAndFollowUpCommands_data()
+    {
+        QTest::addColumn<bool>("saveNow");
+        QTest::newRow("save now, delete the file") << true;
+        QTest::newRow("save later, keep the file") << false;
+    }
+
+    // Importing an exchange file from the menu, and copying the master data into a follow-up diary.
+    void exchangeAndFollowUpCommands()
+    {
+        QFETCH(bool, saveNow);
+        const QString path = diary(QStringLiteral("Haus.vd2"));
+        QCOMPARE(m_window->openDocument(path, false, true), 0);
+        const QString vdx = m_dir.filePath(QStringLiteral("Haus.2026-03-07T16-05-09.vdx"));
+        QFile::remove(vdx);
+        {
+            VDRExchangeFileBuilder file(vdx, QStringLiteral("Haus.vd2"));
+            QVERIFY(file.addReport(QStringLiteral("002"), QDate(2026, 3, 7),
+                                   QDateTime(QDate(2026, 3, 7), QTime(7, 0)), {{"locked", 1}}) > 0);
+        }
+        QAction* import = m_window->ui().action(QStringLiteral("actionExchangeReport_2"));
+        QVERIFY(import->isEnabled());
+        m_prompt.expectFileName(vdx);
+        m_prompt.expect(QStringLiteral("Import einer Austauschdatei"));
+        m_prompt.expectTicked(
+            QStringLiteral("Ergebnis der Synchronisation"),
+            QStringLiteral("\nNach dem Import von Berichten sollte das Varduna gespeichert werden.\n"),
+            saveNow ? 0 : 1);
+        if (saveNow)
+            m_prompt.expect(QStringLiteral("Datenbank bereinigen"), QStringLiteral("wird jetzt bereinigt"));
+        import->trigger();
+        QCOMPARE(m_window->document()->modelEntryAll()->rowCount(), 2);
+        QVERIFY(!QFileInfo::exists(vdx)); // ticked: deleted, after saving when saving now
+        QCOMPARE(queryValue(path, QStringLiteral("SELECT count(*) FROM entry")).toInt(), saveNow ? 2 : 1);
+
+        const QString next = m_dir.filePath(QStringLiteral("Haus 2.vd2"));
+        QFile::remove(next);
+        if (!saveNow)
+            m_prompt.expect(QStringLiteral("Stammdaten Export"), QStringLiteral("vor dem Exportieren"),
+                            VDRPrompt::Yes);
+        m_prompt.expectFileName(next);
+        m_window->ui().action(QStringLiteral("actionExportMasterData"))->trigger();
+        QCOMPARE(queryTexts(next, QStringLiteral("SELECT number FROM entry")), QStringList{"003 (Entwurf)"});
+        QCOMPARE(
+            queryValue(path, QStringLiteral("SELECT value FROM meta WHERE key = 'exportedTo'")).toString(),
+            next);
+    }
+
     void sessionEndKeepsUnsavedWorkForNextOpening_data()
     {
         QTest::addColumn<bool>("modified");
@@ -580,8 +630,8 @@ private slots:
         QTest::addColumn<QString>("kind");
         QTest::addColumn<bool>("opened");
         QTest::newRow("diary") << "diary" << true;
-        // Until reports can be imported, an exchange file is explained and left untouched.
-        QTest::newRow("exchange file") << "vdx" << false;
+        // An exchange file is imported into a new diary and left untouched.
+        QTest::newRow("exchange file") << "vdx" << true;
         QTest::newRow("missing exchange file") << "missing vdx" << false;
         QTest::newRow("missing file") << "missing" << false;
     }
@@ -597,9 +647,15 @@ private slots:
         } else if (kind == QLatin1String("vdx")) {
             path = m_dir.filePath(QStringLiteral("vom Handy.vdx"));
             QFile::remove(path);
-            QVERIFY(createDiary(path));
+            {
+                VDRExchangeFileBuilder file(path, QStringLiteral("vom Handy.vd2"));
+                QVERIFY(file.addReport(QStringLiteral("004"), QDate(2026, 3, 7),
+                                       QDateTime(QDate(2026, 3, 7), QTime(7, 0)), {{"locked", 1}}) > 0);
+            }
             hash = fileHash(path);
-            m_prompt.expect(QStringLiteral("Import von Bauberichten"), QStringLiteral("noch nicht möglich"));
+            m_prompt.expect(QStringLiteral("Import einer Austauschdatei"));
+            m_prompt.expect(QStringLiteral("Ergebnis der Synchronisation"),
+                            QStringLiteral("Bericht 004-AB als Bericht 004-AB"), 1);
         } else {
             if (kind == QLatin1String("missing vdx"))
                 path = m_dir.filePath(QStringLiteral("nicht da.vdx"));
@@ -609,6 +665,11 @@ private slots:
         }
         QCOMPARE(VDRStartup::openFirstDocument(*m_window, path), opened);
         QCOMPARE(m_window->document()->isStateValid(), opened);
+        if (kind == QLatin1String("vdx")) {
+            QSqlQuery q(m_window->document()->database());
+            QVERIFY(q.exec(QStringLiteral("SELECT count(*) FROM entry WHERE number = '004'")) && q.next());
+            QCOMPARE(q.value(0).toInt(), 1);
+        }
         if (!hash.isEmpty()) {
             QCOMPARE(fileHash(path), hash);
             QCOMPARE(QDir(m_dir.path()).entryList({QStringLiteral("vom Handy*")}, QDir::Files),
