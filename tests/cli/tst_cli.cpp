@@ -353,9 +353,7 @@ void TestCli::saveRunRepeatedlyRotatesBackups()
     }
     QStringList found;
     for (const QString& name : QDir(folder).entryList(QDir::Files, QDir::Name))
-        found << name + QStringLiteral(": ") +
-                     queryValue(folder + QLatin1Char('/') + name, QStringLiteral("SELECT name FROM vdr"))
-                         .toString();
+        found << name + QStringLiteral(": ") + projectNameIn(folder + QLatin1Char('/') + name);
     QCOMPARE(found, expected);
     QSettings().remove(QStringLiteral("file/NumberOfBackups"));
 }
@@ -410,7 +408,7 @@ void TestCli::restore()
     QCOMPARE(r.exitCode, exitCode);
     if (exitCode == 0) {
         QCOMPARE(r.out, folder + QStringLiteral("/rERROR.01.vd2\n"));
-        QCOMPARE(queryValue(path, "SELECT name FROM vdr").toString(), QStringLiteral("Stand 1"));
+        QCOMPARE(projectNameIn(path), QStringLiteral("Stand 1"));
         QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
     } else if (exitCode == 3) {
         QVERIFY(r.err.contains(QStringLiteral("Die Backup-Dateien sind ebenfalls beschädigt.")));

@@ -160,14 +160,12 @@ private slots:
     void importReplacesOnlyLanguagesInFile()
     {
         QTemporaryDir cloud;
-        QFile file(VDRCompleterExchange::completerFilePath(cloud.path()));
-        QVERIFY(file.open(QIODevice::WriteOnly));
         // As another installation may write it: English only under "USA".
-        file.write(
+        QVERIFY(VDRTestFixtures::writeFile(
+            VDRCompleterExchange::completerFilePath(cloud.path()),
             "<?xml version=\"1.0\"?>\n<Settings><German><Notizen><tableID>0</tableID><simple><enabled>true"
             "</enabled><values><value_1><centry>neu</centry></value_1><size>1</size></values></simple>"
-            "</Notizen></German><USA><Notes><tableID>0</tableID></Notes></USA></Settings>\n");
-        file.close();
+            "</Notizen></German><USA><Notes><tableID>0</tableID></Notes></USA></Settings>\n"));
         fillRealisticStore();
         const QMap<QString, QString> before = completerSnapshot();
 
@@ -216,10 +214,7 @@ private slots:
         const QMap<QString, QString> before = completerSnapshot();
         QTemporaryDir cloud;
         const QString path = VDRCompleterExchange::completerFilePath(cloud.path());
-        QFile file(path);
-        QVERIFY(file.open(QIODevice::WriteOnly));
-        file.write(content);
-        file.close();
+        QVERIFY(VDRTestFixtures::writeFile(path, content));
 
         m_prompt.expect("Fehler bei Synchronisation der Autovervollständigen-Texte",
                         "Fehler beim Lesen der Austausch-Datei für Autovervollständigen-Texte\n" + path +
