@@ -146,17 +146,11 @@ void TestCli::newLeavesNoDocumentsOfAnEarlierDiary()
 void TestCli::newRefusesExistingFile()
 {
     const QString path = m_dir.filePath(QStringLiteral("vorhanden.vd2"));
-    {
-        QFile f(path);
-        QVERIFY(f.open(QIODevice::WriteOnly));
-        f.write("wichtig");
-    }
+    QVERIFY(writeFile(path, "wichtig"));
     const Run r = cli({QStringLiteral("new"), path});
     QCOMPARE(r.exitCode, 2);
     QVERIFY(r.err.startsWith(QLatin1String("Dateifehler: Die Datei\n")));
-    QFile f(path);
-    QVERIFY(f.open(QIODevice::ReadOnly));
-    QCOMPARE(f.readAll(), QByteArray("wichtig"));
+    QCOMPARE(fileHash(path), QCryptographicHash::hash("wichtig", QCryptographicHash::Sha256));
 }
 
 void TestCli::infoListsReports_data()
@@ -224,32 +218,22 @@ void TestCli::checkExitCodes_data()
     QTest::addColumn<QString>("kind");
     QTest::addColumn<int>("exitCode");
     QTest::addColumn<QString>("status");
-    QTest::addColumn<QString>(
-        "refusal"); // the title with which opening refuses, for the cases check predicts
-    QTest::newRow("intact") << "intact" << 0 << "can be opened"
-                            << "";
-    QTest::newRow("missing") << "missing" << 2 << "missing"
-                             << "Dateifehler";
-    QTest::newRow("folder") << "folder" << 2 << "missing"
-                            << "Dateifehler";
-    QTest::newRow("damaged") << "damaged" << 3 << "damaged"
-                             << "-";
-    QTest::newRow("not a diary") << "text" << 3 << "damaged"
-                                 << "-";
-    QTest::newRow("newer") << "newer" << 5 << "made by a newer version"
-                           << "Datei öffnen";
-    QTest::newRow("no meta table") << "no meta" << 6 << "cannot be opened"
-                                   << "SQL Error";
-    QTest::newRow("no vdr table") << "no vdr" << 6 << "cannot be opened"
-                                  << "Datenbankfehler";
-    QTest::newRow("renamed meta columns") << "renamed" << 6 << "cannot be opened"
-                                          << "SQL Error";
-    QTest::newRow("leftover dummy row") << "dummy" << 0 << "can be opened"
-                                        << "";
-    QTest::newRow("WAL mode") << "wal" << 0 << "can be opened"
-                              << "";
-    QTest::newRow("folder without write access") << "immutable" << 6 << "cannot be opened"
-                                                 << "Dateifehler";
+    // The title with which opening refuses, for the cases check predicts.
+    QTest::addColumn<QString>("refusal");
+    // clang-format off
+    QTest::newRow("intact") << "intact" << 0 << "can be opened" << "";
+    QTest::newRow("missing") << "missing" << 2 << "missing" << "Dateifehler";
+    QTest::newRow("folder") << "folder" << 2 << "missing" << "Dateifehler";
+    QTest::newRow("damaged") << "damaged" << 3 << "damaged" << "-";
+    QTest::newRow("not a diary") << "text" << 3 << "damaged" << "-";
+    QTest::newRow("newer") << "newer" << 5 << "made by a newer version" << "Datei öffnen";
+    QTest::newRow("no meta table") << "no meta" << 6 << "cannot be opened" << "SQL Error";
+    QTest::newRow("no vdr table") << "no vdr" << 6 << "cannot be opened" << "Datenbankfehler";
+    QTest::newRow("renamed meta columns") << "renamed" << 6 << "cannot be opened" << "SQL Error";
+    QTest::newRow("leftover dummy row") << "dummy" << 0 << "can be opened" << "";
+    QTest::newRow("WAL mode") << "wal" << 0 << "can be opened" << "";
+    QTest::newRow("folder without write access") << "immutable" << 6 << "cannot be opened" << "Dateifehler";
+    // clang-format on
 }
 
 void TestCli::checkExitCodes()
@@ -264,9 +248,7 @@ void TestCli::checkExitCodes()
     if (kind == QLatin1String("folder")) {
         QDir().mkpath(path);
     } else if (kind == QLatin1String("text")) {
-        QFile f(path);
-        QVERIFY(f.open(QIODevice::WriteOnly));
-        f.write("kein Tagebuch");
+        QVERIFY(writeFile(path, "kein Tagebuch"));
     } else if (kind != QLatin1String("missing")) {
         QVERIFY(createDiary(path));
         if (kind == QLatin1String("damaged"))
@@ -316,8 +298,7 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
     const QString path = m_dir.filePath(QStringLiteral("in Bearbeitung.vd2"));
     QVERIFY(createDiary(path));
     VDRDocument doc;
-    bool showError = true;
-    QVERIFY(doc.openDocument(path, showError));
+    QVERIFY(openDiary(doc, path));
 
     const QString holder = QStringLiteral("User: %1\nComputer: %2\nseit dem %3 ")
                                .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName(),
@@ -338,8 +319,7 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
                                    .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName())));
 
     // The holder is undisturbed: it can still write and close cleanly.
-    QVERIFY(doc.modelVdr()->setData(0, QStringLiteral("name"), QStringLiteral("weiter bearbeitet")));
-    QVERIFY(doc.modelVdr()->submitAll());
+    QVERIFY(setProjectName(doc, QStringLiteral("weiter bearbeitet")));
     QVERIFY(doc.closeDocument());
     QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
 }
@@ -373,9 +353,7 @@ void TestCli::saveRunRepeatedlyRotatesBackups()
     }
     QStringList found;
     for (const QString& name : QDir(folder).entryList(QDir::Files, QDir::Name))
-        found << name + QStringLiteral(": ") +
-                     queryValue(folder + QLatin1Char('/') + name, QStringLiteral("SELECT name FROM vdr"))
-                         .toString();
+        found << name + QStringLiteral(": ") + projectNameIn(folder + QLatin1Char('/') + name);
     QCOMPARE(found, expected);
     QSettings().remove(QStringLiteral("file/NumberOfBackups"));
 }
@@ -430,7 +408,7 @@ void TestCli::restore()
     QCOMPARE(r.exitCode, exitCode);
     if (exitCode == 0) {
         QCOMPARE(r.out, folder + QStringLiteral("/rERROR.01.vd2\n"));
-        QCOMPARE(queryValue(path, "SELECT name FROM vdr").toString(), QStringLiteral("Stand 1"));
+        QCOMPARE(projectNameIn(path), QStringLiteral("Stand 1"));
         QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
     } else if (exitCode == 3) {
         QVERIFY(r.err.contains(QStringLiteral("Die Backup-Dateien sind ebenfalls beschädigt.")));
@@ -441,10 +419,7 @@ void TestCli::compactReportsSizes()
 {
     const QString path = m_dir.filePath(QStringLiteral("kompakt.vd2"));
     QVERIFY(createDiary(path));
-    QVERIFY(execSql(
-        path, {"INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, thumbnail_ct, "
-               "thumbnail_width, thumbnail_height) VALUES (zeroblob(2000000), 'image/jpeg', 1, 1, "
-               "zeroblob(10), 'image/jpeg', 1, 1)"}));
+    QVERIFY(execSql(path, {imageInsertSql(2000000)}));
     const Run r = cli({QStringLiteral("compact"), path});
     QCOMPARE(r.exitCode, 0);
     const QStringList lines = r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);

@@ -125,8 +125,7 @@ private slots:
 
         // A current file opens without an upgrade and without a word.
         VDRDocument doc;
-        bool showError = true;
-        QVERIFY(doc.openDocument(path, showError));
+        QVERIFY(openDiary(doc, path));
         QVERIFY(!doc.isStructureExtended());
         QCOMPARE(doc.fileVersion(), QStringLiteral("0.4"));
         QVERIFY(m_prompt.messages.isEmpty());
@@ -262,9 +261,8 @@ private slots:
         const QByteArray before = fileHash(path);
 
         VDRDocument doc;
-        bool showError = true;
         m_prompt.expect(QStringLiteral("SQL Error"));
-        QVERIFY(!doc.openDocument(path, showError));
+        QVERIFY(!openDiary(doc, path));
         QVERIFY(!doc.isStateValid());
         QCOMPARE(fileHash(path), before);
         // A half-upgraded working copy must not be resumed next time.
@@ -286,10 +284,9 @@ private:
     QString openUpgradedWorkingCopy(const QString& path)
     {
         VDRDocument doc;
-        bool showError = true;
         m_prompt.expect(QStringLiteral("Datei-Warnung"),
                         QStringLiteral("Die Struktur des Dokuments wird jetzt erweitert"));
-        if (!doc.openDocument(path, showError))
+        if (!openDiary(doc, path))
             return QString();
         const QString copy = path + QStringLiteral(".upgraded");
         QFile::remove(copy);

@@ -58,12 +58,6 @@ QString documentInsert(int id, const QString& table, const QString& name, qint64
              QString::number(status), QString::number(origRecordId), QString::number(origEntryId));
 }
 
-bool open(VDRDocument& doc, const QString& diary)
-{
-    bool showError = true;
-    return doc.openDocument(diary, showError);
-}
-
 // A file of 'bytes' bytes; large ones are sparse and cost no disk.
 QString makeFile(const QString& path, qint64 bytes)
 {
@@ -184,7 +178,7 @@ private slots:
         const QString plan = makeFile(m_dir.filePath(QStringLiteral("outside/plan.pdf")), 3000);
 
         VDRDocument doc;
-        QVERIFY(open(doc, diary));
+        QVERIFY(openDiary(doc, diary));
         const int entryId = queryValue(diary, QStringLiteral("SELECT MIN(id) FROM entry")).toInt();
         QCOMPARE(VDRDocumentsDb::addDocument(&doc, kMaterial, 1, entryId, plan), QStringLiteral("plan.pdf"));
         QCOMPARE(documentRows(diary), QStringList{kMaterial + QStringLiteral("|1|plan.pdf|1")});
@@ -233,7 +227,7 @@ private slots:
             QVERIFY(!makeFile(file, bytes).isEmpty());
 
         VDRDocument doc;
-        QVERIFY(open(doc, diary));
+        QVERIFY(openDiary(doc, diary));
         m_prompt.expect(title, textPart);
         QVERIFY(VDRDocumentsDb::addDocument(&doc, kMaterial, 1, 1, file).isEmpty());
         QVERIFY(doc.closeDocument());
@@ -290,7 +284,7 @@ private slots:
         if (!title.isEmpty())
             m_prompt.expect(title, textPart);
         VDRDocument doc;
-        QVERIFY(open(doc, diary));
+        QVERIFY(openDiary(doc, diary));
         QCOMPARE(doc.metaValue(QStringLiteral("documentImport")), QStringLiteral("done"));
         QSqlQuery q(doc.database());
         QVERIFY(q.exec(QStringLiteral("SELECT document FROM entry_constructionmaterial WHERE id = 1")) &&
@@ -315,7 +309,7 @@ private slots:
         // While the diary is open a discard must still get the saved documents back.
         {
             VDRDocument doc;
-            QVERIFY(open(doc, diary));
+            QVERIFY(openDiary(doc, diary));
             withDocumentsDb(diary, [&doc](QSqlDatabase db) {
                 QCOMPARE(VDRDocumentsDb::removeDeadRecordsInDocumentDB(db, doc.database()), 2);
             });
@@ -329,7 +323,7 @@ private slots:
         // The diary's compaction judges by the working copy: a document of an unsaved row survives it.
         {
             VDRDocument doc;
-            QVERIFY(open(doc, diary));
+            QVERIFY(openDiary(doc, diary));
             QVERIFY(QSqlQuery(doc.database()).exec(materialInsert("neu.pdf", 2)));
             const QString file = makeFile(m_dir.filePath(QStringLiteral("neu.pdf")), 100);
             QCOMPARE(VDRDocumentsDb::addDocument(&doc, kMaterial, 2, 1, file), QStringLiteral("neu.pdf"));

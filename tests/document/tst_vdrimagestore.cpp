@@ -11,6 +11,8 @@
 
 #include <libexif/exif-data.h>
 
+#include <memory>
+
 namespace {
 const QColor kMarker(Qt::red);
 
@@ -82,12 +84,6 @@ QByteArray claimingSize(int width, int height)
     return bytes;
 }
 
-bool writeBytes(const QString& path, const QByteArray& bytes)
-{
-    QFile file(path);
-    return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size();
-}
-
 // Decoded pictures and the row's metadata agree on the expected sizes.
 void verifyStored(VDRDocument& doc, int id, const QSize& stored, const QSize& thumbnail)
 {
@@ -107,11 +103,12 @@ class TestVDRImageStore : public QObject
     Q_OBJECT
     QTemporaryDir m_dir;
     VDRTestPrompt m_prompt;
+    std::unique_ptr<VDRDocument> m_doc;
 
     QString fixture(const QString& name, const QByteArray& bytes)
     {
         const QString path = m_dir.filePath(name);
-        return writeBytes(path, bytes) ? path : QString();
+        return VDRTestFixtures::writeFile(path, bytes) ? path : QString();
     }
 
 private slots:
@@ -121,12 +118,21 @@ private slots:
         VDRTestFixtures::isolateSettings(m_dir.filePath(QStringLiteral("settings")));
         qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
     }
+    // Every test works on a new diary of its own.
     void init()
     {
         m_prompt.reset();
         QSettings().remove(VDRDocument::imageSizeSettingsKey());
+        m_doc = std::make_unique<VDRDocument>();
+        QVERIFY(m_doc->createDocument(true));
     }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
+    void cleanup()
+    {
+        if (m_doc->isStateValid())
+            QVERIFY(m_doc->closeDocument());
+        m_doc.reset();
+        VDR_VERIFY_PROMPT(m_prompt);
+    }
 
     void photoIsFittedAndTurnedUpright_data()
     {
@@ -164,15 +170,13 @@ private slots:
             bytes = withOrientation(bytes, orientation);
         const QString path = fixture(QStringLiteral("photo.jpg"), bytes);
 
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         const int id = doc.createImage(path);
         QVERIFY(id > 0);
         QVERIFY(doc.isStateModified());
         verifyStored(doc, id, stored, thumbnail);
         QVERIFY2(upright(doc.getImage(id)), "the marker is not in the top-left corner");
         QVERIFY(upright(doc.getImageThumbnail(id)));
-        QVERIFY(doc.closeDocument());
     }
 
     void unusableFiles_data()
@@ -196,8 +200,7 @@ private slots:
         QFETCH(QString, warning);
         QFETCH(QSize, stored);
         const QString path = fixture(QStringLiteral("unusable.jpg"), bytes);
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         if (!warning.isEmpty())
             QTest::ignoreMessage(QtWarningMsg, QRegularExpression(warning));
         const int id = doc.createImage(path);
@@ -209,7 +212,6 @@ private slots:
             QVERIFY(doc.getImageIds().isEmpty());
         }
         QCOMPARE(doc.createImage(m_dir.filePath(QStringLiteral("missing.jpg"))), -1);
-        QVERIFY(doc.closeDocument());
     }
 
     void picturesKeepTheirSize_data()
@@ -237,8 +239,7 @@ private slots:
         QFETCH(QSize, size);
         QFETCH(QSize, stored);
         QFETCH(QSize, thumbnail);
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         // Transparent like a sketch: JPEG has no alpha, the background must come out white, not black.
         const QImage sketch = picture(size, true);
         const int id = doc.createImage(exchange ? picture(QSize(40, 30)) : sketch);
@@ -250,7 +251,6 @@ private slots:
         QVERIFY(upright(doc.getImage(id)));
         QVERIFY(!doc.exchangeImage(id + 1, sketch, fit));
         QCOMPARE(doc.createImage(QImage()), -1);
-        QVERIFY(doc.closeDocument());
     }
 
     void exportImage_data()
@@ -265,8 +265,7 @@ private slots:
     {
         QFETCH(QString, fileName);
         QFETCH(bool, written);
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         const int id = doc.createImage(picture(QSize(320, 200)));
         QVERIFY(id > 0);
         const QString path = m_dir.filePath(fileName);
@@ -279,13 +278,11 @@ private slots:
             QVERIFY(upright(exported));
         }
         QVERIFY(!doc.exportImage(id + 1, m_dir.filePath(QStringLiteral("none.png"))));
-        QVERIFY(doc.closeDocument());
     }
 
     void rowsAreCountedAndDeleted()
     {
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         const int used = doc.createImage(picture(QSize(64, 48)));
         const int unused = doc.createImage(picture(QSize(48, 64)));
         QVERIFY(used > 0 && unused > used);
@@ -310,13 +307,11 @@ private slots:
         QVERIFY(!doc.deleteImage(unused));
         // A new image never takes the id of a deleted one.
         QVERIFY(doc.createImage(picture(QSize(10, 10))) > unused);
-        QVERIFY(doc.closeDocument());
     }
 
     void temporaryFilesAreWrittenOncePerOpening()
     {
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         const int id = doc.createImage(picture(QSize(400, 300)));
         QVERIFY(id > 0);
         const QDir folder(doc.temporaryFolder());
@@ -332,7 +327,7 @@ private slots:
         QCOMPARE(contents(thumbnail), doc.getImageThumbnailData(id));
 
         // Asked again, the file is handed out as it is, not written a second time.
-        QVERIFY(writeBytes(image, "marked"));
+        QVERIFY(VDRTestFixtures::writeFile(image, "marked"));
         QCOMPARE(doc.getImageTempPath(id), image);
         QCOMPARE(contents(image), QByteArray("marked"));
         // Removed by someone else, it is written again so that the path names a file.
@@ -349,13 +344,11 @@ private slots:
         QVERIFY(doc.deleteImage(id));
         QVERIFY(doc.getImageTempPath(id).isEmpty());
         QVERIFY(!QFile::exists(image));
-        QVERIFY(doc.closeDocument());
     }
 
     void uploadListAndClosing()
     {
-        VDRDocument doc;
-        QVERIFY(doc.createDocument(true));
+        VDRDocument& doc = *m_doc;
         const int first = doc.createImage(picture(QSize(400, 300)));
         const int second = doc.createImage(picture(QSize(300, 400)));
         QVERIFY(first > 0 && second > first);

@@ -170,13 +170,11 @@ private slots:
         auto edit = lineEdit(QStringLiteral("Import"));
         edit->ownCompleter()->appendEntry(QStringLiteral("alt"));
         QTemporaryDir cloud;
-        QFile file(VDRCompleterExchange::completerFilePath(cloud.path()));
-        QVERIFY(file.open(QIODevice::WriteOnly));
-        file.write(
+        QVERIFY(VDRTestFixtures::writeFile(
+            VDRCompleterExchange::completerFilePath(cloud.path()),
             "<Settings><German><Import><tableID>9</tableID><simple><enabled>true</enabled><values>"
             "<value_1><centry>neu</centry></value_1><value_2><centry>neuer</centry></value_2><size>2</size>"
-            "</values></simple></Import></German></Settings>");
-        file.close();
+            "</values></simple></Import></German></Settings>"));
 
         QVERIFY(VDRCompleterExchange::importSettingsFromXML(cloud.path()));
         QCOMPARE(edit->ownCompleter()->entries(), (QStringList{"neu", "neuer"}));

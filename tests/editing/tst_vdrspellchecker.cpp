@@ -109,11 +109,8 @@ private slots:
         QFETCH(QByteArray, before);
         QFETCH(QStringList, after);
         const QString userFile = m_dir.filePath(QStringLiteral("user_%1.txt").arg(QTest::currentDataTag()));
-        if (!before.isNull()) {
-            QFile f(userFile);
-            QVERIFY(f.open(QIODevice::WriteOnly));
-            f.write(before);
-        }
+        if (!before.isNull())
+            QVERIFY(VDRTestFixtures::writeFile(userFile, before));
         {
             VDRSpellChecker checker(dictionary(encoding), userFile);
             for (const QString& word : {QStringLiteral("Würfelprobe"), QStringLiteral("Ortbeton")}) {
@@ -170,11 +167,8 @@ private slots:
         QTemporaryDir dir;
         const QString base = dir.filePath(QStringLiteral("vdr_DE"));
         for (const auto& [suffix, text] : {std::pair{".DIC", dic}, std::pair{".AFF", aff}}) {
-            QFile f(base + QLatin1String(suffix));
-            if (!text.isNull()) {
-                QVERIFY(f.open(QIODevice::WriteOnly));
-                f.write(text.toUtf8());
-            }
+            if (!text.isNull())
+                QVERIFY(VDRTestFixtures::writeFile(base + QLatin1String(suffix), text.toUtf8()));
         }
         const QString message =
             missing.isEmpty() ? QStringLiteral("Fehler beim Initialisieren des Moduls Rechtschreibprüfung. "

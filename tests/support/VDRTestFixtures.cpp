@@ -55,18 +55,82 @@ bool createDiary(const QString& path)
     return ok;
 }
 
+bool openDiary(VDRDocument& doc, const QString& path)
+{
+    bool showError = true;
+    return doc.openDocument(path, showError);
+}
+
+bool setProjectName(VDRDocument& doc, const QString& name)
+{
+    return doc.modelVdr()->setData(0, QStringLiteral("name"), name) && doc.modelVdr()->submitAll();
+}
+
+bool saveGenerations(const QString& path, const QStringList& names)
+{
+    for (const QString& name : names) {
+        VDRDocument doc;
+        if (!openDiary(doc, path) || !setProjectName(doc, name) || doc.saveDocument() != 0 ||
+            !doc.closeDocument())
+            return false;
+    }
+    return true;
+}
+
+QString projectNameIn(const QString& path)
+{
+    return queryValue(path, QStringLiteral("SELECT name FROM vdr")).toString();
+}
+
+bool isIntact(const QString& path)
+{
+    return queryValue(path, QStringLiteral("PRAGMA quick_check")).toString() == QLatin1String("ok");
+}
+
+bool writeFile(const QString& path, const QByteArray& bytes)
+{
+    QFile file(path);
+    return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size() && file.flush();
+}
+
+QString imageInsertSql(qint64 bytes)
+{
+    return QStringLiteral("INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
+                          "thumbnail_ct, thumbnail_width, thumbnail_height) VALUES (zeroblob(%1), "
+                          "'image/jpeg', 1, 1, zeroblob(10), 'image/jpeg', 1, 1)")
+        .arg(bytes);
+}
+
+bool execOn(QSqlDatabase db, const QStringList& statements)
+{
+    for (const QString& sql : statements) {
+        QSqlQuery q(db);
+        if (!q.exec(sql)) {
+            qWarning().noquote() << "fixture SQL failed:" << sql << q.lastError().text();
+            return false;
+        }
+    }
+    return true;
+}
+
+QStringList textsOn(QSqlDatabase db, const QString& sql)
+{
+    QStringList result;
+    QSqlQuery q(db);
+    if (!q.exec(sql))
+        return {QStringLiteral("SQL failed: ") + q.lastError().text()};
+    while (q.next()) {
+        QStringList values;
+        for (int i = 0; i < q.record().count(); ++i)
+            values << (q.value(i).isNull() ? QStringLiteral("NULL") : q.value(i).toString());
+        result << values.join(QLatin1Char('|'));
+    }
+    return result;
+}
+
 bool execSql(const QString& path, const QStringList& statements)
 {
-    return withDb(path, [&](QSqlDatabase db) {
-        for (const QString& sql : statements) {
-            QSqlQuery q(db);
-            if (!q.exec(sql)) {
-                qWarning().noquote() << "fixture SQL failed:" << sql << q.lastError().text();
-                return false;
-            }
-        }
-        return true;
-    });
+    return withDb(path, [&](QSqlDatabase db) { return execOn(db, statements); });
 }
 
 QVariant queryValue(const QString& path, const QString& sql)

@@ -5,6 +5,8 @@
 #include <QStringList>
 #include <QVariant>
 
+class VDRDocument;
+
 // Fixtures built in code: diaries in the current and older layouts, damaged files, isolated settings.
 namespace VDRTestFixtures {
 
@@ -17,6 +19,25 @@ bool createDiary(const QString& path);
 // The oldest layout the upgrades know: every upgrade step has work to do. Holds one report with
 // workforce rows in the three-pair layout, materials with OK flags, progress rows with NOT NULL dates.
 bool createOldestLayoutDiary(const QString& path, const QString& fileVersion = QStringLiteral("0.1"));
+
+// Opens a diary as the window does (errors shown); false when it is refused.
+bool openDiary(VDRDocument& doc, const QString& path);
+// An unsaved change to the open diary: its project's new name.
+bool setProjectName(VDRDocument& doc, const QString& name);
+// Saves the diary once per name, each in an opening of its own: a backup generation per name.
+bool saveGenerations(const QString& path, const QStringList& names);
+// The project name a diary file holds, and whether SQLite's quick check finds it intact.
+QString projectNameIn(const QString& path);
+bool isIntact(const QString& path);
+bool writeFile(const QString& path, const QByteArray& bytes);
+
+// On an open document's own connection: its working copy is locked against any other.
+bool execOn(QSqlDatabase db, const QStringList& statements);
+// As queryTexts; a failed query shows as its error.
+QStringList textsOn(QSqlDatabase db, const QString& sql);
+
+// SQL for one JPEG picture row of 'bytes' zero bytes (a 1x1 picture as far as the row says).
+QString imageInsertSql(qint64 bytes);
 
 // Runs statements on a closed file; returns false on the first failure.
 bool execSql(const QString& path, const QStringList& statements);
