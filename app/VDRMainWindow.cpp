@@ -232,6 +232,9 @@ VDRMainWindow::~VDRMainWindow()
 {
     if (g_mainWindow == this)
         g_mainWindow = nullptr;
+    // The document outlives this part of the window; its closing must not update it.
+    disconnect(m_document, nullptr, this, nullptr);
+    delete m_document;
 }
 
 QDockWidget* VDRMainWindow::addDock(const QString& title, const QString& objectName, QWidget* content,

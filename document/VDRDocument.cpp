@@ -106,7 +106,11 @@ VDRDocument::VDRDocument(QObject* parent) : QObject(parent) {}
 
 VDRDocument::~VDRDocument()
 {
-    if (m_valid)
+    // Destroyed without being closed (the program ends some other way): unsaved changes stay in
+    // the working copy, which the next opening offers to resume.
+    if (m_valid && isStateModified())
+        closeKeepingWorkingCopy();
+    else if (m_valid)
         closeDocument();
 }
 

@@ -527,18 +527,27 @@ private slots:
     void sessionEndKeepsUnsavedWorkForNextOpening_data()
     {
         QTest::addColumn<bool>("modified");
-        QTest::newRow("unsaved changes") << true;
-        QTest::newRow("nothing changed") << false;
+        QTest::addColumn<bool>("windowDestroyed"); // the program ends without closing the diary
+        QTest::newRow("unsaved changes") << true << false;
+        QTest::newRow("nothing changed") << false << false;
+        QTest::newRow("window destroyed, unsaved changes") << true << true;
+        QTest::newRow("window destroyed, nothing changed") << false << true;
     }
 
     void sessionEndKeepsUnsavedWorkForNextOpening()
     {
         QFETCH(bool, modified);
+        QFETCH(bool, windowDestroyed);
         const QString path = diary(QStringLiteral("abmelden.vd2"));
         QCOMPARE(m_window->openDocument(path, false, true), 0);
         if (modified)
             QVERIFY(renameProject(QStringLiteral("Nicht gespeichert")));
-        m_window->endSession();
+        if (windowDestroyed) {
+            m_window.reset();
+            m_window = std::make_unique<VDRMainWindow>();
+        } else {
+            m_window->endSession();
+        }
         QCOMPARE(QFile::exists(path + QStringLiteral(".workingcopy")), modified);
         QCOMPARE(QFile::exists(VDRDocument::lockInfoPathFor(path)), modified);
 
