@@ -21,9 +21,11 @@
 #include <QSqlError>
 #include <QSqlQuery>
 #include <QSqlRecord>
+#include <QStorageInfo>
 #include <QTextStream>
 #include <QThread>
 
+#include <cerrno>
 #include <cstdlib>
 #include <ctime>
 #include <pwd.h>
@@ -260,15 +262,30 @@ void VDRDocument::beginTransaction()
     ++m_transactionDepth;
 }
 
-void VDRDocument::endTransaction()
+bool VDRDocument::endTransaction()
 {
     if (m_transactionDepth <= 0)
-        return;
-    if (--m_transactionDepth == 0) {
-        QSqlQuery q(database());
-        if (!q.exec(QStringLiteral("COMMIT TRANSACTION")))
-            qDebug() << "COMMIT failed:" << q.lastError().text();
+        return true;
+    if (--m_transactionDepth > 0)
+        return true;
+    QSqlQuery q(database());
+    if (q.exec(QStringLiteral("COMMIT TRANSACTION")))
+        return true;
+    // A full disk or an I/O error: SQLite may keep the transaction open; it must not stay half-done.
+    QString reason = CVdShared::sqlErrorText(q.lastError());
+    if (reason.contains(QLatin1String("no transaction is active"))) {
+        // SQLite already rolled back after a failed write inside the transaction; say why it failed.
+        const QStorageInfo disk(QFileInfo(m_workingCopyPath).absolutePath());
+        reason = disk.isValid() && disk.bytesAvailable() < 1024 * 1024
+                     ? VDRFileOps::reasonText(ENOSPC)
+                     : tr("Ein Schreibfehler hat den Vorgang abgebrochen; nichts davon wurde gespeichert.");
     }
+    QSqlQuery(database()).exec(QStringLiteral("ROLLBACK TRANSACTION"));
+    VDRPrompt::critical(
+        tr("Datenbankfehler"),
+        tr("Die Änderungen konnten nicht in die Working Copy Datei\n%1\ngeschrieben werden:\n%2")
+            .arg(nativePath(m_workingCopyPath), reason));
+    return false;
 }
 
 void VDRDocument::clearState()

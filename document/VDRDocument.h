@@ -82,9 +82,10 @@ public:
     // the copy so the lock is never dropped by a stray file handle).
     bool writeWorkingCopyTo(const QString& target);
 
-    // Nesting transactions; only the outermost pair reaches the database.
+    // Nesting transactions; only the outermost pair reaches the database. endTransaction returns
+    // false (and has told the user) when the outermost COMMIT failed: nothing of it was stored.
     void beginTransaction();
-    void endTransaction();
+    bool endTransaction();
     int transactionDepth() const { return m_transactionDepth; }
 
     // Models of the diary as a whole.

@@ -248,7 +248,7 @@ int VDRDocument::appendEntry()
 
     const QTime now = QTime::currentTime();
     const QString empty = QStringLiteral("");
-    const bool ok = m_modelEntryAll->appendRow({
+    bool ok = m_modelEntryAll->appendRow({
         {"locked", 0},
         {"persistent_document", QVariant(QVariant::ByteArray)},
         {"persistent_document_ct", QVariant(QVariant::String)},
@@ -278,7 +278,7 @@ int VDRDocument::appendEntry()
         {"exported_by_app", 0},
         {"import_version", QVariant(QVariant::DateTime)},
     });
-    endTransaction();
+    ok = endTransaction() && ok;
     return ok ? 1 : 0;
 }
 
@@ -582,7 +582,7 @@ bool VDRDocument::copyEntryAll(int row)
             ok &= timesCopy->submitAll();
         }
     }
-    endTransaction();
+    ok = endTransaction() && ok;
     return ok;
 }
 
@@ -668,7 +668,7 @@ bool VDRDocument::removeEntryAll(int row)
         m_modelEntryAll->removeRows(row, 1);
         ok &= m_modelEntryAll->submitAll();
     }
-    endTransaction();
+    ok = endTransaction() && ok;
     return ok;
 }
 
@@ -700,8 +700,8 @@ bool VDRDocument::lockEntry(int row, bool locked)
     // is edited with, and its frozen copies are never copied twice anyway.
     if (locked)
         lockCompanyRecords4lockedEntry(row);
-    const bool ok = m_modelEntryAll->submitAll();
-    endTransaction();
+    bool ok = m_modelEntryAll->submitAll();
+    ok = endTransaction() && ok;
     return ok;
 }
 

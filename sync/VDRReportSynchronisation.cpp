@@ -740,8 +740,18 @@ int VDRReportSynchronisation::importOpenedFile(QSqlDatabase db, const QString& p
     int count = 0;
     // The file is one transaction, each report a savepoint in it: one commit, not one per report.
     m_document->beginTransaction();
+    const int resultsBefore = m_results.size();
     const int reports = importReports(db, path, totalReports, reportsBefore, count, importVersion);
-    m_document->endTransaction();
+    const bool committed = m_document->endTransaction();
+    refreshModels();
+    if (!committed) {
+        // Nothing of the file reached the diary (the user has been told why).
+        for (int i = resultsBefore; i < m_results.size(); ++i) {
+            if (m_results[i]->status() == VDRReportSynchronisationResult::Imported)
+                m_results[i]->setStatus(VDRReportSynchronisationResult::RefusedDatabaseError);
+        }
+        return done(FileRefused);
+    }
     importedCount += count;
     return done(reports == 0 ? FileImported : FileRefused);
 }
@@ -784,7 +794,6 @@ int VDRReportSynchronisation::importReports(QSqlDatabase exchangeFile, const QSt
         if (status == VDRReportSynchronisationResult::RefusedDatabaseError)
             ++failed;
     }
-    refreshModels();
     importDocuments(m_replacedDocuments);
     m_replacedDocuments.clear();
     return failed == 0 ? 0 : 3;

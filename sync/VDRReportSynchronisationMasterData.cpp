@@ -263,7 +263,8 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
         QSqlQuery(diary).exec(QStringLiteral("ROLLBACK TO vdx_masterdata"));
         QSqlQuery(diary).exec(QStringLiteral("RELEASE vdx_masterdata"));
     }
-    m_document->endTransaction();
+    if (!m_document->endTransaction() && result == 0)
+        result = 1; // the commit failed: nothing was stored, and the user has been told
     if (result != 0)
         return result;
 

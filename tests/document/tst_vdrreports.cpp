@@ -391,6 +391,32 @@ private slots:
         QCOMPARE(rows("SELECT id FROM audio"), QStringList{"2"});
     }
 
+    void fullDiskFailsAReportOperationAndSaysSo()
+    {
+        const QString folder = m_tmp.filePath(QStringLiteral("voll"));
+        SmallDisk disk(folder, 1024 * 1024);
+        if (!disk.isMounted())
+            QSKIP("needs a small disk of its own (mounting needs root)");
+        const QByteArray tmp = qgetenv("TMPDIR");
+        qputenv("TMPDIR", QFile::encodeName(folder));
+        m_doc = std::make_unique<VDRDocument>();
+        QVERIFY(m_doc->createDocument(true));
+        qputenv("TMPDIR", tmp);
+        QVERIFY(disk.fill());
+        // Space freed inside the file carries a few more reports; the first that needs more fails.
+        m_prompt.expect(QStringLiteral("Datenbankfehler"), QStringLiteral("kein Speicherplatz"));
+        QStringList stored = rows(QStringLiteral("SELECT id FROM entry"));
+        int appended = 0;
+        while (appended < 500 && m_doc->appendEntry() == 1) {
+            ++appended;
+            stored = rows(QStringLiteral("SELECT id FROM entry"));
+        }
+        QVERIFY(appended < 500);
+        QCOMPARE(m_doc->transactionDepth(), 0);
+        QCOMPARE(rows(QStringLiteral("SELECT id FROM entry")), stored); // nothing of the failed one
+        m_doc.reset();                                                  // while the disk is still there
+    }
+
     void reportListAfterRemovals_data()
     {
         QTest::addColumn<bool>("editedList");
