@@ -7,6 +7,7 @@
 #include "document/VDRDocument.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRSpellChecker.h"
+#include "editing/VDRPrintWidgets.h"
 #include "editing/VDRWidgetPrompt.h"
 
 #include <QDir>
@@ -76,6 +77,7 @@ int main(int argc, char* argv[])
 
     VDRWidgetPrompt prompt;
     VDRPrompt::setInstance(&prompt);
+    VDRPrintWidgets::install();
 
     const QString dictionaries = QCoreApplication::applicationDirPath() + QStringLiteral("/../Dictionaries/");
     const QString suffix = VDRSpellChecker::dictionarySuffix(locale.language(), locale.country());
