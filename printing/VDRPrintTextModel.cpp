@@ -146,8 +146,12 @@ bool VDRPrintTextModel::setData(const QModelIndex& index, const QVariant& value,
         if (answer != 0)
             return false;
     }
-    // The default itself needs no replacement.
-    m_replacements[index.row()] = newText == m_defaults.at(index.row()) ? QString() : newText;
+    // The default itself needs no replacement; a deleted text is kept as a blank, since an empty
+    // replacement means "none".
+    if (newText == m_defaults.at(index.row()))
+        m_replacements[index.row()].clear();
+    else
+        m_replacements[index.row()] = newText.isEmpty() ? QStringLiteral(" ") : newText;
     emit dataChanged(index, index);
     return true;
 }

@@ -28,10 +28,9 @@ public:
         : CVdPrintout(nullptr, title), m_pages(pages), m_body(body)
     {
     }
-    bool run(Output target, const QString& fileName)
+    bool run(Output target, const QString& fileName) { return init(target, fileName, false) && draw(); }
+    bool draw()
     {
-        if (!init(target, fileName, false))
-            return false;
         QPainter painter;
         if (!begin_painter(painter)) {
             after_print();
@@ -376,6 +375,52 @@ private slots:
         QVERIFY(!ok);
         QCOMPARE(m_prompt.messages.size(), 1);
         QVERIFY(QDir(folder).entryList(QDir::NoDotAndDotDot | QDir::AllEntries).isEmpty());
+    }
+
+    // The file name's suffix, and whether the PDF is opened: only when chosen in the dialog. A file
+    // that cannot be replaced is named, and the dialog comes again.
+    void pdfNaming_data()
+    {
+        QTest::addColumn<QString>("name");
+        QTest::addColumn<bool>("ask");
+        QTest::addColumn<QString>("written");
+        QTest::newRow("no suffix, chosen") << "a" << true << "a.pdf";
+        QTest::newRow("suffix in capitals, chosen") << "b.PDF" << true << "b.PDF";
+        QTest::newRow("no suffix, given") << "c" << false << "c.pdf";
+        QTest::newRow("existing file held, chosen again") << "held.pdf" << true << "d.pdf";
+    }
+    void pdfNaming()
+    {
+        QFETCH(QString, name);
+        QFETCH(bool, ask);
+        QFETCH(QString, written);
+        const QString folder = m_dir.filePath(QStringLiteral("naming"));
+        QVERIFY(QDir().mkpath(folder));
+        const QString held = folder + QStringLiteral("/held.pdf");
+        const bool holding = name == QLatin1String("held.pdf");
+        if (holding) {
+            QVERIFY(writeFile(held, "old"));
+            if (!setImmutable(held, true))
+                QSKIP("This file system cannot make a file immutable");
+            m_prompt.expect(QStringLiteral("Dateifehler"), QStringLiteral("held.pdf"));
+            m_prompt.expectFileName(held);
+            m_prompt.expectFileName(folder + QStringLiteral("/d"));
+        } else if (ask) {
+            m_prompt.expectFileName(folder + QLatin1Char('/') + name);
+        }
+        QStringList opened;
+        VDRPrintHooks::setOpenFile([&](const QString& path) { opened << path; });
+        FramePrintout printout(QString(), 1);
+        const bool ok = ask ? printout.setOutput4PDF(QStringLiteral("Vorschlag.pdf"), true, 2, folder)
+                            : printout.setOutput4PDF(folder + QLatin1Char('/') + name, false, 0, QString());
+        if (holding)
+            setImmutable(held, false);
+        QVERIFY(ok);
+        QVERIFY(printout.draw());
+        VDRPrintHooks::setOpenFile(nullptr);
+        const QString path = folder + QLatin1Char('/') + written;
+        QVERIFY(QFile::exists(path));
+        QCOMPARE(opened, ask ? QStringList{path} : QStringList());
     }
 
     // The demo diary's company list with enough companies for several pages.

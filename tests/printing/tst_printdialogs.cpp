@@ -1,19 +1,24 @@
 #include "VDRTestFixtures.h"
 #include "VDRTestPrompt.h"
+#include "editing/CVdPrintPreview.h"
+#include "editing/CVdPrintoutSettings.h"
 #include "editing/VDRPrintTextsEditor.h"
+#include "printing/CVdConfig.h"
 #include "printing/CVdTexts.h"
 #include "printing/VDRPrintTextModel.h"
 
 #include <QApplication>
+#include <QLabel>
 #include <QLocale>
 #include <QPushButton>
 #include <QSettings>
+#include <QSpinBox>
 #include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
-class TestVDRPrintTextModel : public QObject
+class TestPrintDialogs : public QObject
 {
     Q_OBJECT
 
@@ -108,10 +113,59 @@ private slots:
         QCOMPARE(CVdTexts::self()->text(6), QStringLiteral("Anwesende:"));
     }
 
+    // Margins keep to their ranges, and OK makes them the printouts' margins from now on.
+    void margins()
+    {
+        CVdPrintoutSettings dialog;
+        const struct
+        {
+            const char* name;
+            int max;
+            int value;
+        } boxes[] = {{"sbLeft", 70, 20}, {"sbRight", 70, 21}, {"sbTop", 99, 22}, {"sbBottom", 99, 23}};
+        for (const auto& b : boxes) {
+            auto* box = dialog.findChild<QSpinBox*>(QLatin1String(b.name));
+            QVERIFY(box);
+            QCOMPARE(box->minimum(), 0);
+            QCOMPARE(box->maximum(), b.max);
+            QCOMPARE(box->suffix(), QStringLiteral(" mm"));
+            box->setValue(b.value);
+        }
+        dialog.findChild<QPushButton*>(QStringLiteral("pbOk"))->click();
+        CVdConfig::self()->reload();
+        QCOMPARE(CVdConfig::self()->leftMargin, 20);
+        QCOMPARE(CVdConfig::self()->bottomMargin, 23);
+        CVdPrintoutSettings again;
+        again.findChild<QPushButton*>(QStringLiteral("pbDefaults"))->click();
+        QCOMPARE(again.findChild<QSpinBox*>(QStringLiteral("sbTop"))->value(), 10);
+        again.findChild<QPushButton*>(QStringLiteral("pbOk"))->click();
+        QCOMPARE(CVdConfig::self()->leftMargin, 15);
+    }
+
+    // One page: labelled 1 of 1, and the page buttons stay there; the page images go with the dialog.
+    void preview()
+    {
+        const QString file = m_dir.filePath(QStringLiteral("picture_0001.jpeg"));
+        QImage page(100, 140, QImage::Format_RGB32);
+        page.fill(Qt::white);
+        QVERIFY(page.save(file, "JPEG"));
+        {
+            CVdPrintPreview preview(nullptr, {file});
+            preview.show();
+            auto* label = preview.findChild<QLabel*>(QStringLiteral("labelPage"));
+            QCOMPARE(label->text(), QStringLiteral("Seite 1/1"));
+            preview.next();
+            preview.previous();
+            QCOMPARE(preview.currentPage(), 0);
+            QCOMPARE(label->text(), QStringLiteral("Seite 1/1"));
+        }
+        QVERIFY(!QFile::exists(file));
+    }
+
 private:
     QTemporaryDir m_dir;
     VDRTestPrompt m_prompt;
 };
 
-QTEST_MAIN(TestVDRPrintTextModel)
-#include "tst_vdrprinttextmodel.moc"
+QTEST_MAIN(TestPrintDialogs)
+#include "tst_printdialogs.moc"
