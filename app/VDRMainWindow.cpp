@@ -5,17 +5,17 @@
 #include "document/VDRFileSizeDialog.h"
 #include "document/VDRPrompt.h"
 #include "document/VDRScopedConnection.h"
+#include "editing/CVdConfigDialog.h"
+#include "editing/CVdPrintoutSettings.h"
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRItemDelegate.h"
+#include "editing/VDROutputSelectDialog.h"
+#include "editing/VDRPrintTextsEditor.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
-#include "editing/CVdConfigDialog.h"
-#include "editing/CVdPrintoutSettings.h"
-#include "editing/VDROutputSelectDialog.h"
-#include "editing/VDRPrintTextsEditor.h"
 #include "printing/CVdPrintFirmList.h"
 #include "printing/CVdPrintoutFormblatt.h"
 #include "printing/CVdTexts.h"
@@ -1019,8 +1019,8 @@ void VDRMainWindow::on_actionFilePrintCompanyList_triggered()
 {
     if (!m_document->isStateValid())
         return;
-    VDROutputSelectDialog select(QIcon(QStringLiteral(":/VDRMainWindow/Resources/icon-datei-drucken-firmenliste.png")),
-                                 true, this);
+    VDROutputSelectDialog select(
+        QIcon(QStringLiteral(":/VDRMainWindow/Resources/icon-datei-drucken-firmenliste.png")), true, this);
     if (select.exec() != QDialog::Accepted)
         return;
     const QString fileName = m_document->projectName() + tr(" - ") + tr(" Firmenliste.pdf");

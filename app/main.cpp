@@ -6,8 +6,8 @@
 #include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRCompleter.h"
-#include "editing/VDRSpellChecker.h"
 #include "editing/VDRPrintWidgets.h"
+#include "editing/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
 
 #include <QDir>

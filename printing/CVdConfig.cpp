@@ -15,8 +15,9 @@ QFont defaultFont(const char* text)
 
 CVdConfig* CVdConfig::self()
 {
-    static CVdConfig* config = new CVdConfig;
-    return config;
+    // Lives as long as the process.
+    static CVdConfig config;
+    return &config;
 }
 
 CVdConfig::CVdConfig()

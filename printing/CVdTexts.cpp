@@ -106,8 +106,9 @@ const char* const kDefaults[] = {
 
 CVdTexts* CVdTexts::self()
 {
-    static CVdTexts* texts = new CVdTexts;
-    return texts;
+    // Lives as long as the process.
+    static CVdTexts texts;
+    return &texts;
 }
 
 CVdTexts::CVdTexts()
