@@ -5,13 +5,20 @@
 #include "document/VDRFileSizeDialog.h"
 #include "document/VDRPrompt.h"
 #include "document/VDRScopedConnection.h"
+#include "editing/CVdConfigDialog.h"
+#include "editing/CVdPrintoutSettings.h"
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRItemDelegate.h"
+#include "editing/VDROutputSelectDialog.h"
+#include "editing/VDRPrintTextsEditor.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
+#include "printing/CVdPrintFirmList.h"
+#include "printing/CVdPrintoutFormblatt.h"
+#include "printing/CVdTexts.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
@@ -70,7 +77,13 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionSettingsProjectLogo",
                                      "actionExchangeReport",
                                      "actionExchangeReport_2",
-                                     "actionExportMasterData"};
+                                     "actionExportMasterData",
+                                     "actionFilePrintEmptyEntry",
+                                     "actionFilePrintCompanyList",
+                                     "actionToolbarPrintCompanyList",
+                                     "actionPrintoutSettings",
+                                     "actionSchriftarten",
+                                     "actionDrucktexte"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionFileSaveAs",
@@ -81,7 +94,10 @@ const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionSettingsProjectLogo",
                                         "actionExchangeReport",
                                         "actionExchangeReport_2",
-                                        "actionExportMasterData"};
+                                        "actionExportMasterData",
+                                        "actionFilePrintEmptyEntry",
+                                        "actionFilePrintCompanyList",
+                                        "actionToolbarPrintCompanyList"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -876,6 +892,8 @@ void VDRMainWindow::showProjectData(int tab, bool printButton)
     dialog.slotDocumentOpened(m_document);
     dialog.activateTab(VDRProjectDataWidget::SettingsType(tab));
     dialog.setPrintButtonVisible(printButton);
+    connect(&dialog, &VDRProjectDataWidget::printProjectDataRequested, this,
+            &VDRMainWindow::on_actionFilePrintCompanyList_triggered);
     if (dialog.exec() == QDialog::Accepted)
         updateGui();
 }
@@ -987,4 +1005,49 @@ void VDRMainWindow::on_actionExportMasterData_triggered()
     if (VDRMasterDataExport::createFollowUpDiary(m_document, target) == 0)
         saveDocument(false, true); // the diary records where its master data went
     updateGui();
+}
+
+void VDRMainWindow::on_actionFilePrintEmptyEntry_triggered()
+{
+    if (!m_document->isStateValid())
+        return;
+    CVdPrintoutFormblatt printout(this);
+    printout.print(false);
+}
+
+void VDRMainWindow::on_actionFilePrintCompanyList_triggered()
+{
+    if (!m_document->isStateValid())
+        return;
+    VDROutputSelectDialog select(
+        QIcon(QStringLiteral(":/VDRMainWindow/Resources/icon-datei-drucken-firmenliste.png")), true, this);
+    if (select.exec() != QDialog::Accepted)
+        return;
+    const QString fileName = m_document->projectName() + tr(" - ") + tr(" Firmenliste.pdf");
+    CVdPrintFirmList printout(this);
+    printout.print(select.result == 1, select.separateByPageBreak(), fileName,
+                   QFileInfo(m_document->getFilepath()).absolutePath());
+}
+
+void VDRMainWindow::on_actionToolbarPrintCompanyList_triggered()
+{
+    on_actionFilePrintCompanyList_triggered();
+}
+
+void VDRMainWindow::on_actionPrintoutSettings_triggered()
+{
+    CVdPrintoutSettings dialog(this);
+    dialog.exec();
+}
+
+void VDRMainWindow::on_actionSchriftarten_triggered()
+{
+    CVdConfigDialog dialog(this);
+    dialog.exec();
+}
+
+void VDRMainWindow::on_actionDrucktexte_triggered()
+{
+    VDRPrintTextsEditor editor(CVdTexts::self()->model(), this);
+    editor.exec();
 }

@@ -104,6 +104,12 @@ private slots:
     void on_actionSettingsCompanyList_triggered();
     void on_actionFormatCompany_triggered();
     void on_actionSettingsProjectLogo_triggered();
+    void on_actionFilePrintEmptyEntry_triggered();
+    void on_actionFilePrintCompanyList_triggered();
+    void on_actionToolbarPrintCompanyList_triggered();
+    void on_actionPrintoutSettings_triggered();
+    void on_actionSchriftarten_triggered();
+    void on_actionDrucktexte_triggered();
 
 protected:
     bool event(QEvent* event) override;

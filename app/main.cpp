@@ -6,6 +6,7 @@
 #include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDRPrintWidgets.h"
 #include "editing/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
 
@@ -76,6 +77,7 @@ int main(int argc, char* argv[])
 
     VDRWidgetPrompt prompt;
     VDRPrompt::setInstance(&prompt);
+    VDRPrintWidgets::install();
 
     const QString dictionaries = QCoreApplication::applicationDirPath() + QStringLiteral("/../Dictionaries/");
     const QString suffix = VDRSpellChecker::dictionarySuffix(locale.language(), locale.country());

@@ -1,6 +1,10 @@
 #include "document/CVdShared.h"
 
+#include "document/VDRPrompt.h"
+
 #include <QAbstractItemModel>
+#include <QCoreApplication>
+#include <QFileInfo>
 #include <QSettings>
 #include <QSqlQueryModel>
 #include <QSqlRecord>
@@ -408,4 +412,82 @@ QString CVdShared::formatCompany(const QList<int>& fieldIdx, bool lastButOneInBr
     if (open)
         text += QLatin1Char(')');
     return text;
+}
+
+void CVdShared::check_sql_error(const QSqlError& error, const QString& className, const QString& functionName,
+                                int line)
+{
+    if (!error.isValid() || error.type() == QSqlError::NoError)
+        return;
+    QString text = error.driverText();
+    const QString database = error.databaseText();
+    if (!database.isEmpty() && database != error.driverText())
+        text += QLatin1Char('\n') + database;
+    text += QLatin1Char('\n') + QCoreApplication::translate("CVdShared", "Class name: %1").arg(className);
+    text +=
+        QLatin1Char('\n') + QCoreApplication::translate("CVdShared", "Function name: %1").arg(functionName);
+    text += QLatin1Char('\n') + QCoreApplication::translate("CVdShared", "Line: %1").arg(line);
+    VDRPrompt::critical(QCoreApplication::translate("CVdShared", "SQL Error"), text);
+}
+
+QString CVdShared::firma_description(const QString& name, const QString& addition, bool newLine)
+{
+    if (addition.isEmpty())
+        return name;
+    return name + (newLine ? QStringLiteral("\n(") : QStringLiteral(" (")) + addition + QLatin1Char(')');
+}
+
+QString CVdShared::firma_description(const QString& name, const QString& addition1, const QString& addition2,
+                                     bool newLine)
+{
+    QStringList additions;
+    for (const QString& a : {addition1, addition2})
+        if (!a.isEmpty())
+            additions << a;
+    return firma_description(name, additions.join(QStringLiteral(", ")), newLine);
+}
+
+QString CVdShared::clip_docnumber(const QString& fileName)
+{
+    const QFileInfo info(fileName);
+    QString base = info.completeBaseName();
+    const int cut = base.lastIndexOf(QLatin1Char('_'));
+    if (cut >= 0)
+        base.truncate(cut);
+    return info.suffix().isEmpty() ? base : base + QLatin1Char('.') + info.suffix();
+}
+
+QStringList CVdShared::intlist2strlist(const QList<int>& list)
+{
+    QStringList out;
+    for (int v : list)
+        out << QString::number(v);
+    return out;
+}
+
+QList<int> CVdShared::strlist2intlist(const QStringList& list)
+{
+    QList<int> out;
+    for (const QString& s : list) {
+        bool ok = false;
+        const int v = s.trimmed().toInt(&ok);
+        if (ok)
+            out << v;
+    }
+    return out;
+}
+
+void CVdShared::set_busy_cursor()
+{
+    VDRPrompt::instance()->setBusy(true);
+}
+
+void CVdShared::restore_cursor()
+{
+    VDRPrompt::instance()->setBusy(false);
+}
+
+void CVdShared::idle()
+{
+    QCoreApplication::processEvents();
 }

@@ -91,4 +91,25 @@ public:
     // only) are left out together with their separator and brackets.
     static QString formatCompany(const QList<int>& fieldIdx, bool lastButOneInBrackets, bool lastInBrackets,
                                  const QMap<QString, QString>& values, const QString& separator);
+
+    // ---- Printing helpers ----
+
+    // Shows a failed query (driver text, database text, where it happened) through the prompt;
+    // silent for no error.
+    static void check_sql_error(const QSqlError& error, const QString& className, const QString& functionName,
+                                int line);
+    // "name (addition)", on two lines when newLine is set; the name alone for an empty addition.
+    static QString firma_description(const QString& name, const QString& addition, bool newLine);
+    static QString firma_description(const QString& name, const QString& addition1, const QString& addition2,
+                                     bool newLine);
+    // A document's file name without its trailing "_..." part of the base name, keeping the suffix.
+    static QString clip_docnumber(const QString& fileName);
+    static QStringList intlist2strlist(const QList<int>& list);
+    // Entries that are not numbers are left out.
+    static QList<int> strlist2intlist(const QStringList& list);
+    // Busy cursor through the prompt, kept until restore_cursor.
+    static void set_busy_cursor();
+    static void restore_cursor();
+    // Lets pending events run (repaints, the printer's spooling).
+    static void idle();
 };

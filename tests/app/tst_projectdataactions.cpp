@@ -2,6 +2,7 @@
 #include "VDRTestPrompt.h"
 #include "app/VDRMainWindow.h"
 #include "document/VDRDocument.h"
+#include "editing/VDROutputSelectDialog.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 
@@ -68,7 +69,7 @@ private slots:
         });
         trigger->trigger();
         QCOMPARE(shownTab, tab);
-        QVERIFY(!printShown); // nothing prints the data sheet yet
+        QCOMPARE(printShown, tab != 0); // the company tabs print the company list
         const bool ok = button == QLatin1String("pbOk");
         QCOMPARE(window.document()->projectName(), QString(ok ? "Brücke Nord" : "Neues Varduna"));
         bool shown = false;
@@ -101,6 +102,39 @@ private slots:
         QCOMPARE(title, QString("Projektlogo"));
         window.document()->closeDocument();
         VDR_VERIFY_PROMPT(prompt);
+    }
+
+    // "Drucken" on the company tab asks for printer or PDF and writes the company list.
+    void printButtonPrintsCompanyList()
+    {
+        VDRTestPrompt prompt;
+        VDRMainWindow window;
+        window.show();
+        QVERIFY(window.createDocument(true));
+        const QString pdf = m_dir.filePath(QStringLiteral("Liste.pdf"));
+        prompt.expectFileName(pdf);
+        bool chosen = false;
+        QTimer::singleShot(0, this, [&] {
+            auto* dialog = qobject_cast<VDRProjectDataWidget*>(QApplication::activeModalWidget());
+            if (!dialog)
+                return;
+            QTimer::singleShot(0, this, [&, dialog] {
+                auto* select = qobject_cast<VDROutputSelectDialog*>(QApplication::activeModalWidget());
+                if (select) {
+                    chosen = true;
+                    select->findChild<QPushButton*>(QStringLiteral("pbPdf"))->click();
+                }
+                QTimer::singleShot(0, dialog, [dialog] {
+                    dialog->findChild<QPushButton*>(QStringLiteral("pbCancel"))->click();
+                });
+            });
+            dialog->findChild<QPushButton*>(QStringLiteral("pbPrint"))->click();
+        });
+        window.ui().action(QStringLiteral("actionSettingsCompanyList"))->trigger();
+        QVERIFY(chosen);
+        QVERIFY(QFileInfo(pdf).size() > 0);
+        VDR_VERIFY_PROMPT(prompt);
+        window.document()->closeDocument();
     }
 
 private:
