@@ -1,0 +1,11 @@
+#pragma once
+
+#include "editing/VDREntryNumberDialog.h"
+
+// The number dialog of a report inserted between others.
+class VDREntryInsertDialog : public VDREntryNumberDialog
+{
+    Q_OBJECT
+public:
+    explicit VDREntryInsertDialog(VDRDocument* document, QWidget* parent = nullptr);
+};
