@@ -4,3 +4,8 @@ VDREntryInsertDialog::VDREntryInsertDialog(VDRDocument* document, QWidget* paren
     : VDREntryNumberDialog(document, tr("Geben Sie die neue Bauberichtsnummer ein"), parent)
 {
 }
+
+VDREntryInsertDialog::VDREntryInsertDialog(QWidget* parent)
+    : VDREntryInsertDialog(documentAround(parent), parent)
+{
+}

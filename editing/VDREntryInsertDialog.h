@@ -7,5 +7,6 @@ class VDREntryInsertDialog : public VDREntryNumberDialog
 {
     Q_OBJECT
 public:
-    explicit VDREntryInsertDialog(VDRDocument* document, QWidget* parent = nullptr);
+    VDREntryInsertDialog(VDRDocument* document, QWidget* parent = nullptr);
+    explicit VDREntryInsertDialog(QWidget* parent);
 };

@@ -27,6 +27,20 @@ VDREntryNumberDialog::VDREntryNumberDialog(VDRDocument* document, QWidget* paren
 {
 }
 
+VDREntryNumberDialog::VDREntryNumberDialog(QWidget* parent)
+    : VDREntryNumberDialog(documentAround(parent), parent)
+{
+}
+
+VDRDocument* VDREntryNumberDialog::documentAround(QWidget* widget)
+{
+    // The window that holds the report form also owns the open diary.
+    for (QObject* o = widget; o; o = o->parent())
+        if (auto* document = o->findChild<VDRDocument*>(QString(), Qt::FindDirectChildrenOnly))
+            return document;
+    return nullptr;
+}
+
 VDREntryNumberDialog::VDREntryNumberDialog(VDRDocument* document, const QString& text, QWidget* parent)
     : QDialog(parent), m_digits(diaryDigits(document)), m_number(new QSpinBox(this)),
       m_letter(new QSpinBoxLetter(this))

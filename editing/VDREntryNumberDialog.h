@@ -12,7 +12,9 @@ class VDREntryNumberDialog : public QDialog
 {
     Q_OBJECT
 public:
-    explicit VDREntryNumberDialog(VDRDocument* document, QWidget* parent = nullptr);
+    VDREntryNumberDialog(VDRDocument* document, QWidget* parent = nullptr);
+    // The diary is the one the window around 'parent' holds (3 digits when there is none).
+    explicit VDREntryNumberDialog(QWidget* parent);
 
     // The number left-padded with "0" to the diary's digit count.
     QString getEntryNumber() const;
@@ -26,6 +28,7 @@ public:
 
 protected:
     VDREntryNumberDialog(VDRDocument* document, const QString& text, QWidget* parent);
+    static VDRDocument* documentAround(QWidget* widget);
 
 private:
     int m_digits;

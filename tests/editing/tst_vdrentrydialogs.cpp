@@ -57,7 +57,7 @@ private slots:
         QFETCH(QString, typed);
         QFETCH(QString, shown);
         QFETCH(char, letter);
-        VDREntryNumberDialog dialog(nullptr);
+        VDREntryNumberDialog dialog(nullptr, nullptr);
         auto* box = dialog.findChild<QSpinBoxLetter*>(QStringLiteral("spinBoxLetter"));
         QVERIFY(box);
         QLineEdit* edit = box->findChild<QLineEdit*>();
@@ -88,6 +88,8 @@ private slots:
         QTest::newRow("no document") << "" << false << 999 << "7" << 'b' << "007b";
         QTest::newRow("three digits") << "001 (Entwurf)" << true << 999 << "012a (Entwurf)" << 'a' << "012a";
         QTest::newRow("four digits") << "0001" << false << 9999 << "0042" << char(0) << "0042";
+        // Built with only a parent: the diary of the window around it counts.
+        QTest::newRow("window's diary") << "0001 (Entwurf)" << true << 9999 << "42" << 'c' << "0042c";
         QTest::newRow("five digits") << "00001 (Entwurf)" << true << 99999 << "10000" << 'Z' << "10000z";
         QTest::newRow("too large") << "0001" << false << 9999 << "123456" << char(0) << "9999";
         QTest::newRow("no digits") << "001" << false << 999 << "abc" << '#' << "001";
@@ -107,8 +109,15 @@ private slots:
             QVERIFY(doc->createDocument(true));
             QVERIFY(doc->modelEntryAll()->setData(0, QStringLiteral("number"), firstNumber));
         }
-        std::unique_ptr<VDREntryNumberDialog> dialog(insert ? new VDREntryInsertDialog(doc.get())
-                                                            : new VDREntryNumberDialog(doc.get()));
+        QWidget window;
+        auto* form = new QWidget(&window);
+        std::unique_ptr<VDREntryNumberDialog> dialog;
+        if (QTest::currentDataTag() == QByteArray("window's diary")) {
+            doc->setParent(&window);
+            dialog.reset(new VDREntryInsertDialog(form));
+        } else {
+            dialog.reset(insert ? new VDREntryInsertDialog(doc.get()) : new VDREntryNumberDialog(doc.get()));
+        }
         QCOMPARE(dialog->windowTitle(), QStringLiteral("Nummer vergeben"));
         QCOMPARE(dialog->findChild<QLabel*>(QStringLiteral("labelText"))->text(),
                  insert ? QStringLiteral("Geben Sie die neue Bauberichtsnummer ein")
@@ -120,6 +129,9 @@ private slots:
         dialog->setEntryLetter(presetLetter);
         const char letter = dialog->getEntryLetter();
         QCOMPARE(dialog->getEntryNumber() + (letter ? QString(QChar(letter)) : QString()), expected);
+        dialog.reset();
+        if (doc && doc->parent())
+            doc.release(); // the window owns it now
     }
 
 private:
