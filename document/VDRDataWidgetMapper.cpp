@@ -3,6 +3,7 @@
 #include "document/VDRSqlTableModel.h"
 
 #include <QEvent>
+#include <QMetaProperty>
 #include <QTextDocument>
 #include <QVariant>
 
@@ -15,6 +16,18 @@ QString plainTextOf(const QString& html)
     QTextDocument doc;
     doc.setHtml(html);
     return doc.toPlainText();
+}
+// A NULL or unreadable stored value (a date "2026-02-30") is shown as an empty field; until the
+// user edits that field, it is left as stored instead of being replaced by the field's reading.
+bool untouchedUnreadable(const QObject* t, const QByteArray& prop, const QVariant& modelValue)
+{
+    const QMetaObject* meta = t->metaObject();
+    const int modified = meta->indexOfProperty("modified");
+    const int index = meta->indexOfProperty(prop.constData());
+    if (modified < 0 || index < 0 || t->property("modified").toBool())
+        return false;
+    QVariant converted = modelValue;
+    return modelValue.isNull() || !converted.convert(meta->property(index).userType());
 }
 } // namespace
 
@@ -163,8 +176,10 @@ bool VDRDataWidgetMapper::commit(int column)
         if (!t)
             continue;
         const QModelIndex idx = m_model->index(m_row, m.column);
-        const QVariant widgetValue = t->property(targetProperty(m).constData());
         const QVariant modelValue = m_model->data(idx, Qt::EditRole);
+        if (m.property != kRichText && untouchedUnreadable(t, targetProperty(m), modelValue))
+            continue;
+        const QVariant widgetValue = t->property(targetProperty(m).constData());
         bool differs;
         if (m.property == kRichText)
             differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString());
