@@ -8,16 +8,20 @@
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDREntryDateWidget.h"
+#include "editing/VDREntryListWidget.h"
+#include "editing/VDREntrySelectorWidget.h"
 #include "editing/VDREntryWidget.h"
 #include "editing/VDRItemDelegate.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
+#include "editing/VdEvent.h"
+#include "editing/VdEventsController.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
 #include <QAction>
-#include <QCalendarWidget>
 #include <QCloseEvent>
 #include <QCoreApplication>
 #include <QDesktopServices>
@@ -171,8 +175,8 @@ QString sqliteVersion()
 
 VDRMainWindow::VDRMainWindow(QWidget* parent)
     : QMainWindow(parent), m_document(new VDRDocument(this)), m_central(new QStackedWidget(this)),
-      m_welcome(new WelcomeLabel(this)), m_reportPage(new QLabel(this)), m_entryList(new QTableView(this)),
-      m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
+      m_welcome(new WelcomeLabel(this)), m_reportPage(new QLabel(this)),
+      m_entryList(new VDREntryListWidget(this)), m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
       m_recentIcon(
           new LazyIconEngine(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico")))
 {
@@ -194,9 +198,6 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     setCentralWidget(m_central);
 
     m_entryList->setObjectName(QStringLiteral("entryList"));
-    m_entryList->setEditTriggers(QAbstractItemView::NoEditTriggers);
-    m_entryList->setSelectionBehavior(QAbstractItemView::SelectRows);
-    m_entryList->verticalHeader()->hide();
     m_dockEntryList = addDock(tr("Bautagesberichte"), QStringLiteral("dockWidgetEntryList"), m_entryList,
                               Qt::LeftDockWidgetArea);
     // The calendar costs more than the rest of the dock area: it is built right after the window's
@@ -228,6 +229,19 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
                                   Qt::BottomDockWidgetArea);
     resizeDocks({m_dockEntryList, firstPhotoDock}, {320, 320}, Qt::Horizontal);
     resizeDocks({search}, {120}, Qt::Vertical);
+
+    // The list moves the calendar to the date of the report it selects.
+    connect(m_entryList, &VDREntryListWidget::dateSelected, this, [this](const QDate& date) {
+        m_shownDate = date;
+        if (m_calendar)
+            m_calendar->showReportDate(date);
+    });
+    connect(m_entryList, &VDREntryListWidget::rowChangedToLockedEntry, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete);
+    connect(m_entryList, &VDREntryListWidget::rowChangedToUnlockedEntry, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryEnableDelete);
+    m_dockEntryList->installEventFilter(this);
+    m_dockEntryDate->installEventFilter(this);
 
     QSettings settings;
     m_dockEntryList->setVisible(settings.value(showEntryListSettingsKey(), true).toBool());
@@ -680,17 +694,7 @@ void VDRMainWindow::showWelcomePage()
 void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
 {
     VDRAllEntryTableModel* model = document->modelEntryAll();
-    m_entryList->setModel(model);
-    const QSqlRecord record = model->record();
-    for (int c = 0; c < record.count(); ++c) {
-        const QString field = record.fieldName(c);
-        m_entryList->setColumnHidden(c, field != QLatin1String("number") &&
-                                            field != QLatin1String("inspection_date"));
-    }
-    model->setHeaderData(QStringLiteral("number"), Qt::Horizontal, tr("Nr."));
-    model->setHeaderData(QStringLiteral("inspection_date"), Qt::Horizontal, tr("Datum"));
-    m_entryList->resizeColumnsToContents();
-    m_entryList->horizontalHeader()->setStretchLastSection(true);
+    m_entryList->slotDocumentOpened(document);
     connect(model, &VDRAllEntryTableModel::reportDatesChanged, this, &VDRMainWindow::slotReportDatesChanged,
             Qt::UniqueConnection);
     model->updateDates();
@@ -713,9 +717,9 @@ void VDRMainWindow::updateReportPage()
     m_reportPage->setText(tr("<h2>%1</h2><p>%2</p><p>%3</p>").arg(name.toHtmlEscaped(), count, file));
 }
 
-void VDRMainWindow::slotDocumentClosed(VDRDocument*)
+void VDRMainWindow::slotDocumentClosed(VDRDocument* document)
 {
-    m_entryList->setModel(nullptr);
+    m_entryList->slotDocumentClosed(document);
     slotReportDatesChanged({});
     updateGui();
 }
@@ -729,24 +733,89 @@ void VDRMainWindow::slotReportDatesChanged(const QList<QDate>& dates)
 
 void VDRMainWindow::markReportDates()
 {
-    m_calendar->setDateTextFormat(QDate(), QTextCharFormat());
-    QTextCharFormat marked;
-    marked.setFontWeight(QFont::Bold);
-    marked.setBackground(QColor(255, 230, 150));
-    for (const QDate& date : qAsConst(m_reportDates))
-        m_calendar->setDateTextFormat(date, marked);
+    m_calendar->setAvailableDates(m_reportDates);
 }
 
 void VDRMainWindow::buildCalendar()
 {
     if (m_calendar)
         return;
-    m_calendar = new QCalendarWidget(this);
+    m_calendar = new VDREntryDateWidget(this);
     m_calendar->setObjectName(QStringLiteral("calendar"));
     QWidget* placeholder = m_dockEntryDate->widget();
     m_dockEntryDate->setWidget(m_calendar);
     delete placeholder;
+    connect(m_calendar, &VDREntryDateWidget::dateSelected, this,
+            &VDRMainWindow::slot_dockWidgetEntryDate_dateSelected);
     markReportDates();
+    m_calendar->showReportDate(m_shownDate);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryDate_dateSelected(const QDate& date, bool& found)
+{
+    found = false;
+    if (!m_document->isStateValid() || !m_document->modelEntryAll())
+        return;
+    VDRAllEntryTableModel* model = m_document->modelEntryAll();
+    model->fetch_all();
+    const QString wanted = date.toString(QStringLiteral("yyyy-MM-dd"));
+    for (int row = 0; row < model->rowCount() && !found; ++row) {
+        if (model->data(row, QStringLiteral("inspection_date"), Qt::EditRole).toString() == wanted) {
+            found = true;
+            VdEventsController::instance()->send_event(VdEvent::GotoRow, row);
+            VdEventsController::instance()->send_event(VdEvent::SelectRow, row);
+        }
+    }
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete()
+{
+    m_entryList->setDeleteEnabled(false);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryEnableDelete()
+{
+    m_entryList->setDeleteEnabled(true);
+}
+
+int VDRMainWindow::displayEntrySelector(QList<int>& ids, int mode, const QString& title, QString* pdfFileName)
+{
+    ids.clear();
+    VDREntrySelectorWidget dialog(mode, this);
+    if (!title.isEmpty())
+        dialog.setWindowTitle(title);
+    const int currentRow = m_entryList->currentRow();
+    dialog.setDocument(m_document, currentRow);
+    const int result = dialog.exec();
+    if (result == VDREntrySelectorWidget::Cancelled)
+        return result;
+    ids = VDREntrySelectorWidget::entryIds(m_document, dialog.getSelectedMode(), currentRow,
+                                           dialog.getSelectionMode5From(), dialog.getSelectionMode5To());
+    if (pdfFileName)
+        *pdfFileName = VDREntrySelectorWidget::pdfFileName(m_document, dialog.getSelectedMode(), ids);
+    return result;
+}
+
+bool VDRMainWindow::eventFilter(QObject* watched, QEvent* event)
+{
+    // Only the dock's own close button closes it; the view actions hide it.
+    if (event->type() == QEvent::Close && (watched == m_dockEntryList || watched == m_dockEntryDate)) {
+        const bool list = watched == m_dockEntryList;
+        QSettings().setValue(list ? showEntryListSettingsKey() : showEntryDateSettingsKey(), false);
+        if (m_showDockHints) {
+            if (list)
+                VDRPrompt::information(
+                    tr("Bautagesberichte wieder einschalten"),
+                    tr("Sie können die Liste der Bautagesberichte über einen rechten "
+                       "Mausklick auf die Symbolleiste oder die Menüleiste wieder einschalten."));
+            else
+                VDRPrompt::information(
+                    tr("Bauberichts-Kalender wieder einschalten"),
+                    tr("Sie können den Bauberichts-Kalender über einen rechten Mausklick auf "
+                       "die Symbolleiste oder die Menüleiste wieder einschalten."));
+        }
+    }
+    return QMainWindow::eventFilter(watched, event);
 }
 
 void VDRMainWindow::checkFileSize()

@@ -9,7 +9,6 @@
 
 #include <memory>
 
-class QCalendarWidget;
 class QDockWidget;
 class QLabel;
 class QMessageBox;
@@ -17,6 +16,8 @@ class QStackedWidget;
 class QTableView;
 class QTimer;
 class VDRDocument;
+class VDREntryDateWidget;
+class VDREntryListWidget;
 class VDREntryWidget;
 class VDRSpellChecker;
 
@@ -78,10 +79,22 @@ public:
     static QString showEntryListSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryList"); }
     static QString showEntryDateSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryDate"); }
 
+    VDREntryListWidget* entryListWidget() const { return m_entryList; }
+    // Null until the calendar dock is first shown.
+    VDREntryDateWidget* entryDateWidget() const { return m_calendar; }
+    // Closing a report dock by its button tells how to get it back, while this is on.
+    void setShowDockHints(bool show) { m_showDockHints = show; }
+    // Runs the report selection dialog; 'ids' gets the chosen reports in row order and 'pdfFileName'
+    // (may be null) the proposed PDF name. Returns what closed the dialog (0 = cancelled).
+    int displayEntrySelector(QList<int>& ids, int mode, const QString& title, QString* pdfFileName = nullptr);
+
 public slots:
     void slotDocumentOpened(VDRDocument* document);
     void slotDocumentClosed(VDRDocument* document);
     void showWelcomePage();
+    void slot_dockWidgetEntryDate_dateSelected(const QDate& date, bool& found);
+    void slot_dockWidgetEntryList_doEntryDisableDelete();
+    void slot_dockWidgetEntryList_doEntryEnableDelete();
 
 private slots:
     void on_actionFileNew_triggered();
@@ -120,6 +133,7 @@ private slots:
 
 protected:
     bool event(QEvent* event) override;
+    bool eventFilter(QObject* watched, QEvent* event) override;
     void closeEvent(QCloseEvent* event) override;
 
 private:
@@ -143,9 +157,11 @@ private:
     QStackedWidget* m_central;
     QLabel* m_welcome;
     QLabel* m_reportPage;
-    QTableView* m_entryList;
-    QCalendarWidget* m_calendar = nullptr;
+    VDREntryListWidget* m_entryList;
+    VDREntryDateWidget* m_calendar = nullptr;
     QList<QDate> m_reportDates;
+    QDate m_shownDate;
+    bool m_showDockHints = true;
     QDockWidget* m_dockEntryList;
     QDockWidget* m_dockEntryDate;
     QLabel* m_clock;
