@@ -75,7 +75,18 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionSettingsProjectLogo",
                                      "actionExchangeReport",
                                      "actionExchangeReport_2",
-                                     "actionExportMasterData"};
+                                     "actionExportMasterData",
+                                     "actionEntryNew",
+                                     "actionEntryInsert",
+                                     "actionEntryCopy",
+                                     "actionEntryDelete",
+                                     "actionEntryGotoFirst",
+                                     "actionEntryGotoPrevious",
+                                     "actionEntryGotoNext",
+                                     "actionEntryGotoLast",
+                                     "actionEntryAlterNumber",
+                                     "actionEntryChangeUID",
+                                     "actionSettingsChangeUID"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionFileSaveAs",
@@ -86,7 +97,17 @@ const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionSettingsProjectLogo",
                                         "actionExchangeReport",
                                         "actionExchangeReport_2",
-                                        "actionExportMasterData"};
+                                        "actionExportMasterData",
+                                        "actionEntryNew",
+                                        "actionEntryInsert",
+                                        "actionEntryCopy",
+                                        "actionEntryDelete",
+                                        "actionEntryGotoFirst",
+                                        "actionEntryGotoPrevious",
+                                        "actionEntryGotoNext",
+                                        "actionEntryGotoLast",
+                                        "actionEntryAlterNumber",
+                                        "actionEntryChangeUID"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -252,6 +273,13 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     connect(m_document, &VDRDocument::documentOpened, this, &VDRMainWindow::slotDocumentOpened);
     connect(m_document, &VDRDocument::documentClosed, this, &VDRMainWindow::slotDocumentClosed);
     connect(m_document, &VDRDocument::recentFileMissing, this, &VDRMainWindow::removeRecentFile);
+    m_entryWidget = new VDREntryWidget(m_central);
+    // The form's many fields must not decide the window's smallest size on a small screen.
+    m_entryWidget->setMinimumSize(320, 240);
+    m_central->addWidget(m_entryWidget);
+    connect(m_document, &VDRDocument::documentOpened, m_entryWidget, &VDREntryWidget::slotDocumentOpened);
+    connect(m_document, &VDRDocument::documentClosed, m_entryWidget, &VDREntryWidget::slotDocumentClosed);
+    connect(m_entryWidget, &VDREntryWidget::doOpenHelp, this, &VDRMainWindow::showHelp);
     connectActions();
     updateGui();
     resize(kDefaultSize);
@@ -484,6 +512,8 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
 {
     if (!m_document->isStateValid())
         return 0;
+    // What is typed into the report belongs to the diary being saved or asked about.
+    m_entryWidget->actionAskForSubmit();
     if (m_document->isDemoProject()) {
         // The demo is never saved: only offer what can work.
         if (withoutQuestion) {
@@ -574,6 +604,7 @@ bool VDRMainWindow::closeDocument(bool askToSave)
 {
     if (!m_document->isStateValid())
         return true;
+    m_entryWidget->actionAskForSubmit();
     if (askToSave && saveDocument(false, false) != 0)
         return false;
     if (!m_document->closeDocument()) {
@@ -589,6 +620,8 @@ bool VDRMainWindow::closeDocument(bool askToSave)
 void VDRMainWindow::endSession()
 {
     if (m_document->isStateValid()) {
+        // Kept in the working copy, which the next opening resumes.
+        m_entryWidget->actionAskForSubmit();
         if (m_document->isStateModified())
             m_document->closeKeepingWorkingCopy();
         else
@@ -649,7 +682,7 @@ void VDRMainWindow::updateGui()
         action->setStatusTip(demo ? tip : QString());
     }
     updateReportPage();
-    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_reportPage) : m_welcome);
+    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_entryWidget) : m_welcome);
     QString title = tr("Varduna");
     if (valid) {
         const QString name =
@@ -1115,4 +1148,59 @@ void VDRMainWindow::on_actionExportMasterData_triggered()
     if (VDRMasterDataExport::createFollowUpDiary(m_document, target) == 0)
         saveDocument(false, true); // the diary records where its master data went
     updateGui();
+}
+
+void VDRMainWindow::on_actionEntryNew_triggered()
+{
+    m_entryWidget->actionNew();
+}
+
+void VDRMainWindow::on_actionEntryInsert_triggered()
+{
+    m_entryWidget->actionInsert();
+}
+
+void VDRMainWindow::on_actionEntryCopy_triggered()
+{
+    m_entryWidget->actionCopy();
+}
+
+void VDRMainWindow::on_actionEntryDelete_triggered()
+{
+    m_entryWidget->actionDelete();
+}
+
+void VDRMainWindow::on_actionEntryGotoFirst_triggered()
+{
+    m_entryWidget->actionToFirst();
+}
+
+void VDRMainWindow::on_actionEntryGotoPrevious_triggered()
+{
+    m_entryWidget->actionToPrevious();
+}
+
+void VDRMainWindow::on_actionEntryGotoNext_triggered()
+{
+    m_entryWidget->actionToNext();
+}
+
+void VDRMainWindow::on_actionEntryGotoLast_triggered()
+{
+    m_entryWidget->actionToLast();
+}
+
+void VDRMainWindow::on_actionEntryAlterNumber_triggered()
+{
+    m_entryWidget->actionAlterNumber();
+}
+
+void VDRMainWindow::on_actionEntryChangeUID_triggered()
+{
+    m_entryWidget->actionEntryChangeUID();
+}
+
+void VDRMainWindow::on_actionSettingsChangeUID_triggered()
+{
+    m_entryWidget->actionSettingsChangeUID();
 }

@@ -30,6 +30,7 @@ public:
     ~VDRMainWindow() override;
 
     VDRDocument* document() const { return m_document; }
+    VDREntryWidget* entryWidget() const { return m_entryWidget; }
     // The start-up's spell checker; text fields ask it. May be null.
     void setSpellChecker(VDRSpellChecker* checker);
     VDRSpellChecker* spellChecker() const { return m_spellChecker; }
@@ -122,6 +123,17 @@ private slots:
     void on_actionSettingsCompanyList_triggered();
     void on_actionFormatCompany_triggered();
     void on_actionSettingsProjectLogo_triggered();
+    void on_actionEntryNew_triggered();
+    void on_actionEntryInsert_triggered();
+    void on_actionEntryCopy_triggered();
+    void on_actionEntryDelete_triggered();
+    void on_actionEntryGotoFirst_triggered();
+    void on_actionEntryGotoPrevious_triggered();
+    void on_actionEntryGotoNext_triggered();
+    void on_actionEntryGotoLast_triggered();
+    void on_actionEntryAlterNumber_triggered();
+    void on_actionEntryChangeUID_triggered();
+    void on_actionSettingsChangeUID_triggered();
 
 protected:
     bool event(QEvent* event) override;
@@ -164,6 +176,7 @@ private:
     QIcon m_recentIcon;
     bool m_painted = false;
     VDRSpellChecker* m_spellChecker = nullptr;
+    VDREntryWidget* m_entryWidget = nullptr;
 };
 
 // The one main window of the process, set at start-up.

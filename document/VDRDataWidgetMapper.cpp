@@ -17,17 +17,22 @@ QString plainTextOf(const QString& html)
     doc.setHtml(html);
     return doc.toPlainText();
 }
-// A NULL or unreadable stored value (a date "2026-02-30") is shown as an empty field; until the
-// user edits that field, it is left as stored instead of being replaced by the field's reading.
-bool untouchedUnreadable(const QObject* t, const QByteArray& prop, const QVariant& modelValue)
+// A field that reads its value out of typed text (a date, a time): reading it may correct the
+// text and warn, so it is read only after the user has typed into it.
+bool parsesText(const QObject* t, const QByteArray& prop)
 {
     const QMetaObject* meta = t->metaObject();
-    const int modified = meta->indexOfProperty("modified");
     const int index = meta->indexOfProperty(prop.constData());
-    if (modified < 0 || index < 0 || t->property("modified").toBool())
-        return false;
-    QVariant converted = modelValue;
-    return modelValue.isNull() || !converted.convert(meta->property(index).userType());
+    return meta->indexOfProperty("modified") >= 0 && index >= 0 &&
+           meta->property(index).userType() != QMetaType::QString;
+}
+
+// Such a field is written back only when the user has typed into it (or picked a value): a NULL
+// or unreadable stored value (a date "2026-02-30") shown as an empty field stays as stored, and
+// a stored time with seconds is not cut to the minutes the field shows.
+bool untouched(const QObject* t, const QByteArray& prop)
+{
+    return parsesText(t, prop) && !t->property("modified").toBool();
 }
 } // namespace
 
@@ -139,7 +144,7 @@ void VDRDataWidgetMapper::populate(const Mapping& m)
         return;
     const QVariant value = m_model->data(m_model->index(m_row, m.column), Qt::EditRole);
     const QByteArray prop = targetProperty(m);
-    if (t->property(prop.constData()) == value)
+    if (!parsesText(t, prop) && t->property(prop.constData()) == value)
         return;
     // A NULL (or a text a number field cannot take) must not leave the previous row's value behind.
     if (!t->setProperty(prop.constData(), value))
@@ -177,7 +182,7 @@ bool VDRDataWidgetMapper::commit(int column)
             continue;
         const QModelIndex idx = m_model->index(m_row, m.column);
         const QVariant modelValue = m_model->data(idx, Qt::EditRole);
-        if (m.property != kRichText && untouchedUnreadable(t, targetProperty(m), modelValue))
+        if (m.property != kRichText && untouched(t, targetProperty(m)))
             continue;
         const QVariant widgetValue = t->property(targetProperty(m).constData());
         bool differs;

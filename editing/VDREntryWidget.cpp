@@ -7,6 +7,8 @@
 #include "editing/VDRCompleterLineEdit.h"
 #include "editing/VDRCompleterTextEdit.h"
 #include "editing/VDRDateEdit.h"
+#include "editing/VDREntryInsertDialog.h"
+#include "editing/VDREntryNumberDialog.h"
 #include "editing/VDRRichTextEdit.h"
 #include "editing/VDRRichTextEditDialog.h"
 #include "editing/VDRTableView.h"
@@ -14,12 +16,6 @@
 #include "editing/VDRTimeRecordingWidget.h"
 #include "editing/VdEvent.h"
 #include "editing/VdEventsController.h"
-
-#if __has_include("editing/VDREntryInsertDialog.h")
-#include "editing/VDREntryInsertDialog.h"
-#include "editing/VDREntryNumberDialog.h"
-#define VDR_HAVE_NUMBER_DIALOGS 1
-#endif
 
 #include <QApplication>
 #include <QCheckBox>
@@ -1099,8 +1095,7 @@ void VDREntryWidget::actionInsert()
 {
     if (!m_document)
         return;
-#ifdef VDR_HAVE_NUMBER_DIALOGS
-    VDREntryInsertDialog dialog(this);
+    VDREntryInsertDialog dialog(m_document, this);
     if (m_row >= 0) {
         dialog.setEntryNumber(m_document->entryNumberString(m_row));
         const QChar letter = m_document->entryNumberLetter(m_row);
@@ -1110,7 +1105,6 @@ void VDREntryWidget::actionInsert()
         return;
     const char letter = dialog.getEntryLetter();
     insertWithNumber(dialog.getEntryNumber(), letter ? letter - 'a' + 1 : 0);
-#endif
 }
 
 void VDREntryWidget::actionAlterNumber()
@@ -1118,8 +1112,7 @@ void VDREntryWidget::actionAlterNumber()
     if (!m_document || m_row < 0 || isLocked())
         return;
     actionAskForSubmit();
-#ifdef VDR_HAVE_NUMBER_DIALOGS
-    VDREntryNumberDialog dialog(this);
+    VDREntryNumberDialog dialog(m_document, this);
     dialog.setEntryNumber(m_document->entryNumberString(m_row));
     const QChar letter = m_document->entryNumberLetter(m_row);
     dialog.setEntryLetter(letter.unicode() > 255 ? 0 : char(letter.unicode()));
@@ -1127,7 +1120,6 @@ void VDREntryWidget::actionAlterNumber()
         return;
     const char chosen = dialog.getEntryLetter();
     alterNumberTo(dialog.getEntryNumber(), chosen ? chosen - 'a' + 1 : 0);
-#endif
 }
 
 void VDREntryWidget::actionDelete()
