@@ -710,9 +710,16 @@ void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
     VDRAllEntryTableModel* model = document->modelEntryAll();
     m_entryList->slotDocumentOpened(document);
     // The list follows every report the form shows, however it got there.
-    if (VDREntryWidget* form = reportForm(this))
+    if (VDREntryWidget* form = reportForm(this)) {
         connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::selectRow,
                 Qt::UniqueConnection);
+        // New, copied and re-authored reports may bring the first author code.
+        connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::slotShowUserIds,
+                Qt::UniqueConnection);
+        // The form may have shown its first report before the list had the diary.
+        if (form->document() == document)
+            m_entryList->selectRow(form->currentRow());
+    }
     connect(model, &VDRAllEntryTableModel::reportDatesChanged, this, &VDRMainWindow::slotReportDatesChanged,
             Qt::UniqueConnection);
     model->updateDates();
