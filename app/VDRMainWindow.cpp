@@ -849,7 +849,8 @@ int VDRMainWindow::displayEntrySelector(QList<int>& ids, int mode, const QString
     VDREntrySelectorWidget dialog(mode, this);
     if (!title.isEmpty())
         dialog.setWindowTitle(title);
-    const int currentRow = m_entryList->currentRow();
+    VDREntryWidget* form = reportForm(this);
+    const int currentRow = form ? form->currentRow() : m_entryList->currentRow();
     dialog.setDocument(m_document, currentRow);
     const int result = dialog.exec();
     if (result == VDREntrySelectorWidget::Cancelled)
