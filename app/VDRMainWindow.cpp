@@ -10,12 +10,18 @@
 #include "editing/CompleterEditor.h"
 #include "editing/VDRBackupConfigDialog.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDREntryDateWidget.h"
+#include "editing/VDREntryListWidget.h"
+#include "editing/VDREntrySelectorWidget.h"
+#include "editing/VDREntryWidget.h"
 #include "editing/VDRItemDelegate.h"
 #include "editing/VDROutputSelectDialog.h"
 #include "editing/VDRPrintTextsEditor.h"
 #include "editing/VDRProjectDataWidget.h"
 #include "editing/VDRProjectLogoWidget.h"
 #include "editing/VDRSpellChecker.h"
+#include "editing/VdEvent.h"
+#include "editing/VdEventsController.h"
 #include "printing/CVdPrintFirmList.h"
 #include "printing/CVdPrintoutFormblatt.h"
 #include "printing/CVdTexts.h"
@@ -23,7 +29,6 @@
 #include "sync/VDRReportSynchronisation.h"
 
 #include <QAction>
-#include <QCalendarWidget>
 #include <QCloseEvent>
 #include <QCoreApplication>
 #include <QDesktopServices>
@@ -83,7 +88,18 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionToolbarPrintCompanyList",
                                      "actionPrintoutSettings",
                                      "actionSchriftarten",
-                                     "actionDrucktexte"};
+                                     "actionDrucktexte",
+                                     "actionEntryNew",
+                                     "actionEntryInsert",
+                                     "actionEntryCopy",
+                                     "actionEntryDelete",
+                                     "actionEntryGotoFirst",
+                                     "actionEntryGotoPrevious",
+                                     "actionEntryGotoNext",
+                                     "actionEntryGotoLast",
+                                     "actionEntryAlterNumber",
+                                     "actionEntryChangeUID",
+                                     "actionSettingsChangeUID"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionFileSaveAs",
@@ -97,7 +113,17 @@ const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionExportMasterData",
                                         "actionFilePrintEmptyEntry",
                                         "actionFilePrintCompanyList",
-                                        "actionToolbarPrintCompanyList"};
+                                        "actionToolbarPrintCompanyList",
+                                        "actionEntryNew",
+                                        "actionEntryInsert",
+                                        "actionEntryCopy",
+                                        "actionEntryDelete",
+                                        "actionEntryGotoFirst",
+                                        "actionEntryGotoPrevious",
+                                        "actionEntryGotoNext",
+                                        "actionEntryGotoLast",
+                                        "actionEntryAlterNumber",
+                                        "actionEntryChangeUID"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -161,12 +187,18 @@ QString sqliteVersion()
     QSqlQuery q(about.db());
     return q.exec(QStringLiteral("SELECT sqlite_version()")) && q.next() ? q.value(0).toString() : QString();
 }
+
+// The report form of the window, wherever the window keeps it.
+VDREntryWidget* reportForm(const QObject* window)
+{
+    return window->findChild<VDREntryWidget*>();
+}
 } // namespace
 
 VDRMainWindow::VDRMainWindow(QWidget* parent)
     : QMainWindow(parent), m_document(new VDRDocument(this)), m_central(new QStackedWidget(this)),
-      m_welcome(new WelcomeLabel(this)), m_reportPage(new QLabel(this)), m_entryList(new QTableView(this)),
-      m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
+      m_welcome(new WelcomeLabel(this)), m_reportPage(new QLabel(this)),
+      m_entryList(new VDREntryListWidget(this)), m_clock(new QLabel(this)), m_clockTimer(new QTimer(this)),
       m_recentIcon(
           new LazyIconEngine(QStringLiteral(":/VDRMainWindow/Resources/1 Datei/03-datei-recent.ico")))
 {
@@ -188,9 +220,6 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     setCentralWidget(m_central);
 
     m_entryList->setObjectName(QStringLiteral("entryList"));
-    m_entryList->setEditTriggers(QAbstractItemView::NoEditTriggers);
-    m_entryList->setSelectionBehavior(QAbstractItemView::SelectRows);
-    m_entryList->verticalHeader()->hide();
     m_dockEntryList = addDock(tr("Bautagesberichte"), QStringLiteral("dockWidgetEntryList"), m_entryList,
                               Qt::LeftDockWidgetArea);
     // The calendar costs more than the rest of the dock area: it is built right after the window's
@@ -223,6 +252,27 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     resizeDocks({m_dockEntryList, firstPhotoDock}, {320, 320}, Qt::Horizontal);
     resizeDocks({search}, {120}, Qt::Vertical);
 
+    // The list moves the calendar to the date of the report it selects.
+    connect(m_entryList, &VDREntryListWidget::dateSelected, this, [this](const QDate& date) {
+        m_shownDate = date;
+        if (m_calendar)
+            m_calendar->showReportDate(date);
+    });
+    connect(m_entryList, &VDREntryListWidget::rowChangedToLockedEntry, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete);
+    connect(m_entryList, &VDREntryListWidget::rowChangedToUnlockedEntry, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryEnableDelete);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllAlterNumber, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllAlterNumber);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllCopy, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllCopy);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllDelete, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllDelete);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllChangeUID, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllChangeUID);
+    m_dockEntryList->installEventFilter(this);
+    m_dockEntryDate->installEventFilter(this);
+
     QSettings settings;
     m_dockEntryList->setVisible(settings.value(showEntryListSettingsKey(), true).toBool());
     m_dockEntryDate->setVisible(settings.value(showEntryDateSettingsKey(), true).toBool());
@@ -239,6 +289,13 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     connect(m_document, &VDRDocument::documentOpened, this, &VDRMainWindow::slotDocumentOpened);
     connect(m_document, &VDRDocument::documentClosed, this, &VDRMainWindow::slotDocumentClosed);
     connect(m_document, &VDRDocument::recentFileMissing, this, &VDRMainWindow::removeRecentFile);
+    m_entryWidget = new VDREntryWidget(m_central);
+    // The form's many fields must not decide the window's smallest size on a small screen.
+    m_entryWidget->setMinimumSize(320, 240);
+    m_central->addWidget(m_entryWidget);
+    connect(m_document, &VDRDocument::documentOpened, m_entryWidget, &VDREntryWidget::slotDocumentOpened);
+    connect(m_document, &VDRDocument::documentClosed, m_entryWidget, &VDREntryWidget::slotDocumentClosed);
+    connect(m_entryWidget, &VDREntryWidget::doOpenHelp, this, &VDRMainWindow::showHelp);
     connectActions();
     updateGui();
     resize(kDefaultSize);
@@ -471,6 +528,8 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
 {
     if (!m_document->isStateValid())
         return 0;
+    // What is typed into the report belongs to the diary being saved or asked about.
+    m_entryWidget->actionAskForSubmit();
     if (m_document->isDemoProject()) {
         // The demo is never saved: only offer what can work.
         if (withoutQuestion) {
@@ -561,6 +620,7 @@ bool VDRMainWindow::closeDocument(bool askToSave)
 {
     if (!m_document->isStateValid())
         return true;
+    m_entryWidget->actionAskForSubmit();
     if (askToSave && saveDocument(false, false) != 0)
         return false;
     if (!m_document->closeDocument()) {
@@ -576,6 +636,8 @@ bool VDRMainWindow::closeDocument(bool askToSave)
 void VDRMainWindow::endSession()
 {
     if (m_document->isStateValid()) {
+        // Kept in the working copy, which the next opening resumes.
+        m_entryWidget->actionAskForSubmit();
         if (m_document->isStateModified())
             m_document->closeKeepingWorkingCopy();
         else
@@ -636,7 +698,7 @@ void VDRMainWindow::updateGui()
         action->setStatusTip(demo ? tip : QString());
     }
     updateReportPage();
-    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_reportPage) : m_welcome);
+    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_entryWidget) : m_welcome);
     QString title = tr("Varduna");
     if (valid) {
         const QString name =
@@ -662,17 +724,18 @@ void VDRMainWindow::showWelcomePage()
 void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
 {
     VDRAllEntryTableModel* model = document->modelEntryAll();
-    m_entryList->setModel(model);
-    const QSqlRecord record = model->record();
-    for (int c = 0; c < record.count(); ++c) {
-        const QString field = record.fieldName(c);
-        m_entryList->setColumnHidden(c, field != QLatin1String("number") &&
-                                            field != QLatin1String("inspection_date"));
+    m_entryList->slotDocumentOpened(document);
+    // The list follows every report the form shows, however it got there.
+    if (VDREntryWidget* form = reportForm(this)) {
+        connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::selectRow,
+                Qt::UniqueConnection);
+        // New, copied and re-authored reports may bring the first author code.
+        connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::slotShowUserIds,
+                Qt::UniqueConnection);
+        // The form may have shown its first report before the list had the diary.
+        if (form->document() == document)
+            m_entryList->selectRow(form->currentRow());
     }
-    model->setHeaderData(QStringLiteral("number"), Qt::Horizontal, tr("Nr."));
-    model->setHeaderData(QStringLiteral("inspection_date"), Qt::Horizontal, tr("Datum"));
-    m_entryList->resizeColumnsToContents();
-    m_entryList->horizontalHeader()->setStretchLastSection(true);
     connect(model, &VDRAllEntryTableModel::reportDatesChanged, this, &VDRMainWindow::slotReportDatesChanged,
             Qt::UniqueConnection);
     model->updateDates();
@@ -695,9 +758,9 @@ void VDRMainWindow::updateReportPage()
     m_reportPage->setText(tr("<h2>%1</h2><p>%2</p><p>%3</p>").arg(name.toHtmlEscaped(), count, file));
 }
 
-void VDRMainWindow::slotDocumentClosed(VDRDocument*)
+void VDRMainWindow::slotDocumentClosed(VDRDocument* document)
 {
-    m_entryList->setModel(nullptr);
+    m_entryList->slotDocumentClosed(document);
     slotReportDatesChanged({});
     updateGui();
 }
@@ -711,24 +774,130 @@ void VDRMainWindow::slotReportDatesChanged(const QList<QDate>& dates)
 
 void VDRMainWindow::markReportDates()
 {
-    m_calendar->setDateTextFormat(QDate(), QTextCharFormat());
-    QTextCharFormat marked;
-    marked.setFontWeight(QFont::Bold);
-    marked.setBackground(QColor(255, 230, 150));
-    for (const QDate& date : qAsConst(m_reportDates))
-        m_calendar->setDateTextFormat(date, marked);
+    m_calendar->setAvailableDates(m_reportDates);
 }
 
 void VDRMainWindow::buildCalendar()
 {
     if (m_calendar)
         return;
-    m_calendar = new QCalendarWidget(this);
+    m_calendar = new VDREntryDateWidget(this);
     m_calendar->setObjectName(QStringLiteral("calendar"));
     QWidget* placeholder = m_dockEntryDate->widget();
     m_dockEntryDate->setWidget(m_calendar);
     delete placeholder;
+    connect(m_calendar, &VDREntryDateWidget::dateSelected, this,
+            &VDRMainWindow::slot_dockWidgetEntryDate_dateSelected);
     markReportDates();
+    m_calendar->showReportDate(m_shownDate);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryDate_dateSelected(const QDate& date, bool& found)
+{
+    found = false;
+    if (!m_document->isStateValid() || !m_document->modelEntryAll())
+        return;
+    VDREntryWidget* form = reportForm(this);
+    if (form && form->document() == m_document) {
+        form->actionAskForSubmit();
+        found = form->actionGotoDate(date);
+        return;
+    }
+    // Without a form the list at least selects the report of that date.
+    VDRAllEntryTableModel* model = m_document->modelEntryAll();
+    model->fetch_all();
+    const QString wanted = date.toString(QStringLiteral("yyyy-MM-dd"));
+    for (int row = 0; row < model->rowCount() && !found; ++row) {
+        if (model->data(row, QStringLiteral("inspection_date"), Qt::EditRole).toString() == wanted) {
+            found = true;
+            VdEventsController::instance()->send_event(VdEvent::SelectRow, row);
+        }
+    }
+}
+
+void VDRMainWindow::runOnEntryRow(int row, void (VDREntryWidget::*command)())
+{
+    VDREntryWidget* form = reportForm(this);
+    if (!form || form->document() != m_document || !m_document->isStateValid())
+        return;
+    // Showing the row first keeps what was typed into the report shown before.
+    form->actionGoto(row, -1);
+    if (form->currentRow() != row)
+        return;
+    (form->*command)();
+    // After a copy or a deletion the form shows another row than the one clicked.
+    VdEventsController::instance()->send_event(VdEvent::SelectRow, form->currentRow());
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllAlterNumber(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionAlterNumber);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllCopy(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionCopy);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllDelete(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionDelete);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllChangeUID(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionEntryChangeUID);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete()
+{
+    m_entryList->setDeleteEnabled(false);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryEnableDelete()
+{
+    m_entryList->setDeleteEnabled(true);
+}
+
+int VDRMainWindow::displayEntrySelector(QList<int>& ids, int mode, const QString& title, QString* pdfFileName)
+{
+    ids.clear();
+    VDREntrySelectorWidget dialog(mode, this);
+    if (!title.isEmpty())
+        dialog.setWindowTitle(title);
+    VDREntryWidget* form = reportForm(this);
+    const int currentRow = form ? form->currentRow() : m_entryList->currentRow();
+    dialog.setDocument(m_document, currentRow);
+    const int result = dialog.exec();
+    if (result == VDREntrySelectorWidget::Cancelled)
+        return result;
+    ids = VDREntrySelectorWidget::entryIds(m_document, dialog.getSelectedMode(), currentRow,
+                                           dialog.getSelectionMode5From(), dialog.getSelectionMode5To());
+    if (pdfFileName)
+        *pdfFileName = VDREntrySelectorWidget::pdfFileName(m_document, dialog.getSelectedMode(), ids);
+    return result;
+}
+
+bool VDRMainWindow::eventFilter(QObject* watched, QEvent* event)
+{
+    // Only the dock's own close button closes it; the view actions hide it.
+    if (event->type() == QEvent::Close && (watched == m_dockEntryList || watched == m_dockEntryDate)) {
+        const bool list = watched == m_dockEntryList;
+        QSettings().setValue(list ? showEntryListSettingsKey() : showEntryDateSettingsKey(), false);
+        if (m_showDockHints) {
+            if (list)
+                VDRPrompt::information(
+                    tr("Bautagesberichte wieder einschalten"),
+                    tr("Sie können die Liste der Bautagesberichte über einen rechten "
+                       "Mausklick auf die Symbolleiste oder die Menüleiste wieder einschalten."));
+            else
+                VDRPrompt::information(
+                    tr("Bauberichts-Kalender wieder einschalten"),
+                    tr("Sie können den Bauberichts-Kalender über einen rechten Mausklick auf "
+                       "die Symbolleiste oder die Menüleiste wieder einschalten."));
+        }
+    }
+    return QMainWindow::eventFilter(watched, event);
 }
 
 void VDRMainWindow::checkFileSize()
@@ -1050,4 +1219,59 @@ void VDRMainWindow::on_actionDrucktexte_triggered()
 {
     VDRPrintTextsEditor editor(CVdTexts::self()->model(), this);
     editor.exec();
+}
+
+void VDRMainWindow::on_actionEntryNew_triggered()
+{
+    m_entryWidget->actionNew();
+}
+
+void VDRMainWindow::on_actionEntryInsert_triggered()
+{
+    m_entryWidget->actionInsert();
+}
+
+void VDRMainWindow::on_actionEntryCopy_triggered()
+{
+    m_entryWidget->actionCopy();
+}
+
+void VDRMainWindow::on_actionEntryDelete_triggered()
+{
+    m_entryWidget->actionDelete();
+}
+
+void VDRMainWindow::on_actionEntryGotoFirst_triggered()
+{
+    m_entryWidget->actionToFirst();
+}
+
+void VDRMainWindow::on_actionEntryGotoPrevious_triggered()
+{
+    m_entryWidget->actionToPrevious();
+}
+
+void VDRMainWindow::on_actionEntryGotoNext_triggered()
+{
+    m_entryWidget->actionToNext();
+}
+
+void VDRMainWindow::on_actionEntryGotoLast_triggered()
+{
+    m_entryWidget->actionToLast();
+}
+
+void VDRMainWindow::on_actionEntryAlterNumber_triggered()
+{
+    m_entryWidget->actionAlterNumber();
+}
+
+void VDRMainWindow::on_actionEntryChangeUID_triggered()
+{
+    m_entryWidget->actionEntryChangeUID();
+}
+
+void VDRMainWindow::on_actionSettingsChangeUID_triggered()
+{
+    m_entryWidget->actionSettingsChangeUID();
 }

@@ -9,7 +9,6 @@
 
 #include <memory>
 
-class QCalendarWidget;
 class QDockWidget;
 class QLabel;
 class QMessageBox;
@@ -17,6 +16,9 @@ class QStackedWidget;
 class QTableView;
 class QTimer;
 class VDRDocument;
+class VDREntryDateWidget;
+class VDREntryListWidget;
+class VDREntryWidget;
 class VDRSpellChecker;
 
 // The one main window: menus, tool bar, docks, status bar and the document-level commands.
@@ -28,6 +30,7 @@ public:
     ~VDRMainWindow() override;
 
     VDRDocument* document() const { return m_document; }
+    VDREntryWidget* entryWidget() const { return m_entryWidget; }
     // The start-up's spell checker; text fields ask it. May be null.
     void setSpellChecker(VDRSpellChecker* checker);
     VDRSpellChecker* spellChecker() const { return m_spellChecker; }
@@ -76,10 +79,26 @@ public:
     static QString showEntryListSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryList"); }
     static QString showEntryDateSettingsKey() { return QStringLiteral("MainWindow/showDockWidgetEntryDate"); }
 
+    VDREntryListWidget* entryListWidget() const { return m_entryList; }
+    // Null until the calendar dock is first shown.
+    VDREntryDateWidget* entryDateWidget() const { return m_calendar; }
+    // Closing a report dock by its button tells how to get it back, while this is on.
+    void setShowDockHints(bool show) { m_showDockHints = show; }
+    // Runs the report selection dialog; 'ids' gets the chosen reports in row order and 'pdfFileName'
+    // (may be null) the proposed PDF name. Returns what closed the dialog (0 = cancelled).
+    int displayEntrySelector(QList<int>& ids, int mode, const QString& title, QString* pdfFileName = nullptr);
+
 public slots:
     void slotDocumentOpened(VDRDocument* document);
     void slotDocumentClosed(VDRDocument* document);
     void showWelcomePage();
+    void slot_dockWidgetEntryDate_dateSelected(const QDate& date, bool& found);
+    void slot_dockWidgetEntryList_doEntryDisableDelete();
+    void slot_dockWidgetEntryList_doEntryEnableDelete();
+    void slot_dockWidgetEntryList_doEntryAllAlterNumber(int row);
+    void slot_dockWidgetEntryList_doEntryAllCopy(int row);
+    void slot_dockWidgetEntryList_doEntryAllDelete(int row);
+    void slot_dockWidgetEntryList_doEntryAllChangeUID(int row);
 
 private slots:
     void on_actionFileNew_triggered();
@@ -110,9 +129,21 @@ private slots:
     void on_actionPrintoutSettings_triggered();
     void on_actionSchriftarten_triggered();
     void on_actionDrucktexte_triggered();
+    void on_actionEntryNew_triggered();
+    void on_actionEntryInsert_triggered();
+    void on_actionEntryCopy_triggered();
+    void on_actionEntryDelete_triggered();
+    void on_actionEntryGotoFirst_triggered();
+    void on_actionEntryGotoPrevious_triggered();
+    void on_actionEntryGotoNext_triggered();
+    void on_actionEntryGotoLast_triggered();
+    void on_actionEntryAlterNumber_triggered();
+    void on_actionEntryChangeUID_triggered();
+    void on_actionSettingsChangeUID_triggered();
 
 protected:
     bool event(QEvent* event) override;
+    bool eventFilter(QObject* watched, QEvent* event) override;
     void closeEvent(QCloseEvent* event) override;
 
 private:
@@ -123,6 +154,9 @@ private:
     void updateViewActions();
     void updateReportPage();
     void markReportDates();
+    // Shows the report of 'row', runs one of the form's commands on it and has the list select
+    // the report then shown.
+    void runOnEntryRow(int row, void (VDREntryWidget::*command)());
     void buildCalendar();
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).
@@ -136,9 +170,11 @@ private:
     QStackedWidget* m_central;
     QLabel* m_welcome;
     QLabel* m_reportPage;
-    QTableView* m_entryList;
-    QCalendarWidget* m_calendar = nullptr;
+    VDREntryListWidget* m_entryList;
+    VDREntryDateWidget* m_calendar = nullptr;
     QList<QDate> m_reportDates;
+    QDate m_shownDate;
+    bool m_showDockHints = true;
     QDockWidget* m_dockEntryList;
     QDockWidget* m_dockEntryDate;
     QLabel* m_clock;
@@ -146,6 +182,7 @@ private:
     QIcon m_recentIcon;
     bool m_painted = false;
     VDRSpellChecker* m_spellChecker = nullptr;
+    VDREntryWidget* m_entryWidget = nullptr;
 };
 
 // The one main window of the process, set at start-up.

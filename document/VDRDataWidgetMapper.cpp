@@ -3,6 +3,7 @@
 #include "document/VDRSqlTableModel.h"
 
 #include <QEvent>
+#include <QMetaProperty>
 #include <QTextDocument>
 #include <QVariant>
 
@@ -15,6 +16,23 @@ QString plainTextOf(const QString& html)
     QTextDocument doc;
     doc.setHtml(html);
     return doc.toPlainText();
+}
+// A field that reads its value out of typed text (a date, a time): reading it may correct the
+// text and warn, so it is read only after the user has typed into it.
+bool parsesText(const QObject* t, const QByteArray& prop)
+{
+    const QMetaObject* meta = t->metaObject();
+    const int index = meta->indexOfProperty(prop.constData());
+    return meta->indexOfProperty("modified") >= 0 && index >= 0 &&
+           meta->property(index).userType() != QMetaType::QString;
+}
+
+// Such a field is written back only when the user has typed into it (or picked a value): a NULL
+// or unreadable stored value (a date "2026-02-30") shown as an empty field stays as stored, and
+// a stored time with seconds is not cut to the minutes the field shows.
+bool untouched(const QObject* t, const QByteArray& prop)
+{
+    return parsesText(t, prop) && !t->property("modified").toBool();
 }
 } // namespace
 
@@ -126,7 +144,7 @@ void VDRDataWidgetMapper::populate(const Mapping& m)
         return;
     const QVariant value = m_model->data(m_model->index(m_row, m.column), Qt::EditRole);
     const QByteArray prop = targetProperty(m);
-    if (t->property(prop.constData()) == value)
+    if (!parsesText(t, prop) && t->property(prop.constData()) == value)
         return;
     // A NULL (or a text a number field cannot take) must not leave the previous row's value behind.
     if (!t->setProperty(prop.constData(), value))
@@ -163,8 +181,10 @@ bool VDRDataWidgetMapper::commit(int column)
         if (!t)
             continue;
         const QModelIndex idx = m_model->index(m_row, m.column);
-        const QVariant widgetValue = t->property(targetProperty(m).constData());
         const QVariant modelValue = m_model->data(idx, Qt::EditRole);
+        if (m.property != kRichText && untouched(t, targetProperty(m)))
+            continue;
+        const QVariant widgetValue = t->property(targetProperty(m).constData());
         bool differs;
         if (m.property == kRichText)
             differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString());

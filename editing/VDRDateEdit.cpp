@@ -75,6 +75,7 @@ void VDRDateEdit::slotOpenCalendar()
     connect(calendar, &QCalendarWidget::clicked, calendar, [self, calendar](const QDate& picked) {
         if (self) {
             self->setDate(picked);
+            self->setModified(true);
             emit self->editingFinished();
         }
         calendar->close();

@@ -57,6 +57,7 @@ void VDRTimeEdit::slotOpenPicker()
     picker.move(QCursor::pos());
     connect(&picker, &VDRTimePickerWidget::okClicked, this, [this](const QTime& picked) {
         setTime(picked);
+        setModified(true);
         emit editingFinished();
     });
     picker.exec();
