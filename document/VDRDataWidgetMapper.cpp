@@ -164,8 +164,11 @@ void VDRDataWidgetMapper::populateEmpty()
         if (!t)
             continue;
         const QByteArray prop = targetProperty(m);
-        const QVariant current = t->property(prop.constData());
-        t->setProperty(prop.constData(), QVariant(current.userType(), nullptr));
+        // The type comes from the declaration: reading a date field would correct its text and warn.
+        const int index = t->metaObject()->indexOfProperty(prop.constData());
+        const int type = index >= 0 ? t->metaObject()->property(index).userType()
+                                    : t->property(prop.constData()).userType();
+        t->setProperty(prop.constData(), QVariant(type, nullptr));
     }
 }
 
