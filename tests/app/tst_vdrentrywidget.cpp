@@ -16,6 +16,7 @@
 #include <QApplication>
 #include <QClipboard>
 #include <QDialog>
+#include <QDockWidget>
 #include <QHeaderView>
 #include <QInputDialog>
 #include <QLabel>
@@ -382,7 +383,12 @@ private slots:
         QVERIFY(m_form->headLine().contains(m_window->document()->projectName().toHtmlEscaped()));
         const QByteArray screenshot = qgetenv("VARDUNA_SCREENSHOT");
         if (!screenshot.isEmpty()) {
-            m_window->resize(1280, 800);
+            // A draft, with the list and calendar beside it and nothing else.
+            QLocale::setDefault(QLocale(QLocale::German, QLocale::Germany));
+            m_form->actionToLast();
+            for (QDockWidget* dock : m_window->findChildren<QDockWidget*>())
+                dock->setVisible(dock->objectName().startsWith(QLatin1String("dockWidgetEntry")));
+            m_window->resize(1280, 860);
             QTest::qWait(100);
             QVERIFY(m_window->grab().save(QString::fromLocal8Bit(screenshot)));
         }
