@@ -171,6 +171,12 @@ QString sqliteVersion()
     QSqlQuery q(about.db());
     return q.exec(QStringLiteral("SELECT sqlite_version()")) && q.next() ? q.value(0).toString() : QString();
 }
+
+// The report form of the window, wherever the window keeps it.
+VDREntryWidget* reportForm(const QObject* window)
+{
+    return window->findChild<VDREntryWidget*>();
+}
 } // namespace
 
 VDRMainWindow::VDRMainWindow(QWidget* parent)
@@ -240,6 +246,14 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
             &VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete);
     connect(m_entryList, &VDREntryListWidget::rowChangedToUnlockedEntry, this,
             &VDRMainWindow::slot_dockWidgetEntryList_doEntryEnableDelete);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllAlterNumber, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllAlterNumber);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllCopy, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllCopy);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllDelete, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllDelete);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllChangeUID, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllChangeUID);
     m_dockEntryList->installEventFilter(this);
     m_dockEntryDate->installEventFilter(this);
 
@@ -695,6 +709,17 @@ void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
 {
     VDRAllEntryTableModel* model = document->modelEntryAll();
     m_entryList->slotDocumentOpened(document);
+    // The list follows every report the form shows, however it got there.
+    if (VDREntryWidget* form = reportForm(this)) {
+        connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::selectRow,
+                Qt::UniqueConnection);
+        // New, copied and re-authored reports may bring the first author code.
+        connect(form, &VDREntryWidget::currentRowChanged, m_entryList, &VDREntryListWidget::slotShowUserIds,
+                Qt::UniqueConnection);
+        // The form may have shown its first report before the list had the diary.
+        if (form->document() == document)
+            m_entryList->selectRow(form->currentRow());
+    }
     connect(model, &VDRAllEntryTableModel::reportDatesChanged, this, &VDRMainWindow::slotReportDatesChanged,
             Qt::UniqueConnection);
     model->updateDates();
@@ -756,16 +781,56 @@ void VDRMainWindow::slot_dockWidgetEntryDate_dateSelected(const QDate& date, boo
     found = false;
     if (!m_document->isStateValid() || !m_document->modelEntryAll())
         return;
+    VDREntryWidget* form = reportForm(this);
+    if (form && form->document() == m_document) {
+        form->actionAskForSubmit();
+        found = form->actionGotoDate(date);
+        return;
+    }
+    // Without a form the list at least selects the report of that date.
     VDRAllEntryTableModel* model = m_document->modelEntryAll();
     model->fetch_all();
     const QString wanted = date.toString(QStringLiteral("yyyy-MM-dd"));
     for (int row = 0; row < model->rowCount() && !found; ++row) {
         if (model->data(row, QStringLiteral("inspection_date"), Qt::EditRole).toString() == wanted) {
             found = true;
-            VdEventsController::instance()->send_event(VdEvent::GotoRow, row);
             VdEventsController::instance()->send_event(VdEvent::SelectRow, row);
         }
     }
+}
+
+void VDRMainWindow::runOnEntryRow(int row, void (VDREntryWidget::*command)())
+{
+    VDREntryWidget* form = reportForm(this);
+    if (!form || form->document() != m_document || !m_document->isStateValid())
+        return;
+    // Showing the row first keeps what was typed into the report shown before.
+    form->actionGoto(row, -1);
+    if (form->currentRow() != row)
+        return;
+    (form->*command)();
+    // After a copy or a deletion the form shows another row than the one clicked.
+    VdEventsController::instance()->send_event(VdEvent::SelectRow, form->currentRow());
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllAlterNumber(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionAlterNumber);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllCopy(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionCopy);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllDelete(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionDelete);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllChangeUID(int row)
+{
+    runOnEntryRow(row, &VDREntryWidget::actionEntryChangeUID);
 }
 
 void VDRMainWindow::slot_dockWidgetEntryList_doEntryDisableDelete()

@@ -95,6 +95,10 @@ public slots:
     void slot_dockWidgetEntryDate_dateSelected(const QDate& date, bool& found);
     void slot_dockWidgetEntryList_doEntryDisableDelete();
     void slot_dockWidgetEntryList_doEntryEnableDelete();
+    void slot_dockWidgetEntryList_doEntryAllAlterNumber(int row);
+    void slot_dockWidgetEntryList_doEntryAllCopy(int row);
+    void slot_dockWidgetEntryList_doEntryAllDelete(int row);
+    void slot_dockWidgetEntryList_doEntryAllChangeUID(int row);
 
 private slots:
     void on_actionFileNew_triggered();
@@ -144,6 +148,9 @@ private:
     void updateViewActions();
     void updateReportPage();
     void markReportDates();
+    // Shows the report of 'row', runs one of the form's commands on it and has the list select
+    // the report then shown.
+    void runOnEntryRow(int row, void (VDREntryWidget::*command)());
     void buildCalendar();
     void checkFileSize();
     // Suggestion texts learnt in fields reach the settings (the cloud copy follows with the sync).

@@ -6,6 +6,7 @@
 #include "editing/VDREntryDateWidget.h"
 #include "editing/VDREntryListWidget.h"
 #include "editing/VDREntrySelectorWidget.h"
+#include "editing/VDREntryWidget.h"
 #include "editing/VdEvent.h"
 #include "editing/VdEventsController.h"
 
@@ -15,6 +16,7 @@
 #include <QMenu>
 #include <QPushButton>
 #include <QRadioButton>
+#include <QStackedWidget>
 #include <QTableView>
 #include <QtTest>
 
@@ -301,6 +303,81 @@ private slots:
         window.setShowDockHints(false);
         window.findChild<QDockWidget*>("dockWidgetEntryList")->show();
         window.findChild<QDockWidget*>("dockWidgetEntryList")->close();
+    }
+
+    // Leaving a report through the list or the calendar keeps what was typed; a date without a
+    // report leaves the form where it was. The context commands act on the row clicked.
+    void formFollowsListAndCalendar()
+    {
+        m_doc.reset();
+        QSettings().setValue(VDRMainWindow::showEntryDateSettingsKey(), true);
+        QSettings().setValue(VDRMainWindow::showEntryListSettingsKey(), true);
+        VDRMainWindow window;
+        VDREntryWidget* form = window.findChild<VDREntryWidget*>();
+        if (!form) {
+            form = new VDREntryWidget(&window);
+            window.findChild<QStackedWidget*>()->addWidget(form);
+            window.findChild<QStackedWidget*>()->setCurrentWidget(form);
+            connect(window.document(), &VDRDocument::documentOpened, form,
+                    &VDREntryWidget::slotDocumentOpened);
+        }
+        window.show();
+        // The first binding reads the still empty date field, which warns (the form's own matter);
+        // this test is about the list and the calendar.
+        form->findChild<QLineEdit*>(QStringLiteral("entrydataInspectionDate"))
+            ->setText(QStringLiteral("01.01.2026"));
+        QVERIFY(window.createDocument(true));
+        VDRDocument* doc = window.document();
+        VDRAllEntryTableModel* model = doc->modelEntryAll();
+        for (int i = 0; i < 2; ++i)
+            QVERIFY(doc->appendEntry() == 1 && model->submitAll());
+        model->fetch_all();
+        const QDate dates[] = {QDate(2026, 3, 2), QDate(2026, 3, 3), QDate(2026, 3, 5)};
+        for (int row = 0; row < 3; ++row)
+            QVERIFY(model->setData(row, QStringLiteral("inspection_date"), dates[row].toString(Qt::ISODate)));
+        QVERIFY(model->submitAll());
+        form->actionGoto(0, -1);
+        VDREntryListWidget* list = window.entryListWidget();
+        QTRY_COMPARE(list->currentRow(), 0);
+        auto weather = [&](int row) {
+            return textsOn(doc->database(), QStringLiteral("SELECT env_weather1 FROM entry WHERE id = %1")
+                                                .arg(model->data(row, "id", Qt::EditRole).toInt()));
+        };
+        auto* field = form->findChild<QLineEdit*>(QStringLiteral("entrydataEnvWeather1"));
+        QVERIFY(field);
+
+        QTest::keyClicks(field, QStringLiteral("sonnig"));
+        QTableView* view = list->tableView();
+        QTest::mouseClick(view->viewport(), Qt::LeftButton, {},
+                          view->visualRect(model->index(2, model->fieldIndex("number"))).center());
+        QTRY_COMPARE(form->currentRow(), 2);
+        QCOMPARE(weather(0), QStringList({"sonnig"}));
+
+        QTRY_VERIFY(window.entryDateWidget());
+        VDREntryDateWidget* calendar = window.entryDateWidget();
+        QTRY_COMPARE(calendar->selectedDate(), dates[2]);
+        QTest::keyClicks(field, QStringLiteral("Regen"));
+        const auto click = [calendar](const QDate& date) {
+            calendar->setSelectedDate(date);
+            emit calendar->clicked(date);
+        };
+        click(QDate(2026, 3, 9));
+        QCOMPARE(form->currentRow(), 2);
+        QCOMPARE(calendar->selectedDate(), dates[2]);
+        QCOMPARE(field->text(), QStringLiteral("Regen"));
+        click(dates[0]);
+        QTRY_COMPARE(form->currentRow(), 0);
+        QCOMPARE(weather(2), QStringList({"Regen"}));
+        QTRY_COMPARE(list->currentRow(), 0);
+
+        // Copy from the list's menu: the copy is shown and selected.
+        std::unique_ptr<QMenu> menu(list->createContextMenu(1, nullptr));
+        menu->findChild<QAction*>(QStringLiteral("actionEntryAllCopy"))->trigger();
+        QTRY_COMPARE(model->rowCount(), 4);
+        QTRY_COMPARE(form->currentRow(), 3);
+        QTRY_COMPARE(list->currentRow(), 3);
+        QCOMPARE(model->data(3, "inspection_date", Qt::EditRole).toString(), dates[1].toString(Qt::ISODate));
+        doc->closeDocument();
     }
 
 private:
