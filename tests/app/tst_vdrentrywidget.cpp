@@ -8,6 +8,7 @@
 #include "editing/VDRCompleterTextEdit.h"
 #include "editing/VDREntryWidget.h"
 #include "editing/VDRRichTextEdit.h"
+#include "editing/VDRRichTextEditDialog.h"
 #include "editing/VDRTableView.h"
 #include "editing/VdEvent.h"
 #include "editing/VdEventsController.h"
@@ -30,6 +31,7 @@
 #include <QTabWidget>
 #include <QTemporaryDir>
 #include <QTimer>
+#include <QToolButton>
 #include <QtTest>
 
 #include <functional>
@@ -357,6 +359,49 @@ private slots:
         QVERIFY(q.exec(sql) && q.next());
         QCOMPARE(q.value(0).toString(), date.toString());
         QVERIFY(q.value(1).toInt() >= 100000);
+    }
+
+    void richTextToolbar_data()
+    {
+        QTest::addColumn<QString>("button");
+        QTest::addColumn<QString>("markup");
+        QTest::newRow("bold") << "btnBold"
+                              << "font-weight:600";
+        QTest::newRow("italic") << "btnItalic"
+                                << "font-style:italic";
+        QTest::newRow("underline") << "btnUnderline"
+                                   << "text-decoration: underline";
+        QTest::newRow("strike-out") << "btnStrikeOut"
+                                    << "text-decoration: line-through";
+        QTest::newRow("marker") << "btnMarker"
+                                << "background-color:#ffff00";
+        QTest::newRow("numbered list") << "btnListNum"
+                                       << "<ol";
+        QTest::newRow("indent") << "btnIncreaseIndent"
+                                << "-qt-block-indent:1";
+    }
+
+    // A formatting button applies to the selection, and the text keeps it through saving.
+    void richTextToolbar()
+    {
+        QFETCH(QString, button);
+        QFETCH(QString, markup);
+        openDiaryWithReports(1);
+        auto* tests = m_form->findChild<VDRRichTextEdit*>(QStringLiteral("entrydataTests"));
+        QCOMPARE(tests->fieldNumber(), 3);
+        tests->textEdit()->setFocus();
+        QTest::keyClicks(tests->textEdit(), QStringLiteral("Druckprobe"));
+        tests->textEdit()->selectAll();
+        tests->button(button)->click();
+        m_form->actionSubmit();
+        QSqlQuery q(m_window->document()->database());
+        QVERIFY(q.exec(QStringLiteral("SELECT tests FROM entry")) && q.next());
+        QVERIFY2(q.value(0).toString().contains(markup), qPrintable(q.value(0).toString()));
+        // The enlarged editor shows 13pt as 16pt and gives back 13pt.
+        const QString html = QStringLiteral("<span style=\" font-size:13pt;\">x</span>");
+        QVERIFY(VDRRichTextEditDialog::enlarged(html).contains(QStringLiteral("font-size:16pt;")));
+        QCOMPARE(VDRRichTextEditDialog::normal(VDRRichTextEditDialog::enlarged(html)), html);
+        QCOMPARE(VDRRichTextEditDialog::titleFor(3), QStringLiteral("Prüfungen / Messungen"));
     }
 
     void demoDiaryShowsItsReports()
