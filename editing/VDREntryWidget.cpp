@@ -1286,3 +1286,10 @@ void VDREntryWidget::actionEntryChangeUID()
     actionGoto(row, -1);
     sendSelectRow();
 }
+
+void VDREntryWidget::setSpellChecker(VDRSpellChecker* checker)
+{
+    m_checker = checker;
+    for (VDRRichTextEdit* r : m_rich)
+        r->textEdit()->setSpellChecker(checker);
+}
