@@ -988,6 +988,8 @@ void VDRMainWindow::setSpellChecker(VDRSpellChecker* checker)
 {
     m_spellChecker = checker;
     VDRItemDelegate::setSpellChecker(checker);
+    if (m_entryWidget)
+        m_entryWidget->setSpellChecker(checker);
     QAction* action = m_ui.action(QStringLiteral("actionStartSpellChecking"));
     action->setEnabled(checker && checker->isValid());
     action->setText(checker && checker->isActive() ? tr("Rechtschreibprüfung aus")

@@ -11,6 +11,17 @@ namespace {
 const QByteArray kRichText = QByteArrayLiteral("richtext");
 const QByteArray kHtml = QByteArrayLiteral("html");
 
+// The formatting of a text, read the same way on both sides, so that a change of formatting alone
+// (a word made bold) is written too, while merely showing a text is not a change.
+QString formattingOf(const QString& html)
+{
+    QTextDocument first;
+    first.setHtml(html);
+    QTextDocument second;
+    second.setHtml(first.toHtml());
+    return second.toHtml();
+}
+
 QString plainTextOf(const QString& html)
 {
     QTextDocument doc;
@@ -164,8 +175,11 @@ void VDRDataWidgetMapper::populateEmpty()
         if (!t)
             continue;
         const QByteArray prop = targetProperty(m);
-        const QVariant current = t->property(prop.constData());
-        t->setProperty(prop.constData(), QVariant(current.userType(), nullptr));
+        // The type comes from the declaration: reading a date field would correct its text and warn.
+        const int index = t->metaObject()->indexOfProperty(prop.constData());
+        const int type = index >= 0 ? t->metaObject()->property(index).userType()
+                                    : t->property(prop.constData()).userType();
+        t->setProperty(prop.constData(), QVariant(type, nullptr));
     }
 }
 
@@ -187,7 +201,8 @@ bool VDRDataWidgetMapper::commit(int column)
         const QVariant widgetValue = t->property(targetProperty(m).constData());
         bool differs;
         if (m.property == kRichText)
-            differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString());
+            differs = plainTextOf(widgetValue.toString()) != plainTextOf(modelValue.toString()) ||
+                      formattingOf(widgetValue.toString()) != formattingOf(modelValue.toString());
         else if (modelValue.isNull())
             // An untouched field showing the empty value of its type leaves a NULL alone.
             differs = widgetValue != QVariant(widgetValue.userType(), nullptr);

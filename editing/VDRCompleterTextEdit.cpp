@@ -44,8 +44,7 @@ VDRCompleterTextEdit::VDRCompleterTextEdit(QWidget* parent, VDRSpellChecker* che
     : QTextEdit(parent), m_button(new QToolButton(this))
 {
     setAcceptRichText(false);
-    if (checker)
-        new SpellHighlighter(document(), checker);
+    setSpellChecker(checker);
     m_button->setObjectName(QStringLiteral("completerButton"));
     m_button->setArrowType(Qt::DownArrow);
     m_button->setToolTip(tr("Autotexte"));
@@ -136,4 +135,12 @@ void VDRCompleterTextEdit::updateButton()
     const int side = 18;
     m_button->setGeometry(width() - side - frameWidth(), frameWidth(), side, side);
     setViewportMargins(0, 0, shown ? side : 0, 0);
+}
+
+void VDRCompleterTextEdit::setSpellChecker(VDRSpellChecker* checker)
+{
+    // A field built before the checker existed gets its underlining later.
+    if (!checker || document()->findChild<SpellHighlighter*>())
+        return;
+    new SpellHighlighter(document(), checker);
 }

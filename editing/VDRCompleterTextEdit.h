@@ -20,6 +20,8 @@ public:
     VDRCompleter* completer() const { return m_completer; }
     // Switches suggestions and the button off for this field only.
     void enableCompleter(bool enable);
+    // Underlines misspelt words from now on; a field has at most one checker.
+    void setSpellChecker(VDRSpellChecker* checker);
     // The current paragraph up to the cursor, trimmed: what the list is matched against.
     QString textUnderCursor() const;
     // Learns the whole text; the editor that owns the field calls this when it commits.

@@ -1018,7 +1018,13 @@ bool VDREntryWidget::externalNumberAccepted(const QString& number) const
         return true;
     ext->fetch_all();
     for (int row = 0; row < ext->rowCount(); ++row) {
-        if (m_document->externalEntryNumberString(row).compare(number, Qt::CaseInsensitive) != 0)
+        // "12" of the predecessor file is "012" here.
+        QString theirs = m_document->externalEntryNumberString(row);
+        QString ours = number;
+        const int width = qMax(theirs.size(), ours.size());
+        theirs = theirs.rightJustified(width, QLatin1Char('0'));
+        ours = ours.rightJustified(width, QLatin1Char('0'));
+        if (theirs.compare(ours, Qt::CaseInsensitive) != 0)
             continue;
         const QString file = ext->data(row, QStringLiteral("filepath"), Qt::EditRole).toString();
         return VDRPrompt::instance()->question(VDRPrompt::Warning, tr("Warnung"),
@@ -1279,4 +1285,11 @@ void VDREntryWidget::actionEntryChangeUID()
     m_document->setModified(true);
     actionGoto(row, -1);
     sendSelectRow();
+}
+
+void VDREntryWidget::setSpellChecker(VDRSpellChecker* checker)
+{
+    m_checker = checker;
+    for (VDRRichTextEdit* r : m_rich)
+        r->textEdit()->setSpellChecker(checker);
 }

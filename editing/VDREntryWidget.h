@@ -79,6 +79,7 @@ public slots:
     void updateGui();
     void updateGuiWorkforceCount();
     void setSyncButtonVisible(bool visible);
+    void setSpellChecker(VDRSpellChecker* checker);
 
 signals:
     void currentRowChanged(int row);

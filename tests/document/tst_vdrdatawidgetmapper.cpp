@@ -158,8 +158,9 @@ private slots:
         QTest::newRow("check box untouched") << "check" << QVariant() << QString();
         QTest::newRow("check box cleared") << "check" << QVariant(false) << "0";
         QTest::newRow("rich text untouched") << "rich" << QVariant() << QString();
-        QTest::newRow("rich text, markup only")
-            << "rich" << QVariant("<p><b>Rohbau fertig</b></p>") << QString();
+        // Formatting is the user's work too: made bold, the same text is written.
+        QTest::newRow("rich text, made bold")
+            << "rich" << QVariant("<p><b>Rohbau fertig</b></p>") << "Rohbau fertig";
         QTest::newRow("rich text changed")
             << "rich" << QVariant("<p>Rohbau abgenommen</p>") << "Rohbau abgenommen";
     }
