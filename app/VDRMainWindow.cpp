@@ -42,6 +42,7 @@
 #include <QMenu>
 #include <QMenuBar>
 #include <QMessageBox>
+#include <QMetaMethod>
 #include <QPainter>
 #include <QScreen>
 #include <QSettings>
@@ -289,16 +290,25 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
     connect(m_document, &VDRDocument::documentOpened, this, &VDRMainWindow::slotDocumentOpened);
     connect(m_document, &VDRDocument::documentClosed, this, &VDRMainWindow::slotDocumentClosed);
     connect(m_document, &VDRDocument::recentFileMissing, this, &VDRMainWindow::removeRecentFile);
-    m_entryWidget = new VDREntryWidget(m_central);
+    connectActions();
+    updateGui();
+    resize(kDefaultSize);
+}
+
+// The report form costs more than the rest of the window: it is built right after the first paint,
+// or by whatever needs it first.
+VDREntryWidget* VDRMainWindow::entryWidget()
+{
+    if (m_entryWidget)
+        return m_entryWidget;
+    m_entryWidget = new VDREntryWidget(m_central, m_spellChecker);
     // The form's many fields must not decide the window's smallest size on a small screen.
     m_entryWidget->setMinimumSize(320, 240);
     m_central->addWidget(m_entryWidget);
     connect(m_document, &VDRDocument::documentOpened, m_entryWidget, &VDREntryWidget::slotDocumentOpened);
     connect(m_document, &VDRDocument::documentClosed, m_entryWidget, &VDREntryWidget::slotDocumentClosed);
     connect(m_entryWidget, &VDREntryWidget::doOpenHelp, this, &VDRMainWindow::showHelp);
-    connectActions();
-    updateGui();
-    resize(kDefaultSize);
+    return m_entryWidget;
 }
 
 VDRMainWindow::~VDRMainWindow()
@@ -332,8 +342,17 @@ void VDRMainWindow::connectActions()
                 tr("%1 (noch nicht verfügbar)").arg(Ui_VDRMainWindowClass::plainText(action->text())));
         }
     }
-    // Automatic connection by name (on_action..._triggered) needs the actions as children: they are.
-    QMetaObject::connectSlotsByName(this);
+    // Each action's triggered() reaches on_<its name>_triggered() where this window has one; asked per
+    // action, since connectSlotsByName would match every child against every slot.
+    const QMetaMethod triggered = QMetaMethod::fromSignal(&QAction::triggered);
+    for (QAction* action : m_ui.allActions()) {
+        const QByteArray slot = "on_" + action->objectName().toLatin1() + "_triggered";
+        int index = metaObject()->indexOfSlot(QByteArray(slot + "()").constData());
+        if (index < 0)
+            index = metaObject()->indexOfSlot(QByteArray(slot + "(bool)").constData());
+        if (index >= 0)
+            connect(action, triggered, this, metaObject()->method(index));
+    }
     connect(m_ui.action(QStringLiteral("actionViewEntryList")), &QAction::triggered, this, [this](bool show) {
         m_dockEntryList->setVisible(show);
         QSettings().setValue(showEntryListSettingsKey(), show);
@@ -529,7 +548,8 @@ int VDRMainWindow::saveDocument(bool saveAs, bool withoutQuestion)
     if (!m_document->isStateValid())
         return 0;
     // What is typed into the report belongs to the diary being saved or asked about.
-    m_entryWidget->actionAskForSubmit();
+    if (m_entryWidget)
+        m_entryWidget->actionAskForSubmit();
     if (m_document->isDemoProject()) {
         // The demo is never saved: only offer what can work.
         if (withoutQuestion) {
@@ -620,7 +640,8 @@ bool VDRMainWindow::closeDocument(bool askToSave)
 {
     if (!m_document->isStateValid())
         return true;
-    m_entryWidget->actionAskForSubmit();
+    if (m_entryWidget)
+        m_entryWidget->actionAskForSubmit();
     if (askToSave && saveDocument(false, false) != 0)
         return false;
     if (!m_document->closeDocument()) {
@@ -637,7 +658,8 @@ void VDRMainWindow::endSession()
 {
     if (m_document->isStateValid()) {
         // Kept in the working copy, which the next opening resumes.
-        m_entryWidget->actionAskForSubmit();
+        if (m_entryWidget)
+            m_entryWidget->actionAskForSubmit();
         if (m_document->isStateModified())
             m_document->closeKeepingWorkingCopy();
         else
@@ -698,7 +720,7 @@ void VDRMainWindow::updateGui()
         action->setStatusTip(demo ? tip : QString());
     }
     updateReportPage();
-    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(m_entryWidget) : m_welcome);
+    m_central->setCurrentWidget(valid ? static_cast<QWidget*>(entryWidget()) : m_welcome);
     QString title = tr("Varduna");
     if (valid) {
         const QString name =
@@ -723,6 +745,9 @@ void VDRMainWindow::showWelcomePage()
 
 void VDRMainWindow::slotDocumentOpened(VDRDocument* document)
 {
+    // A form built now missed the signal that calls this.
+    if (!m_entryWidget)
+        entryWidget()->slotDocumentOpened(document);
     VDRAllEntryTableModel* model = document->modelEntryAll();
     m_entryList->slotDocumentOpened(document);
     // The list follows every report the form shows, however it got there.
@@ -914,6 +939,7 @@ bool VDRMainWindow::event(QEvent* event)
         // Queued, so that the first paint reaches the screen first.
         if (!m_dockEntryDate->isHidden())
             QTimer::singleShot(0, this, &VDRMainWindow::buildCalendar);
+        QTimer::singleShot(0, this, &VDRMainWindow::entryWidget);
     }
     return QMainWindow::event(event);
 }
@@ -1225,55 +1251,55 @@ void VDRMainWindow::on_actionDrucktexte_triggered()
 
 void VDRMainWindow::on_actionEntryNew_triggered()
 {
-    m_entryWidget->actionNew();
+    entryWidget()->actionNew();
 }
 
 void VDRMainWindow::on_actionEntryInsert_triggered()
 {
-    m_entryWidget->actionInsert();
+    entryWidget()->actionInsert();
 }
 
 void VDRMainWindow::on_actionEntryCopy_triggered()
 {
-    m_entryWidget->actionCopy();
+    entryWidget()->actionCopy();
 }
 
 void VDRMainWindow::on_actionEntryDelete_triggered()
 {
-    m_entryWidget->actionDelete();
+    entryWidget()->actionDelete();
 }
 
 void VDRMainWindow::on_actionEntryGotoFirst_triggered()
 {
-    m_entryWidget->actionToFirst();
+    entryWidget()->actionToFirst();
 }
 
 void VDRMainWindow::on_actionEntryGotoPrevious_triggered()
 {
-    m_entryWidget->actionToPrevious();
+    entryWidget()->actionToPrevious();
 }
 
 void VDRMainWindow::on_actionEntryGotoNext_triggered()
 {
-    m_entryWidget->actionToNext();
+    entryWidget()->actionToNext();
 }
 
 void VDRMainWindow::on_actionEntryGotoLast_triggered()
 {
-    m_entryWidget->actionToLast();
+    entryWidget()->actionToLast();
 }
 
 void VDRMainWindow::on_actionEntryAlterNumber_triggered()
 {
-    m_entryWidget->actionAlterNumber();
+    entryWidget()->actionAlterNumber();
 }
 
 void VDRMainWindow::on_actionEntryChangeUID_triggered()
 {
-    m_entryWidget->actionEntryChangeUID();
+    entryWidget()->actionEntryChangeUID();
 }
 
 void VDRMainWindow::on_actionSettingsChangeUID_triggered()
 {
-    m_entryWidget->actionSettingsChangeUID();
+    entryWidget()->actionSettingsChangeUID();
 }

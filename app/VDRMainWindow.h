@@ -30,7 +30,7 @@ public:
     ~VDRMainWindow() override;
 
     VDRDocument* document() const { return m_document; }
-    VDREntryWidget* entryWidget() const { return m_entryWidget; }
+    VDREntryWidget* entryWidget();
     // The start-up's spell checker; text fields ask it. May be null.
     void setSpellChecker(VDRSpellChecker* checker);
     VDRSpellChecker* spellChecker() const { return m_spellChecker; }
