@@ -1155,6 +1155,7 @@ int VDRMainWindow::importExchangeFile(const QString& path)
 
 void VDRMainWindow::updateGui4ManualReportExchangeFileImport()
 {
+    m_entryList->slotShowUserIds(); // imported reports may bring the first author code
     updateGui();
 }
 
@@ -1174,6 +1175,22 @@ void VDRMainWindow::on_actionExportMasterData_triggered()
                       "die Datei %1 schreibgeschützt ist.")
                        .arg(QDir::toNativeSeparators(file)));
         return;
+    }
+    if (m_document->isStructureExtended()) {
+        if (VDRPrompt::instance()->question(
+                VDRPrompt::Warning, title,
+                tr("Das Dokument wurde mit einer früheren Programmversion erstellt.\nUm den Stammdaten "
+                   "Export "
+                   "durchführen zu können, muss es jetzt im aktuellen Dateiformat gespeichert werden.\nSie "
+                   "können das Dokument dann nicht mehr mit füheren Programmversionen bearbeiten.\n\nVorgang "
+                   "fortsetzen?"),
+                VDRPrompt::Ok | VDRPrompt::Cancel, VDRPrompt::Ok, VDRPrompt::Cancel) != VDRPrompt::Ok)
+            return;
+        m_document->acceptCurrentFormat();
+        const int saved = m_document->saveDocument();
+        updateGui();
+        if (saved != 0)
+            return;
     }
     bool exported = false;
     QString exportedTo;

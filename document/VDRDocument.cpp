@@ -295,6 +295,7 @@ void VDRDocument::clearState()
     m_modified = false;
     m_saved = false;
     m_structureExtended = false;
+    m_currentFormatAccepted = false;
     m_demo = false;
     m_filePath.clear();
     m_workingCopyPath.clear();

@@ -44,6 +44,8 @@ public:
     bool isStateModified() const { return m_modified || globalModified(); }
     bool isStateSaved() const { return m_saved; }
     bool isStructureExtended() const { return m_structureExtended; }
+    // The user has already agreed to store an older diary in the current format: saving asks no more.
+    void acceptCurrentFormat() { m_currentFormatAccepted = true; }
     bool isDemoProject() const { return m_demo; }
     QString getFilepath() const { return m_filePath; }
     QString getFilepathWorkingCopy() const { return m_workingCopyPath; }
@@ -406,6 +408,7 @@ private:
     bool m_modified = false;
     bool m_saved = false;
     bool m_structureExtended = false;
+    bool m_currentFormatAccepted = false;
     bool m_demo = false;
     bool m_inspecting = false;
     QString m_filePath;

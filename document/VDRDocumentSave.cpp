@@ -423,7 +423,7 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
         return 1;
     }
     // 4
-    if (m_structureExtended) {
+    if (m_structureExtended && !m_currentFormatAccepted) {
         const VDRPrompt::StandardButton answer = VDRPrompt::instance()->question(
             VDRPrompt::Warning, tr("Datei-Warnung"),
             tr("Das Dokument wurde mit einer früheren Programmversion erstellt.\nWenn Sie das Dokument jetzt "

@@ -5,6 +5,7 @@
 #include "app/VDRMainWindow.h"
 #include "app/VDRStartup.h"
 #include "document/VDRAllEntryTableModel.h"
+#include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRCompleter.h"
 
@@ -522,6 +523,24 @@ private slots:
         QCOMPARE(
             queryValue(path, QStringLiteral("SELECT value FROM meta WHERE key = 'exportedTo'")).toString(),
             next);
+    }
+
+    void followUpOfAnOlderDiarySavesItInTheCurrentFormatFirst()
+    {
+        const QString path = m_dir.filePath(QStringLiteral("Altbau.vd2"));
+        QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
+        m_prompt.expect(QStringLiteral("Datei-Warnung"));
+        QCOMPARE(m_window->openDocument(path, false, true), 0);
+        const QString next = m_dir.filePath(QStringLiteral("Altbau 2.vd2"));
+        QFile::remove(next);
+        m_prompt.expect(QStringLiteral("Stammdaten Export"),
+                        QStringLiteral("im aktuellen Dateiformat gespeichert"), VDRPrompt::Ok);
+        m_prompt.expectFileName(next);
+        m_window->ui().action(QStringLiteral("actionExportMasterData"))->trigger();
+        QCOMPARE(
+            queryValue(path, QStringLiteral("SELECT value FROM meta WHERE key = 'fileversion'")).toString(),
+            VDRDatabaseSchema::currentVersion());
+        QVERIFY(QFileInfo::exists(next));
     }
 
     void sessionEndKeepsUnsavedWorkForNextOpening_data()
