@@ -45,7 +45,7 @@ struct Column
     int width;
 };
 
-struct ViewSpec
+struct ViewLayout
 {
     const char* objectName;
     VDRSqlTableModel::TABLE_NAMES table;
@@ -55,9 +55,9 @@ struct ViewSpec
 };
 
 // In the order the models are submitted.
-const QVector<ViewSpec>& viewSpecs()
+const QVector<ViewLayout>& viewLayouts()
 {
-    static const QVector<ViewSpec> specs = {
+    static const QVector<ViewLayout> layouts = {
         {"entrydataAttendees",
          TN::TN_ATTENDEE,
          QT_TRANSLATE_NOOP("VDREntryWidget", "Anwesende \"Am Bau Beteiligte\""),
@@ -171,7 +171,7 @@ const QVector<ViewSpec>& viewSpecs()
           {"comment", CW::CWT_PERCENT, 17}},
          &VDRDocument::appendEntryEquipment},
     };
-    return specs;
+    return layouts;
 }
 
 struct RichSpec
@@ -249,18 +249,18 @@ void VDREntryWidget::buildLayout()
     m_tabs->setObjectName(QStringLiteral("tabWidget"));
     outer->addWidget(m_tabs, 1);
 
-    const auto& specs = viewSpecs();
-    for (const ViewSpec& spec : specs) {
+    const auto& layouts = viewLayouts();
+    for (const ViewLayout& setup : layouts) {
         auto* v = new VDRTableView(this);
-        v->setObjectName(QLatin1String(spec.objectName));
-        v->setToolTip(tr(spec.toolTip));
+        v->setObjectName(QLatin1String(setup.objectName));
+        v->setToolTip(tr(setup.toolTip));
         v->setButtonAddVisible(true);
         v->setButtonDeleteVisible(true);
         v->setButtonBigviewVisible(true);
         v->setSortingEnabled(false);
         m_views.append(v);
         m_models.append(nullptr);
-        const auto append = spec.append;
+        const auto append = setup.append;
         connect(v, &VDRTableView::signalButtonAddClicked, this, [this, append] {
             if (m_document && m_entryId > 0 && !isLocked())
                 (m_document->*append)(m_entryId);
@@ -654,11 +654,11 @@ void VDREntryWidget::actionGoto(int row, int tab)
     const int id = all->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
     // Pin the new report before the old pin goes, so that its models are never the ones dropped.
     auto pin = std::make_unique<VDRDocument::EntryModelsPin>(m_document, id);
-    const auto& specs = viewSpecs();
+    const auto& layouts = viewLayouts();
     for (int i = 0; i < m_views.size(); ++i) {
         VDRTableView* v = m_views[i];
         v->setSaveMetricsFlag(false);
-        VDRSqlTableModel* model = m_document->modelEntry(id, specs[i].table);
+        VDRSqlTableModel* model = m_document->modelEntry(id, layouts[i].table);
         if (v->model() != model) {
             v->setModel(model);
             if (i == kDeficiencyView)
@@ -688,11 +688,11 @@ void VDREntryWidget::actionGoto(int row, int tab)
 
 void VDREntryWidget::setupViews()
 {
-    const auto& specs = viewSpecs();
+    const auto& layouts = viewLayouts();
     for (int i = 0; i < m_views.size(); ++i) {
         VDRTableView* v = m_views[i];
         v->setAllColumnsHidden();
-        for (const Column& c : specs[i].columns) {
+        for (const Column& c : layouts[i].columns) {
             v->setColumnHidden(QLatin1String(c.name), false);
             v->setColumnWidth(QLatin1String(c.name), c.type, c.width);
         }
