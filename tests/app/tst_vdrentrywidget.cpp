@@ -50,6 +50,10 @@ private slots:
         QVERIFY(m_dir.isValid());
         isolateSettings(m_dir.filePath(QStringLiteral("settings")));
         qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
+        // A screenshot shows the window as a German user sees it: the calendar and the clock take
+        // their names from the locale the window is built with.
+        if (!qgetenv("VARDUNA_SCREENSHOT").isEmpty())
+            QLocale::setDefault(QLocale(QLocale::German, QLocale::Germany));
     }
 
     void init()
@@ -429,7 +433,6 @@ private slots:
         const QByteArray screenshot = qgetenv("VARDUNA_SCREENSHOT");
         if (!screenshot.isEmpty()) {
             // A draft, with the list and calendar beside it and nothing else.
-            QLocale::setDefault(QLocale(QLocale::German, QLocale::Germany));
             m_form->actionToLast();
             for (QDockWidget* dock : m_window->findChildren<QDockWidget*>())
                 dock->setVisible(dock->objectName().startsWith(QLatin1String("dockWidgetEntry")));
