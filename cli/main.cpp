@@ -18,7 +18,9 @@
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
+#include <QLocale>
 #include <QRegularExpression>
+#include <QSettings>
 #include <QTextStream>
 
 #include <algorithm>
@@ -552,6 +554,12 @@ int cmdPdf(const QString& file, const QString& choice, const QString& target)
         name.replace(QRegularExpression(QStringLiteral("[/\\\\:*?\"<>|]")), QStringLiteral("_"));
         out4 = QFileInfo(file).absoluteDir().filePath(name);
     }
+    // Dates in the language the application would print them in; the setting is only read.
+    QLocale::Language systemLanguage = QLocale::system().language();
+    if (systemLanguage != QLocale::English && systemLanguage != QLocale::Spanish)
+        systemLanguage = QLocale::German;
+    QLocale::setDefault(QLocale(
+        QLocale::Language(QSettings().value(QStringLiteral("language"), int(systemLanguage)).toInt())));
     CVdConfig::self()->reload();
     CVdPrintoutReport printout(nullptr, ids);
     const bool written = printout.print(CVdPrintout::Pdf, out4, false, QString());

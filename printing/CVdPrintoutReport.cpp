@@ -5,6 +5,7 @@
 #include "printing/CVdTexts.h"
 
 #include <QFontMetrics>
+#include <QLocale>
 #include <QPainter>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -37,6 +38,16 @@ QString reformat_time(const QString& stored)
     if (!t.isValid() || (t.hour() == 0 && t.minute() == 0))
         return QString();
     return t.toString(QStringLiteral("hh:mm"));
+}
+
+// Equipment durations are stored in minutes.
+QString hours(const QVariant& minutes)
+{
+    const int m = minutes.toInt();
+    return QStringLiteral("%1%2:%3")
+        .arg(m < 0 ? QStringLiteral("-") : QString())
+        .arg(qAbs(m) / 60)
+        .arg(qAbs(m) % 60, 2, 10, QLatin1Char('0'));
 }
 
 QString plain(const QString& stored)
@@ -214,16 +225,16 @@ QList<CVdPrintoutReport::Section> CVdPrintoutReport::read_sections(int id) const
                  company_rows(QStringLiteral("entry_attendee"), QString(),
                               [](const QSqlQuery& q) { return val(q, "comment"); }),
                  false};
-    s << Section{caption(7),
-                 company_rows(QStringLiteral("entry_workforce"), QString(),
-                              [](const QSqlQuery& q) {
-                                  QStringList parts{text(8).arg(q.value("person_count").toInt())};
-                                  if (!q.value("man_hours").isNull())
-                                      parts << text(50).arg(q.value("man_hours").toDouble());
-                                  return joinNonEmpty(parts + QStringList{val(q, "comment")},
-                                                      QStringLiteral(", "));
-                              }),
-                 true};
+    s << Section{
+        caption(7),
+        company_rows(QStringLiteral("entry_workforce"), QString(),
+                     [](const QSqlQuery& q) {
+                         QStringList parts{text(8).arg(q.value("person_count").toInt())};
+                         if (!q.value("man_hours").isNull())
+                             parts << text(50).arg(QLocale().toString(q.value("man_hours").toDouble()));
+                         return joinNonEmpty(parts + QStringList{val(q, "comment")}, QStringLiteral(", "));
+                     }),
+        true};
     s << Section{caption(9, 1), richText("progress"), false};
     s << Section{caption(24), richText("special_incidents"), false};
     s << Section{caption(13), company_rows(QStringLiteral("entry_progress"), ofType.arg(3), described), true};
@@ -275,7 +286,7 @@ QList<CVdPrintoutReport::Section> CVdPrintoutReport::read_sections(int id) const
                      [](const QSqlQuery& q) {
                          const QString amount = q.value("quantity").isNull()
                                                     ? QString()
-                                                    : QString::number(q.value("quantity").toDouble()) +
+                                                    : QLocale().toString(q.value("quantity").toDouble()) +
                                                           QLatin1Char(' ') + val(q, "unit");
                          return joinNonEmpty({val(q, "material"), amount.trimmed(), val(q, "process")},
                                              QStringLiteral(", "));
@@ -299,10 +310,10 @@ QList<CVdPrintoutReport::Section> CVdPrintoutReport::read_sections(int id) const
                               [](const QSqlQuery& q) {
                                   QStringList parts{val(q, "equipment"), val(q, "operating_zone")};
                                   if (!q.value("operating_time").isNull())
-                                      parts << text(63) + q.value("operating_time").toString() +
+                                      parts << text(63) + hours(q.value("operating_time")) +
                                                    QLatin1Char(' ') + tr("Stunden");
                                   if (!q.value("downtime").isNull() && q.value("downtime").toInt() != 0)
-                                      parts << text(62) + q.value("downtime").toString() + QLatin1Char(' ') +
+                                      parts << text(62) + hours(q.value("downtime")) + QLatin1Char(' ') +
                                                    tr("Stunden");
                                   return joinNonEmpty(parts, QStringLiteral(", "));
                               }),
