@@ -239,6 +239,24 @@ private slots:
         QVERIFY(moved);
     }
 
+    // An existing read-only PDF is refused with a message and stays as it was; nothing is left beside it.
+    void readOnlyTarget()
+    {
+        const QString folder = m_dir.filePath(QStringLiteral("schreibgeschützt"));
+        QVERIFY(QDir().mkpath(folder));
+        const QString pdf = folder + QStringLiteral("/alt.pdf");
+        QVERIFY(writeFile(pdf, "alt"));
+        QVERIFY(QFile::setPermissions(pdf, QFile::ReadOwner | QFile::ReadGroup));
+        m_prompt.expect(QStringLiteral("Dateifehler"), QStringLiteral("kann nicht überschrieben werden"));
+        CVdPrintoutReport printout(nullptr, {1});
+        QVERIFY(!printout.print(CVdPrintout::Pdf, pdf, false, QString()));
+        QCOMPARE(m_prompt.messages.size(), 1);
+        QFile file(pdf);
+        QVERIFY(file.open(QIODevice::ReadOnly));
+        QCOMPARE(file.readAll(), QByteArray("alt"));
+        QCOMPARE(QDir(folder).entryList(QDir::NoDotAndDotDot | QDir::AllEntries), QStringList{"alt.pdf"});
+    }
+
 private:
     QString printed(const QList<int>& ids)
     {
