@@ -5,6 +5,8 @@
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
+#include "printing/CVdConfig.h"
+#include "printing/CVdPrintoutReport.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
@@ -12,13 +14,18 @@
 #include <QDate>
 #include <QDir>
 #include <QFileInfo>
+#include <QGuiApplication>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
+#include <QLocale>
+#include <QRegularExpression>
+#include <QSettings>
 #include <QTextStream>
 
 #include <algorithm>
 #include <cstdio>
+#include <memory>
 #include <numeric>
 
 namespace {
@@ -76,6 +83,14 @@ const char* const kHelp =
     "  export-masterdata FILE OUT.mdd\n"
     "                      Write the master-data file for the mobile app (project data, companies,\n"
     "                      locked reports). FILE is only read.\n"
+    "  pdf FILE [--reports all|locked|drafts|NUMBER|FROM-TO] [-o OUT.pdf]\n"
+    "                      Print the chosen reports (default: all, in number order) into one PDF,\n"
+    "                      each report with its own page numbers. NUMBER and FROM-TO select by\n"
+    "                      report number (12 takes 12a and 12b too). Without -o the PDF goes\n"
+    "                      into the diary's folder as \"PROJECT - Bericht NUMBER.pdf\" for one\n"
+    "                      report, \"PROJECT - Berichte.pdf\" for several; an existing file there\n"
+    "                      is replaced. Prints the path written. Opens FILE as info does and\n"
+    "                      saves nothing.\n"
     "  follow-up FILE NEW.vd2\n"
     "                      Start a follow-up diary NEW.vd2 with FILE's project data, companies and\n"
     "                      address lists, knowing FILE's report numbers, with one first report;\n"
@@ -110,6 +125,12 @@ const char* const kHelp =
     "  1  usage error\n"
     "  2  refused or failed (the message on stderr says why)\n"
     "  3  cancelled: a question was answered with its cancelling choice (try --yes)\n"
+    "\n"
+    "Exit codes of pdf:\n"
+    "  0  written\n"
+    "  1  usage error\n"
+    "  2  refused or failed: the diary cannot be opened (held by a running instance),\n"
+    "     the PDF cannot be written, or no report matches --reports\n"
     "\n"
     "Exit codes of restore:\n"
     "  0  restored\n"
@@ -455,6 +476,101 @@ int cmdFollowUp(const QString& file, const QString& target)
     return ExitOk;
 }
 
+// The reports of a --reports choice in number order; false for a choice that is not understood.
+bool chooseReports(VDRDocument& doc, const QString& choice, QList<int>& ids, QStringList& numbers)
+{
+    int from = 0, to = 0;
+    enum
+    {
+        All,
+        Locked,
+        Drafts,
+        Range
+    } mode = All;
+    if (choice == QLatin1String("locked")) {
+        mode = Locked;
+    } else if (choice == QLatin1String("drafts")) {
+        mode = Drafts;
+    } else if (choice != QLatin1String("all")) {
+        const QRegularExpression range(QStringLiteral("^(\\d+)(?:-(\\d+))?$"));
+        const auto m = range.match(choice);
+        if (!m.hasMatch())
+            return false;
+        mode = Range;
+        from = m.captured(1).toInt();
+        to = m.captured(2).isEmpty() ? from : m.captured(2).toInt();
+    }
+    VDRAllEntryTableModel* entries = doc.modelEntryAll();
+    entries->fetch_all();
+    QVector<int> rows(entries->rowCount());
+    std::iota(rows.begin(), rows.end(), 0);
+    std::stable_sort(rows.begin(), rows.end(), [&](int a, int b) {
+        const int na = doc.entryNumberInt(a), nb = doc.entryNumberInt(b);
+        return na != nb ? na < nb : doc.entryNumberLetter(a) < doc.entryNumberLetter(b);
+    });
+    for (int row : rows) {
+        const bool locked = entries->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0;
+        const int number = doc.entryNumberInt(row);
+        if ((mode == Locked && !locked) || (mode == Drafts && locked) ||
+            (mode == Range && (number < from || number > to)))
+            continue;
+        ids << entries->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
+        numbers << doc.entryNumberWithUserId(row);
+    }
+    return true;
+}
+
+int cmdPdf(const QString& file, const QString& choice, const QString& target)
+{
+    VDRDocument doc;
+    // Printing reads only: a crashed session's working copy stays for its owner, nothing is saved.
+    doc.setInspecting(true);
+    bool showError = true;
+    if (!doc.openDocument(file, showError)) {
+        if (showError)
+            VDRPrompt::critical(
+                QObject::tr("Fehler"),
+                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+        return ExitRefused;
+    }
+    QList<int> ids;
+    QStringList numbers;
+    if (!chooseReports(doc, choice, ids, numbers)) {
+        doc.closeDocument();
+        err(QStringLiteral("varduna-cli: --reports takes all, locked, drafts, NUMBER or FROM-TO"));
+        return ExitUsage;
+    }
+    if (ids.isEmpty()) {
+        doc.closeDocument();
+        VDRPrompt::warning(QObject::tr("Drucken"), QObject::tr("Keine Bautagesberichte ausgewählt."));
+        return ExitRefused;
+    }
+    QString out4 = target;
+    if (out4.isEmpty()) {
+        // File names cannot hold a slash; a project or report number may.
+        QString name = ids.size() == 1
+                           ? QObject::tr("%1 - Bericht %2.pdf").arg(doc.projectName(), numbers.first())
+                           : QObject::tr("%1 - Berichte.pdf").arg(doc.projectName());
+        name.replace(QRegularExpression(QStringLiteral("[/\\\\:*?\"<>|]")), QStringLiteral("_"));
+        out4 = QFileInfo(file).absoluteDir().filePath(name);
+    }
+    // Dates in the language the application would print them in; the setting is only read.
+    QLocale::Language systemLanguage = QLocale::system().language();
+    if (systemLanguage != QLocale::English && systemLanguage != QLocale::Spanish)
+        systemLanguage = QLocale::German;
+    QLocale::setDefault(QLocale(
+        QLocale::Language(QSettings().value(QStringLiteral("language"), int(systemLanguage)).toInt())));
+    CVdConfig::self()->reload();
+    CVdPrintoutReport printout(nullptr, ids);
+    const bool written = printout.print(CVdPrintout::Pdf, out4, false, QString());
+    doc.closeDocument();
+    if (!written)
+        return ExitRefused;
+    out() << printout.pdfFile() << "\n";
+    out().flush();
+    return ExitOk;
+}
+
 // The user hears from the program through the prompt; Qt's own log lines are for developers.
 void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QString& message)
 {
@@ -466,8 +582,13 @@ void quietMessageHandler(QtMsgType type, const QMessageLogContext&, const QStrin
 
 int main(int argc, char* argv[])
 {
-    QCoreApplication app(argc, argv);
     qInstallMessageHandler(quietMessageHandler);
+    // Printing needs fonts and a paint engine; a command-line tool never shows a window.
+    const bool printing = argc > 1 && qstrcmp(argv[1], "pdf") == 0;
+    if (printing && !qEnvironmentVariableIsSet("QT_QPA_PLATFORM"))
+        qputenv("QT_QPA_PLATFORM", "offscreen");
+    std::unique_ptr<QCoreApplication> app(printing ? new QGuiApplication(argc, argv)
+                                                   : new QCoreApplication(argc, argv));
     QCoreApplication::setOrganizationName(QStringLiteral("Korvant - Software"));
     QCoreApplication::setOrganizationDomain(QStringLiteral("korvant-software.de"));
     QCoreApplication::setApplicationName(QStringLiteral("Varduna"));
@@ -476,6 +597,25 @@ int main(int argc, char* argv[])
     const bool yes = args.removeAll(QStringLiteral("--yes")) > 0;
     const bool json = args.removeAll(QStringLiteral("--json")) > 0;
     const bool deleteImported = args.removeAll(QStringLiteral("--delete")) > 0;
+    // Options with a value, for pdf.
+    const auto takeValue = [&args](const QString& option, QString& value) {
+        const int at = args.indexOf(option);
+        if (at < 0)
+            return true;
+        if (at + 1 >= args.size())
+            return false;
+        value = args.at(at + 1);
+        args.erase(args.begin() + at, args.begin() + at + 2);
+        return args.indexOf(option) < 0;
+    };
+    QString reports = QStringLiteral("all");
+    QString pdfOut;
+    const bool pdfCommand = args.value(0) == QLatin1String("pdf");
+    if (pdfCommand &&
+        (!takeValue(QStringLiteral("--reports"), reports) || !takeValue(QStringLiteral("-o"), pdfOut))) {
+        err(QStringLiteral("varduna-cli: --reports and -o take one value each; see varduna-cli --help"));
+        return ExitUsage;
+    }
     if (args.contains(QStringLiteral("-h")) || args.contains(QStringLiteral("--help"))) {
         std::fputs(kHelp, stdout);
         return ExitOk;
@@ -513,6 +653,8 @@ int main(int argc, char* argv[])
         result = cmdRestore(file);
     else if (command == QLatin1String("compact"))
         result = cmdCompact(file);
+    else if (command == QLatin1String("pdf"))
+        result = cmdPdf(file, reports, pdfOut);
     else if (command == QLatin1String("companies"))
         result = cliListCompanies(file, json, out());
     else if (command == QLatin1String("export-masterdata") && twoFiles)

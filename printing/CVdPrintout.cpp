@@ -199,7 +199,11 @@ bool CVdPrintout::setOutput4PDF(const QString& fileName, bool askForFileName, in
     const auto claim = [&](const QString& target) {
         const QFileInfo info(target);
         QString temporary;
-        if (!info.exists() || info.isWritable())
+        // A file marked read-only is refused even where the user could replace it (root, own folder).
+        const bool readOnly =
+            info.exists() && !(info.permissions() &
+                               (QFileDevice::WriteOwner | QFileDevice::WriteGroup | QFileDevice::WriteOther));
+        if (!info.exists() || (info.isWritable() && !readOnly))
             temporary = VDRFileOps::emptyTemporaryBeside(target);
         if (temporary.isEmpty())
             VDRPrompt::critical(fileErrorTitle(), fileErrorText(target));

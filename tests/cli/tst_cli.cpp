@@ -51,6 +51,8 @@ private slots:
     void restore_data();
     void restore();
     void compactReportsSizes();
+    void pdfOfDemoReports_data();
+    void pdfOfDemoReports();
 
 private:
     Run cli(const QStringList& args);
@@ -312,6 +314,11 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
              qPrintable(info.err));
     QVERIFY(!info.err.contains(QLatin1String("Fehler:"))); // no second, general message
 
+    const Run pdf = cli({QStringLiteral("pdf"), path, QStringLiteral("-o"), m_dir.filePath("held.pdf")});
+    QCOMPARE(pdf.exitCode, 2);
+    QVERIFY2(pdf.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: ")), qPrintable(pdf.err + pdf.out));
+    QVERIFY(!QFile::exists(m_dir.filePath("held.pdf")));
+
     const Run check = cli({QStringLiteral("check"), path});
     QCOMPARE(check.exitCode, 4);
     QVERIFY(check.out.contains(QStringLiteral("Working copy: held\n")));
@@ -434,3 +441,63 @@ void TestCli::compactReportsSizes()
 
 QTEST_GUILESS_MAIN(TestCli)
 #include "tst_cli.moc"
+
+// Report numbers of the demo diary as info prints them, with their locked state.
+void TestCli::pdfOfDemoReports_data()
+{
+    QTest::addColumn<QString>("reports");
+    QTest::addColumn<int>("exitCode");
+    QTest::newRow("all by default") << QString() << 0;
+    QTest::newRow("locked") << QStringLiteral("locked") << 0;
+    QTest::newRow("drafts") << QStringLiteral("drafts") << 0;
+    QTest::newRow("range") << QStringLiteral("2-3") << 0;
+    QTest::newRow("no such report") << QStringLiteral("999") << 2;
+    QTest::newRow("not a choice") << QStringLiteral("some") << 1;
+}
+
+void TestCli::pdfOfDemoReports()
+{
+    QFETCH(QString, reports);
+    QFETCH(int, exitCode);
+    const QString path = m_dir.filePath(QStringLiteral("Demo.vd2"));
+    if (!QFile::exists(path)) {
+        QVERIFY(QFile::copy(
+            QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2"), path));
+        QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner);
+    }
+    const QByteArray before = fileHash(path);
+    const QString pdf = m_dir.filePath(QStringLiteral("Demo Berichte.pdf"));
+    QFile::remove(pdf);
+    QStringList args{QStringLiteral("pdf"), path, QStringLiteral("-o"), pdf};
+    if (!reports.isEmpty())
+        args << QStringLiteral("--reports") << reports;
+    const Run r = cli(args);
+    QCOMPARE(r.exitCode, exitCode);
+    QCOMPARE(fileHash(path), before);
+    QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
+    if (exitCode != 0) {
+        QVERIFY(!QFile::exists(pdf));
+        return;
+    }
+    QCOMPARE(r.out.trimmed(), pdf);
+
+    QProcess text;
+    text.start(QStringLiteral("pdftotext"), {QStringLiteral("-layout"), pdf, QStringLiteral("-")});
+    QVERIFY(text.waitForFinished(60000));
+    const QString printed = QString::fromUtf8(text.readAllStandardOutput());
+    const QStringList lines =
+        cli({QStringLiteral("info"), path}).out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+    int expected = 0;
+    for (const QString& line : lines.mid(3)) {
+        const QStringList cols = line.split(QLatin1Char('\t'));
+        const int number = cols.value(0).left(3).toInt();
+        const bool locked = cols.value(2) == QLatin1String("gesperrt");
+        const bool chosen = reports.isEmpty() || (reports == QLatin1String("locked") && locked) ||
+                            (reports == QLatin1String("drafts") && !locked) ||
+                            (reports == QLatin1String("2-3") && number >= 2 && number <= 3);
+        expected += chosen;
+        QVERIFY2(printed.contains(QStringLiteral("Baubericht-Nr.: ") + cols.value(0)) == chosen,
+                 qPrintable(line));
+    }
+    QVERIFY(expected > 0);
+}
