@@ -2,26 +2,14 @@
 
 #include "document/CVdShared.h"
 #include "document/VDRDocument.h"
-#include "document/VDRPrompt.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QTextStream>
 
-int cliListCompanies(const QString& file, bool json, QTextStream& out)
+int cliListCompanies(VDRDocument& doc, bool json, QTextStream& out)
 {
-    VDRDocument doc;
-    // Looking must not change anything: a crashed session's working copy stays for its owner.
-    doc.setInspecting(true);
-    bool showError = true;
-    if (!doc.openDocument(file, showError)) {
-        if (showError)
-            VDRPrompt::critical(
-                QObject::tr("Fehler"),
-                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
-        return 2;
-    }
     const QString separator = QStringLiteral(" ");
     const struct
     {
@@ -68,6 +56,5 @@ int cliListCompanies(const QString& file, bool json, QTextStream& out)
     if (json)
         out << QJsonDocument(result).toJson(QJsonDocument::Indented);
     out.flush();
-    doc.closeDocument();
     return 0;
 }

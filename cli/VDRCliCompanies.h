@@ -3,7 +3,8 @@
 #include <QString>
 
 class QTextStream;
+class VDRDocument;
 
-// 'varduna-cli companies': the two company lists of a diary in their order, each company in both
-// output formats. Returns the exit code (0 done, 2 refused).
-int cliListCompanies(const QString& file, bool json, QTextStream& out);
+// 'varduna-cli companies': the two company lists of an open diary in their order, each company in
+// both output formats. Returns the exit code (0 done).
+int cliListCompanies(VDRDocument& doc, bool json, QTextStream& out);

@@ -193,19 +193,36 @@ int cmdNew(const QString& file)
     return ExitOk;
 }
 
+bool openForCommand(VDRDocument& doc, const QString& file)
+{
+    bool showError = true;
+    if (doc.openDocument(file, showError))
+        return true;
+    if (showError)
+        VDRPrompt::critical(QObject::tr("Fehler"),
+                            QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+    return false;
+}
+
+int cmdCompanies(const QString& file, bool json)
+{
+    VDRDocument doc;
+    // Looking must not change anything: a crashed session's working copy stays for its owner.
+    doc.setInspecting(true);
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    const int result = cliListCompanies(doc, json, out());
+    doc.closeDocument();
+    return result;
+}
+
 int cmdInfo(const QString& file, bool json)
 {
     VDRDocument doc;
     // Looking must not change anything: a crashed session's working copy stays for its owner.
     doc.setInspecting(true);
-    bool showError = true;
-    if (!doc.openDocument(file, showError)) {
-        if (showError)
-            VDRPrompt::critical(
-                QObject::tr("Fehler"),
-                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+    if (!openForCommand(doc, file))
         return ExitRefused;
-    }
     VDRAllEntryTableModel* entries = doc.modelEntryAll();
     entries->fetch_all();
     QVector<int> rows(entries->rowCount());
@@ -251,17 +268,6 @@ int cmdInfo(const QString& file, bool json)
     out().flush();
     doc.closeDocument();
     return ExitOk;
-}
-
-bool openForCommand(VDRDocument& doc, const QString& file)
-{
-    bool showError = true;
-    if (doc.openDocument(file, showError))
-        return true;
-    if (showError)
-        VDRPrompt::critical(QObject::tr("Fehler"),
-                            QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
-    return false;
 }
 
 int cmdSave(const QString& file)
@@ -525,14 +531,8 @@ int cmdPdf(const QString& file, const QString& choice, const QString& target)
     VDRDocument doc;
     // Printing reads only: a crashed session's working copy stays for its owner, nothing is saved.
     doc.setInspecting(true);
-    bool showError = true;
-    if (!doc.openDocument(file, showError)) {
-        if (showError)
-            VDRPrompt::critical(
-                QObject::tr("Fehler"),
-                QObject::tr("Beim Öffnen des gewählten Dokuments ist ein Fehler aufgetreten!"));
+    if (!openForCommand(doc, file))
         return ExitRefused;
-    }
     QList<int> ids;
     QStringList numbers;
     if (!chooseReports(doc, choice, ids, numbers)) {
@@ -656,7 +656,7 @@ int main(int argc, char* argv[])
     else if (command == QLatin1String("pdf"))
         result = cmdPdf(file, reports, pdfOut);
     else if (command == QLatin1String("companies"))
-        result = cliListCompanies(file, json, out());
+        result = cmdCompanies(file, json);
     else if (command == QLatin1String("export-masterdata") && twoFiles)
         result = cmdExportMasterData(file, args[2]);
     else if (command == QLatin1String("follow-up") && twoFiles)
