@@ -58,31 +58,6 @@ private:
     bool m_body;
 };
 
-QString tool(const QString& program, const QStringList& args)
-{
-    QProcess p;
-    p.start(program, args);
-    if (!p.waitForFinished(60000))
-        return QString();
-    return QString::fromUtf8(p.readAllStandardOutput());
-}
-
-QString pdfText(const QString& pdf, int page = 0)
-{
-    QStringList args{QStringLiteral("-layout")};
-    if (page > 0)
-        args << QStringLiteral("-f") << QString::number(page) << QStringLiteral("-l")
-             << QString::number(page);
-    return tool(QStringLiteral("pdftotext"), args << pdf << QStringLiteral("-"));
-}
-
-int pdfPages(const QString& pdf)
-{
-    const auto m =
-        QRegularExpression(QStringLiteral("Pages:\\s+(\\d+)")).match(tool(QStringLiteral("pdfinfo"), {pdf}));
-    return m.hasMatch() ? m.captured(1).toInt() : 0;
-}
-
 // Rows of pdffonts after its two heading lines; each ends in "emb sub uni object ID".
 QStringList fontRows(const QString& pdf)
 {

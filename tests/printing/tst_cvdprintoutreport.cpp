@@ -13,31 +13,6 @@
 using namespace VDRTestFixtures;
 
 namespace {
-QString tool(const QString& program, const QStringList& args)
-{
-    QProcess p;
-    p.start(program, args);
-    if (!p.waitForFinished(60000))
-        return QString();
-    return QString::fromUtf8(p.readAllStandardOutput());
-}
-
-QString pdfText(const QString& pdf, int page = 0)
-{
-    QStringList args{QStringLiteral("-layout")};
-    if (page > 0)
-        args << QStringLiteral("-f") << QString::number(page) << QStringLiteral("-l")
-             << QString::number(page);
-    return tool(QStringLiteral("pdftotext"), args << pdf << QStringLiteral("-"));
-}
-
-int pdfPages(const QString& pdf)
-{
-    const auto m =
-        QRegularExpression(QStringLiteral("Pages:\\s+(\\d+)")).match(tool(QStringLiteral("pdfinfo"), {pdf}));
-    return m.hasMatch() ? m.captured(1).toInt() : 0;
-}
-
 const char* const kReport =
     "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, inspection_time_to, "
     "env_time, env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, "

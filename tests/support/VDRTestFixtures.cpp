@@ -8,6 +8,7 @@
 #include <QDir>
 #include <QFile>
 #include <QProcess>
+#include <QRegularExpression>
 #include <QSettings>
 #include <QSqlError>
 #include <QSqlQuery>
@@ -377,6 +378,31 @@ bool createOldestLayoutDiary(const QString& path, const QString& fileVersion)
             "INSERT INTO id_generator VALUES ('entry_workforce', 6)",
             "INSERT INTO id_generator VALUES ('company', 3)",
         });
+}
+
+QString tool(const QString& program, const QStringList& args)
+{
+    QProcess p;
+    p.start(program, args);
+    if (!p.waitForFinished(60000))
+        return QString();
+    return QString::fromUtf8(p.readAllStandardOutput());
+}
+
+QString pdfText(const QString& pdf, int page)
+{
+    QStringList args{QStringLiteral("-layout")};
+    if (page > 0)
+        args << QStringLiteral("-f") << QString::number(page) << QStringLiteral("-l")
+             << QString::number(page);
+    return tool(QStringLiteral("pdftotext"), args << pdf << QStringLiteral("-"));
+}
+
+int pdfPages(const QString& pdf)
+{
+    const auto m =
+        QRegularExpression(QStringLiteral("Pages:\\s+(\\d+)")).match(tool(QStringLiteral("pdfinfo"), {pdf}));
+    return m.hasMatch() ? m.captured(1).toInt() : 0;
 }
 
 } // namespace VDRTestFixtures

@@ -83,4 +83,10 @@ private:
     bool m_mounted = false;
 };
 
+// Standard output of a program run with an argument list (empty when it does not finish).
+QString tool(const QString& program, const QStringList& args);
+// The text of a PDF, or of one of its pages (from 1), as pdftotext -layout reads it.
+QString pdfText(const QString& pdf, int page = 0);
+int pdfPages(const QString& pdf);
+
 } // namespace VDRTestFixtures
