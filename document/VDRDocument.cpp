@@ -255,6 +255,7 @@ QString VDRDocument::lockHolderText(const QStringList& holder)
 void VDRDocument::beginTransaction()
 {
     if (m_transactionDepth == 0) {
+        m_transactionFailed = false;
         QSqlQuery q(database());
         if (!q.exec(QStringLiteral("BEGIN EXCLUSIVE TRANSACTION")))
             qDebug() << "BEGIN failed:" << q.lastError().text();
@@ -262,25 +263,37 @@ void VDRDocument::beginTransaction()
     ++m_transactionDepth;
 }
 
-bool VDRDocument::endTransaction()
+bool VDRDocument::endTransaction(bool stepsSucceeded)
 {
     if (m_transactionDepth <= 0)
-        return true;
+        return stepsSucceeded;
+    m_transactionFailed = m_transactionFailed || !stepsSucceeded;
     if (--m_transactionDepth > 0)
-        return true;
-    QSqlQuery q(database());
-    if (q.exec(QStringLiteral("COMMIT TRANSACTION")))
-        return true;
-    // A full disk or an I/O error: SQLite may keep the transaction open; it must not stay half-done.
-    QString reason = CVdShared::sqlErrorText(q.lastError());
-    if (reason.contains(QLatin1String("no transaction is active"))) {
-        // SQLite already rolled back after a failed write inside the transaction; say why it failed.
-        const QStorageInfo disk(QFileInfo(m_workingCopyPath).absolutePath());
-        reason = disk.isValid() && disk.bytesAvailable() < 1024 * 1024
-                     ? VDRFileOps::reasonText(ENOSPC)
-                     : tr("Ein Schreibfehler hat den Vorgang abgebrochen; nichts davon wurde gespeichert.");
+        return stepsSucceeded;
+    QString reason;
+    if (m_transactionFailed) {
+        // Half an operation (a copy without some of its rows, rows removed from a report that
+        // stays) must not reach the file.
+        reason =
+            tr("Ein Schritt des Vorgangs ist fehlgeschlagen; der ganze Vorgang wurde rückgängig gemacht.");
+    } else {
+        QSqlQuery q(database());
+        if (q.exec(QStringLiteral("COMMIT TRANSACTION")))
+            return true;
+        // A full disk or an I/O error: SQLite may keep the transaction open; it must not stay half-done.
+        reason = CVdShared::sqlErrorText(q.lastError());
+        if (reason.contains(QLatin1String("no transaction is active"))) {
+            // SQLite already rolled back after a failed write inside the transaction; say why it failed.
+            const QStorageInfo disk(QFileInfo(m_workingCopyPath).absolutePath());
+            reason =
+                disk.isValid() && disk.bytesAvailable() < 1024 * 1024
+                    ? VDRFileOps::reasonText(ENOSPC)
+                    : tr("Ein Schreibfehler hat den Vorgang abgebrochen; nichts davon wurde gespeichert.");
+        }
     }
+    m_transactionFailed = false;
     QSqlQuery(database()).exec(QStringLiteral("ROLLBACK TRANSACTION"));
+    reselectModelsAfterRollback();
     VDRPrompt::critical(
         tr("Datenbankfehler"),
         tr("Die Änderungen konnten nicht in die Working Copy Datei\n%1\ngeschrieben werden:\n%2")
@@ -303,6 +316,7 @@ void VDRDocument::clearState()
     m_fileVersion.clear();
     m_inspecting = false;
     m_transactionDepth = 0;
+    m_transactionFailed = false;
     m_masterDataModified = false;
     m_deletedImages = 0;
     m_deletedAudio = 0;

@@ -84,10 +84,12 @@ public:
     // the copy so the lock is never dropped by a stray file handle).
     bool writeWorkingCopyTo(const QString& target);
 
-    // Nesting transactions; only the outermost pair reaches the database. endTransaction returns
-    // false (and has told the user) when the outermost COMMIT failed: nothing of it was stored.
+    // Nesting transactions; only the outermost pair reaches the database. A caller whose steps
+    // failed passes false: the whole outermost transaction is then rolled back, so an operation
+    // is stored whole or not at all. endTransaction returns false (and has told the user) when
+    // nothing of the outermost transaction was stored; the models then show the file again.
     void beginTransaction();
-    bool endTransaction();
+    bool endTransaction(bool stepsSucceeded = true);
     int transactionDepth() const { return m_transactionDepth; }
 
     // Models of the diary as a whole.
@@ -387,6 +389,7 @@ private:
     VDRSqlTableModel* createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter);
     void releaseEntryModels();
     bool entryModelsDirty(int entryId) const;
+    void reselectModelsAfterRollback();
     bool importExternalDocuments();
     void repairOldVersion();
     void freezeCompaniesOfLockedEntries();
@@ -418,6 +421,7 @@ private:
     QStringList m_filesToRemove;
     QString m_fileVersion;
     int m_transactionDepth = 0;
+    bool m_transactionFailed = false;
     int m_deletedImages = 0;
     int m_deletedAudio = 0;
     qint64 m_compactSizeBefore = 0;

@@ -192,8 +192,7 @@ void VDRDocument::entryNumbersAddDigit(int digits)
         const QString number = m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString();
         m_modelEntryAll->setData(row, QStringLiteral("number"), QLatin1Char('0') + number);
     }
-    m_modelEntryAll->submitAll();
-    endTransaction();
+    endTransaction(m_modelEntryAll->submitAll());
     VDRPrompt::instance()->endNotice();
 }
 
@@ -278,7 +277,7 @@ int VDRDocument::appendEntry()
         {"exported_by_app", 0},
         {"import_version", QVariant(QVariant::DateTime)},
     });
-    ok = endTransaction() && ok;
+    ok = endTransaction(ok);
     return ok ? 1 : 0;
 }
 
@@ -506,8 +505,10 @@ bool VDRDocument::copyEntryAll(int row)
     const int sourceId = source.value(QStringLiteral("id")).toInt();
 
     beginTransaction();
-    if (appendEntry() != 1) {
-        endTransaction();
+    const int appended = appendEntry();
+    if (appended != 1) {
+        // -1: the user declined the number; nothing was written.
+        endTransaction(appended != 0);
         return false;
     }
     const int newRow = m_modelEntryAll->rowCount() - 1;
@@ -582,7 +583,7 @@ bool VDRDocument::copyEntryAll(int row)
             ok &= timesCopy->submitAll();
         }
     }
-    ok = endTransaction() && ok;
+    ok = endTransaction(ok);
     return ok;
 }
 
@@ -668,7 +669,7 @@ bool VDRDocument::removeEntryAll(int row)
         m_modelEntryAll->removeRows(row, 1);
         ok &= m_modelEntryAll->submitAll();
     }
-    ok = endTransaction() && ok;
+    ok = endTransaction(ok);
     return ok;
 }
 
@@ -701,7 +702,7 @@ bool VDRDocument::lockEntry(int row, bool locked)
     if (locked)
         lockCompanyRecords4lockedEntry(row);
     bool ok = m_modelEntryAll->submitAll();
-    ok = endTransaction() && ok;
+    ok = endTransaction(ok);
     return ok;
 }
 
@@ -750,14 +751,14 @@ void VDRDocument::lockCompanyRecords4lockedEntry(int row)
     // The copies and the rows pointing at them are committed together: a report form that later
     // reverts its models must not lose one half.
     beginTransaction();
-    m_modelCompany2->submitAll();
-    m_modelCompany1->submitAll();
+    bool ok = m_modelCompany2->submitAll();
+    ok &= m_modelCompany1->submitAll();
     for (VDRSqlTableModel* model : models) {
         model->updateCompanyIds(&copies);
         if (model->isDirty())
-            model->submitAll();
+            ok &= model->submitAll();
     }
-    endTransaction();
+    endTransaction(ok);
     setMasterDataModified(true);
 }
 

@@ -149,6 +149,27 @@ bool VDRDocument::entryModelsDirty(int entryId) const
     return false;
 }
 
+void VDRDocument::reselectModelsAfterRollback()
+{
+    // The models' caches still hold what the rolled-back steps wrote.
+    for (VDRSqlTableModel* model : {m_modelVdr, m_modelCompany1, m_modelCompany2, m_modelAddresslist}) {
+        if (model) {
+            model->revertAll();
+            model->select();
+        }
+    }
+    if (m_modelEntryAll) {
+        m_modelEntryAll->revertAll();
+        m_modelEntryAll->select();
+    }
+    for (const QMap<int, VDRSqlTableModel*>& models : qAsConst(m_entryModels)) {
+        for (VDRSqlTableModel* model : models) {
+            model->revertAll();
+            model->select();
+        }
+    }
+}
+
 void VDRDocument::releaseEntryModels()
 {
     // Oldest first; the report used last always stays.

@@ -417,6 +417,59 @@ private slots:
         m_doc.reset();                                                  // while the disk is still there
     }
 
+    // A step that fails inside an operation undoes the whole operation, even though the commit
+    // itself would succeed.
+    void failedStepUndoesTheOperation_data()
+    {
+        QTest::addColumn<QString>("trigger");
+        QTest::addColumn<int>("operation");
+        QTest::newRow("copy without its workforce") << "BEFORE INSERT ON entry_workforce" << 0;
+        QTest::newRow("removal of a report that stays") << "BEFORE DELETE ON entry" << 1;
+        QTest::newRow("lock without its frozen companies") << "BEFORE INSERT ON company" << 2;
+    }
+
+    void failedStepUndoesTheOperation()
+    {
+        QFETCH(QString, trigger);
+        QFETCH(int, operation);
+        exec({"INSERT INTO company VALUES (4, 2, '', '', '', 'Bau GmbH', '', '', 'Köln', '', '', '', '', 1)",
+              "UPDATE id_generator SET id_counter = 4 WHERE id_table = 'company'",
+              "INSERT INTO entry_attendee VALUES (1, 1, 1, 4, 'Polier')",
+              "INSERT INTO entry_workforce VALUES (1, 1, 1, 4, '', 3, '', 24)",
+              "INSERT INTO entry_concern VALUES (1, 1, 0, 'Statik', NULL)",
+              "INSERT INTO id_generator VALUES ('entry_attendee', 1), ('entry_workforce', 1), "
+              "('entry_concern', 1)",
+              QStringLiteral("CREATE TRIGGER fails %1 BEGIN SELECT RAISE(ABORT, 'refused'); END")
+                  .arg(trigger)});
+        m_doc->modelEntryAll()->select();
+        m_doc->modelCompany2()->select();
+        const QString everything =
+            "SELECT 'e', id, number, locked FROM entry UNION ALL SELECT 'a', id, entry_id, comment FROM "
+            "entry_attendee UNION ALL SELECT 'w', id, entry_id, person_count FROM entry_workforce UNION ALL "
+            "SELECT 'k', id, entry_id, description FROM entry_concern UNION ALL SELECT 'c', id, category, "
+            "company FROM company";
+        const QStringList before = rows(everything);
+
+        m_prompt.expect(QStringLiteral("Datenbankfehler"), QStringLiteral("rückgängig"));
+        const bool ok = operation == 0   ? m_doc->copyEntryAll(0)
+                        : operation == 1 ? m_doc->removeEntryAll(0)
+                                         : m_doc->lockEntry(0, true);
+        QVERIFY(!ok);
+        QCOMPARE(m_doc->transactionDepth(), 0);
+        QCOMPARE(rows(everything), before);
+        // The models show the file again, not what the undone steps left in them.
+        QCOMPARE(m_doc->modelEntryAll()->rowCount(), 1);
+        QCOMPARE(m_doc->modelEntryAll()->data(0, QStringLiteral("number"), Qt::EditRole).toString(),
+                 QStringLiteral("001 (Entwurf)"));
+        QCOMPARE(m_doc->modelEntryConcern(1)->rowCount(), 1);
+        QCOMPARE(m_doc->modelCompany2()->rowCount(), 1);
+
+        // The next operation works as usual.
+        exec({"DROP TRIGGER fails"});
+        QVERIFY(m_doc->copyEntryAll(0));
+        QCOMPARE(rows("SELECT count(*) FROM entry_workforce"), QStringList{"2"});
+    }
+
     void reportListAfterRemovals_data()
     {
         QTest::addColumn<bool>("editedList");
