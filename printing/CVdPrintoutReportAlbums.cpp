@@ -30,8 +30,10 @@ QSize croppedSize(const QSize& size)
     return size;
 }
 
-// Decodes a stored photo no larger than needed for 'box': a large JPEG is reduced while it is read,
-// so a full-size picture never lives in memory. Null when the bytes are not a picture.
+// Decodes a stored photo no larger than needed for 'box': a picture of twice the size or more is
+// reduced while it is read, so a full-size camera picture never lives in memory. A smaller excess
+// is left to the painter, which scales as it draws (in a PDF the page does, at no cost).
+// Null when the bytes are not a picture.
 QImage decodeFitted(const QByteArray& blob, const QSize& box)
 {
     if (blob.isEmpty() || box.isEmpty())
@@ -44,7 +46,7 @@ QImage decodeFitted(const QByteArray& blob, const QSize& box)
     if (declared.isValid() && !declared.isEmpty()) {
         const QSize shown = croppedSize(declared);
         const QSize fitted = shown.scaled(box, Qt::KeepAspectRatio);
-        if (fitted.width() < shown.width()) {
+        if (2 * fitted.width() <= shown.width()) {
             const double f = double(fitted.width()) / shown.width();
             reader.setScaledSize(
                 QSize(qMax(1, qRound(declared.width() * f)), qMax(1, qRound(declared.height() * f))));
@@ -53,10 +55,7 @@ QImage decodeFitted(const QByteArray& blob, const QSize& box)
     QImage image;
     if (!reader.read(&image) || image.isNull())
         return QImage();
-    image = CVdPrintout::cropImage(image);
-    if (image.width() > box.width() || image.height() > box.height())
-        CVdPrintout::scale_image(box.width(), box.height(), image);
-    return image;
+    return CVdPrintout::cropImage(image);
 }
 } // namespace
 
@@ -313,7 +312,10 @@ void CVdPrintoutReport::draw_photo(QPainter& painter, const QRect& slot, const C
     if (!image.isNull()) {
         const QSize size = image.size().scaled(box.size(), Qt::KeepAspectRatio).boundedTo(box.size());
         target = QRect(box.x() + (box.width() - size.width()) / 2, box.y(), size.width(), size.height());
+        painter.save();
+        painter.setRenderHint(QPainter::SmoothPixmapTransform);
         painter.drawImage(target, image);
+        painter.restore();
     } else {
         // Not a picture: its place stays visible so the caption still belongs to something.
         painter.fillRect(box, Qt::lightGray);

@@ -28,19 +28,22 @@ private slots:
         m_path = m_dir.filePath(QStringLiteral("Fotos.vd2"));
         QVERIFY(createDiary(m_path));
         QVERIFY(openDiary(m_doc, m_path));
-        QImage landscape(600, 400, QImage::Format_RGB32), portrait(300, 400, QImage::Format_RGB32);
+        QImage landscape(600, 400, QImage::Format_RGB32), portrait(300, 400, QImage::Format_RGB32),
+            camera(4000, 3000, QImage::Format_RGB32);
         landscape.fill(Qt::darkBlue);
         portrait.fill(Qt::darkGreen);
+        camera.fill(Qt::darkRed);
         m_landscapeId = m_doc.createImage(landscape);
         m_portraitId = m_doc.createImage(portrait);
-        QVERIFY(m_landscapeId > 0 && m_portraitId > 0);
+        m_cameraId = m_doc.createImage(camera);
+        QVERIFY(m_landscapeId > 0 && m_portraitId > 0 && m_cameraId > 0);
         QVERIFY(execOn(m_doc.database(),
                        {imageInsertSql(64),
                         "INSERT INTO company (id, category, type, firstname, lastname, company, street, plz, "
                         "city, telephone, telefax, mobile, email, pos) VALUES (7, 1, ' ', ' ', ' ', "
                         "'Muster GmbH', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0)"}));
         m_brokenId = textsOn(m_doc.database(), QStringLiteral("SELECT max(id) FROM image")).value(0).toInt();
-        QVERIFY(m_brokenId > m_portraitId);
+        QVERIFY(m_brokenId > m_cameraId);
     }
     void cleanupTestCase() { m_doc.closeDocument(); }
     void init()
@@ -116,8 +119,9 @@ private slots:
         }
     }
 
-    // Photos given as type and kind (L, P, X for bytes that are no picture, M for a missing picture
-    // row): the texts shown, the page count and how many pictures the PDF holds.
+    // Photos given as type and kind (L, P, C a 12-megapixel landscape, X bytes that are no picture,
+    // M a missing picture row): the texts shown, the page count and how many pictures the PDF holds,
+    // none wider than the page's body.
     void printed_data()
     {
         QTest::addColumn<QStringList>("photos");
@@ -141,6 +145,8 @@ private slots:
                            "Bilder zu Baustoffen",
                            "Bild 1 von 1 von Baustoffe"}
             << 4 << 3;
+        QTest::newRow("camera-sized photo")
+            << QStringList{"1C", "1P"} << QStringList{"Bild 1 von 2 von Leistungsstand"} << 2 << 2;
         QTest::newRow("not a picture")
             << QStringList{"2X", "2M"} << QStringList{"Bild 1 von 2 von Mängel", "Bild 2 von 2 von Mängel"}
             << 2 << 0;
@@ -156,6 +162,7 @@ private slots:
             const QChar kind = photos[i].at(1);
             const int image = kind == QLatin1Char('L')   ? m_landscapeId
                               : kind == QLatin1Char('P') ? m_portraitId
+                              : kind == QLatin1Char('C') ? m_cameraId
                               : kind == QLatin1Char('X') ? m_brokenId
                                                          : 99999;
             sql << QStringLiteral("INSERT INTO entry_photo (entry_id, pos, type, photo_image_id, caption, "
@@ -182,8 +189,12 @@ private slots:
         QVERIFY(!pdfText(pdf, 1).contains(QStringLiteral("Bilder z")));
         const QStringList list =
             tool(QStringLiteral("pdfimages"), {QStringLiteral("-list"), pdf}).split(QLatin1Char('\n'));
-        QCOMPARE(list.filter(QRegularExpression(QStringLiteral("^\\s*\\d+\\s+\\d+\\s+image"))).size(),
-                 images);
+        const QStringList embedded =
+            list.filter(QRegularExpression(QStringLiteral("^\\s*\\d+\\s+\\d+\\s+image")));
+        QCOMPARE(embedded.size(), images);
+        // A4 at 150 dpi less the margins: about 1060 pixels.
+        for (const QString& row : embedded)
+            QVERIFY2(row.simplified().section(QLatin1Char(' '), 3, 3).toInt() <= 1100, qPrintable(row));
         if (photos.first().at(1) == QLatin1Char('X')) {
             // The grey box of the slot is there in place of the picture.
             const QString png = m_dir.filePath(QStringLiteral("seite"));
@@ -205,7 +216,7 @@ private:
     VDRTestPrompt m_prompt;
     VDRDocument m_doc;
     QString m_path;
-    int m_landscapeId = 0, m_portraitId = 0, m_brokenId = 0;
+    int m_landscapeId = 0, m_portraitId = 0, m_cameraId = 0, m_brokenId = 0;
 };
 
 QTEST_MAIN(TestCVdPrintoutAlbums)
