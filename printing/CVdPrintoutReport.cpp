@@ -430,6 +430,7 @@ void CVdPrintoutReport::print_document(QPainter& painter)
         if (section.separatorAfter)
             draw_separator(painter);
     }
+    drawAlbums(painter);
     if (m_drawing)
         after_print_page(painter);
 }

@@ -1,9 +1,14 @@
 #pragma once
 
+#include "printing/CPhoto.h"
 #include "printing/CVdPrintout.h"
 
 #include <QList>
+#include <QMap>
+#include <QRect>
+#include <QSet>
 #include <QStringList>
+#include <QVector>
 
 #include <functional>
 
@@ -54,4 +59,37 @@ private:
     bool m_drawing = false;
     int m_y = 0;
     bool m_drawnSinceSeparator = false;
+
+    // Photo albums
+public:
+    static constexpr double ImagePageVerticalSpacingFactor = 0.3;
+    // The layout code of each album page for photos in list order (true: portrait), and how many
+    // photos a page of that code takes.
+    static QList<int> album_layouts(const QList<bool>& portrait);
+    static int album_page_photos(int code);
+    // The photo slots of a page of that code inside 'area', in the order of the page's photos.
+    static QVector<QRect> album_slots(int code, const QRect& area, int gap);
+    void get_photos_info(int entryId, QMap<int, QList<CPhoto>>& progress, QMap<int, QList<CPhoto>>& defects,
+                         QMap<int, QList<CPhoto>>& obstructions, QMap<int, QList<CPhoto>>& measures,
+                         QMap<int, QList<CPhoto>>& materials);
+
+private:
+    struct AlbumPhoto
+    {
+        int pos = 0;
+        int type = 0;
+        QString caption, date, comment, company;
+        QByteArray blob;
+    };
+    void drawAlbums(QPainter& painter);
+    void drawAlbum(QPainter& painter, const QMap<int, QList<CPhoto>>& map, const QString& title);
+    void drawAlbumTitle(QPainter& painter, const QString& title);
+    void draw_photo_page1(QPainter& painter, int code, const QList<CPhoto>& photos, int first, int count);
+    void draw_photo_page10(QPainter& painter, int code, const QList<CPhoto>& photos, int first, int count);
+    void draw_photo_page(QPainter& painter, int code, const QList<CPhoto>& photos, int first, int count);
+    void draw_photo(QPainter& painter, const QRect& slot, const CPhoto& photo, int number, int count);
+    bool get_photo(int photoId, AlbumPhoto& photo) const;
+
+    QMap<int, QList<CPhoto>> m_albumPhotos[5];
+    QSet<int> m_albumPhotoIds[5];
 };
