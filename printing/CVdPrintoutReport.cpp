@@ -9,6 +9,7 @@
 #include <QLocale>
 #include <QPainter>
 #include <QPixmap>
+#include <QRegularExpression>
 #include <QSqlError>
 #include <QSqlQuery>
 #include <QTextBlock>
@@ -887,7 +888,12 @@ bool CVdPrintoutReport::drawRichText(QPainter& painter, const QString& caption, 
     doc.documentLayout()->setPaintDevice(painter.device());
     doc.setDefaultFont(contentsFont);
     doc.setDocumentMargin(0);
-    doc.setHtml(stored);
+    // The editor's own font on <body> gives way to the printout's body font; formatting inside stays.
+    QString html = stored;
+    html.replace(QRegularExpression(QStringLiteral("(<body[^>]*?)\\s+style=\"[^\"]*\""),
+                                    QRegularExpression::CaseInsensitiveOption),
+                 QStringLiteral("\\1"));
+    doc.setHtml(html);
     if (doc.toPlainText().trimmed().isEmpty())
         return draw_table(painter, caption, note, Cells());
     // Slightly below the limits, so that rounding never leaves an image a pixel too large.
