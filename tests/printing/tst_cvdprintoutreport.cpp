@@ -329,6 +329,12 @@ private slots:
                               "(1, 0, NULL, 'siehe https://example.com/%1')")
                    .arg(word)
             << QStringList{"https://example.com/" + word} << 1;
+        QStringList lines;
+        for (int i = 0; i < 150; ++i)
+            lines << QStringLiteral("Zeile%1").arg(i, 3, 10, QLatin1Char('0'));
+        QTest::newRow("a 150-line cell continues over pages")
+            << QStringLiteral("UPDATE entry SET progress='%1'").arg(lines.join(QLatin1Char('\n'))) << lines
+            << 4;
         QTest::newRow("20,000-pixel image")
             << "UPDATE entry SET progress='<p>Vorher</p><p><img src=\"fehlt.png\" width=\"300\" "
                "height=\"20000\"></p><p>Nachher</p>'"
