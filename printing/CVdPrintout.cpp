@@ -19,6 +19,7 @@
 #include <QSettings>
 #include <QSqlQuery>
 #include <QStandardPaths>
+#include <QTextLayout>
 #include <QTimer>
 
 const char* const CVdPrintout::TestText = "Xy";
@@ -607,20 +608,27 @@ void CVdPrintout::draw_text_ml(QPainter& painter, const QRect& rect, const QStri
 
 QString CVdPrintout::break_line(QPainter& painter, int width, const QString& text)
 {
-    const QFontMetrics fm = painter.fontMetrics();
+    // Wraps at word boundaries, and inside a word only where the word alone is wider than the
+    // column (a long URL), so that nothing runs past the column's edge.
+    QTextOption option;
+    option.setWrapMode(QTextOption::WrapAtWordBoundaryOrAnywhere);
     QStringList lines;
     for (const QString& paragraph : text.split(QLatin1Char('\n'))) {
-        QString line;
-        for (const QString& word : paragraph.split(QLatin1Char(' '))) {
-            const QString candidate = line.isEmpty() ? word : line + QLatin1Char(' ') + word;
-            if (!line.isEmpty() && fm.horizontalAdvance(candidate) > width) {
-                lines << line;
-                line = word;
-            } else {
-                line = candidate;
-            }
+        QTextLayout layout(paragraph, painter.font(), painter.device());
+        layout.setTextOption(option);
+        layout.beginLayout();
+        bool any = false;
+        for (QTextLine line = layout.createLine(); line.isValid(); line = layout.createLine()) {
+            line.setLineWidth(qMax(1, width));
+            QString part = paragraph.mid(line.textStart(), line.textLength());
+            while (!part.isEmpty() && part.back().isSpace())
+                part.chop(1);
+            lines << part;
+            any = true;
         }
-        lines << line;
+        layout.endLayout();
+        if (!any)
+            lines << QString();
     }
     return lines.join(QLatin1Char('\n'));
 }

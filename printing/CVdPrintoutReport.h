@@ -5,6 +5,7 @@
 
 #include <QList>
 #include <QMap>
+#include <QPair>
 #include <QRect>
 #include <QSet>
 #include <QStringList>
@@ -31,25 +32,99 @@ public:
     QString get_weather(int entryId) const;
 
 private:
-    struct Section
+    using Cells = QList<QList<CText>>;
+    // One column of a section: a cell per row, its share of the content width and its alignment.
+    struct Column
     {
-        QString caption;
-        QStringList rows;
-        bool separatorAfter = false;
+        Cells cells;
+        double factor = 1.0;
+        int alignment = Qt::AlignLeft;
     };
-    QList<Section> read_sections(int entryId) const;
-    QStringList company_rows(const QString& table, const QString& condition,
-                             const std::function<QString(const QSqlQuery&)>& text) const;
+    // One wrapped line of a cell, in the font it is drawn with.
+    struct Line
+    {
+        QString text;
+        QFont font;
+        int height = 0;
+    };
+    // A row laid out: per column its x, width, alignment and lines.
+    struct RowLayout
+    {
+        QVector<int> x, width, alignment;
+        QVector<QVector<Line>> lines;
+    };
+
+    void read_entry(int entryId);
     QString entry_text(int entryId, const char* column) const;
     QString getImagesCountText(int entryId, int type) const;
-    void read_entry(int entryId);
+    // Rows with an existing company first, in pos order, then those without; 'row' gets the
+    // company's text and the query positioned on the row.
+    void company_rows(const QString& table, const QString& condition,
+                      const std::function<void(const QString&, const QSqlQuery&)>& row) const;
+
+    void get_attendee(int entryId, Cells& companies, Cells& comments) const;
+    void get_workforce(int entryId, Cells& companies, Cells& persons, Cells& manHours, int& personSum,
+                       double& manHourSum, bool& anyManHours) const;
+    QString get_progress(int entryId) const;
+    QString get_incidents(int entryId) const;
+    void get_acceptance(int entryId, Cells& companies, Cells& texts) const;
+    void get_defects(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
+    void get_advantage(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
+    void get_invalidities(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
+    void get_measures(int entryId, Cells& companies, Cells& texts, Cells& times) const;
+    void get_tasks(int entryId, int type, Cells& companies, Cells& texts) const;
+    QString get_interventions(int entryId) const;
+    void get_concerns(int entryId, Cells& companies, Cells& texts) const;
+    QString get_tests(int entryId) const;
+    bool get_printStatus4TelephoneNotice(int entryId) const;
+    void get_telephone_notice(int entryId, Cells& times, Cells& companies, Cells& texts) const;
+    bool get_printStatus4Notice(int entryId) const;
+    QString get_notice(int entryId) const;
+    void get_materials(int entryId, Cells& companies, Cells& materials, Cells& amounts) const;
+    void get_sample(int entryId, Cells& rows) const;
+    void get_documents(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
+    void get_equipment(int entryId, Cells& equipment, Cells& zones, Cells& operating, Cells& down,
+                       int& operatingSum, int& downSum) const;
+    static QString reformatDate4Deficiencies(const QString& isoDate);
+    static QString reformatDate4Delays(const QString& isoDate);
+    static QString reformat_time(const QString& stored);
 
     void print_document(QPainter& painter);
     void draw_info(QPainter& painter);
-    bool draw_table(QPainter& painter, const Section& section);
+    bool draw_table(QPainter& painter, const QString& caption, const QString& note, const Cells& rows);
+    bool draw_table(QPainter& painter, const QString& caption, const QString& note, const Cells& companies,
+                    const Cells& texts, int alignment = Qt::AlignLeft);
+    bool draw_table(QPainter& painter, const QString& caption, const QString& note, const Cells& companies,
+                    const Cells& texts, const Cells& third);
+    bool drawTable4ThreeColumns(QPainter& painter, const QString& caption, const QString& note,
+                                const Cells& first, const Cells& second, const Cells& third, double f1,
+                                double f2, double f3);
+    bool draw_table4Workforce(QPainter& painter, int entryId);
+    bool draw_table4Equipment(QPainter& painter, int entryId);
+    bool drawRichText(QPainter& painter, const QString& caption, const QString& note, const QString& stored);
+    // The common frame of every table section: caption, emptiness rule, page breaks.
+    bool draw_section(QPainter& painter, const QString& caption, const QString& note,
+                      const QList<Column>& columns);
     void draw_separator(QPainter& painter);
     void next_page(QPainter& painter);
-    static bool is_empty(const QStringList& rows);
+
+    QRect cell_rect(const RowLayout& row, int column, int y, int height) const;
+    QVector<Line> cell_lines(QPainter& painter, const QList<CText>& cell, const QFont& font, int width);
+    RowLayout layout_row(QPainter& painter, const QList<Column>& columns, int row, const QVector<int>& x,
+                         const QVector<int>& widths);
+    QVector<Line> caption_lines(QPainter& painter, const QString& caption, const QString& note);
+    void draw_cell(QPainter& painter, const RowLayout& row, int column, int from, int to, int y);
+    void draw_row(QPainter& painter, const RowLayout& row);
+    static int lines_height(const QVector<Line>& lines, int from, int to);
+    bool checkCell4OrphanLines(const QVector<Line>& caption, const RowLayout* first) const;
+    int checkCell4WidowLines(const QVector<Line>& lines, int from, int available) const;
+    bool checkRow4OrphanLines(const RowLayout& row, int available) const;
+    QVector<int> checkRow4WidowLines(const RowLayout& row, const QVector<int>& from, int available) const;
+    bool checkRow4FormFeed(const RowLayout& row) const;
+    qreal checkRichTextBlock4DrawOnPage(const QVector<QPair<qreal, qreal>>& lines, qreal end, qreal from,
+                                        int available, bool pageTop) const;
+    static bool is_empty(const Cells& cells);
+    static bool is_empty(const QList<Column>& columns);
 
     QList<int> m_entryIds;
     int m_entryId = -1;

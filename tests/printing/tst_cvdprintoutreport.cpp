@@ -68,7 +68,8 @@ private slots:
         QVERIFY(execOn(m_doc.database(),
                        {"DELETE FROM entry", "DELETE FROM entry_workforce", "DELETE FROM entry_progress",
                         "DELETE FROM entry_photo", "DELETE FROM entry_telephone_notice",
-                        "DELETE FROM entry_task", "UPDATE vdr SET display_empty_categories=0",
+                        "DELETE FROM entry_task", "DELETE FROM entry_attendee", "DELETE FROM entry_equipment",
+                        "DELETE FROM company", "UPDATE vdr SET display_empty_categories=0",
                         QString::fromLatin1(kReport).arg(1).arg(QStringLiteral("012 (Entwurf)"))}));
     }
     void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
@@ -100,7 +101,7 @@ private slots:
             << QStringList{"INSERT INTO entry_telephone_notice (entry_id, pos, description, time) "
                            "VALUES (1, 0, 'Anruf Statiker', '09:15:00')",
                            "UPDATE entry SET print_telephone_notice=1"}
-            << QStringList{"Telefonnotizen:", "09:15 - Anruf Statiker"} << QStringList{};
+            << QStringList{"Telefonnotizen:", "09:15 Uhr", "Anruf Statiker"} << QStringList{};
         QTest::newRow("notes only with their print flag")
             << QStringList{"UPDATE entry SET notice='Privat'"} << QStringList{}
             << QStringList{"Sonstige Notizen:", "Privat"};
@@ -112,8 +113,57 @@ private slots:
                            "INSERT INTO entry_photo (entry_id, pos, type, caption, comment, date) VALUES "
                            "(1, 0, 1, 'a', ' ', '2024-03-05'), (1, 0, 2, 'b', ' ', '2024-03-05'), "
                            "(1, 1, 2, 'c', ' ', '2024-03-05'), (1, 2, 2, 'd', ' ', '2024-03-05')"}
-            << QStringList{"(siehe Foto)", "Rohbau fertig", "(siehe 3 Fotos)", "Bad (2.01) - Riss"}
+            << QStringList{"Rohbau fertig", "(siehe Foto)", "Bad (2.01)", "Riss", "(siehe 3 Fotos)"}
             << QStringList{"<b>"};
+        QTest::newRow("deficiency parts beside each other, company first")
+            << QStringList{"INSERT INTO company (id, category, type, firstname, lastname, company, street, "
+                           "plz, "
+                           "city, telephone, telefax, mobile, email, pos) VALUES (7, 1, ' ', ' ', ' ', "
+                           "'Maler Blau', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0)",
+                           "INSERT INTO entry_progress (entry_id, pos, type, description, roomname, "
+                           "roombook_number, company_id) VALUES (1, 0, 4, 'Fleck', 'Flur', ' ', NULL), "
+                           "(1, 1, 4, 'Riss', 'Bad', '2.01', 7)"}
+            << QStringList{"Mängel:", "Maler Blau", "Riss", "Bad (2.01)", "Flur", "Fleck"}
+            << QStringList{" - Riss"};
+        QTest::newRow("attendees: companies in pos order, then rows without one")
+            << QStringList{"INSERT INTO company (id, category, type, firstname, lastname, company, street, "
+                           "plz, "
+                           "city, telephone, telefax, mobile, email, pos) VALUES (7, 1, ' ', ' ', ' ', "
+                           "'Planbüro', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0), (8, 1, ' ', ' ', ' ', "
+                           "'Rohbau AG', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 1)",
+                           "INSERT INTO entry_attendee (entry_id, pos, company_id, comment) VALUES "
+                           "(1, 0, NULL, 'Gast'), (1, 1, 8, 'Polier'), (1, 2, 99, 'Verwaist'), "
+                           "(1, 3, 7, 'Architekt')"}
+            << QStringList{"Anwesende:", "Rohbau AG", "Polier", "Planbüro", "Architekt", "Gast", "Verwaist"}
+            << QStringList{};
+        QTest::newRow("rich text keeps its words in order")
+            << QStringList{"UPDATE entry SET progress='<html><body><p>Erste <b>fette</b> Zeile</p><ul>"
+                           "<li>Punkt eins</li><li>Punkt zwei</li></ul><table border=1><tr><td>Zelle A</td>"
+                           "<td>Zelle B</td></tr></table><p>Schluss</p></body></html>'"}
+            << QStringList{"Erste fette Zeile", "Punkt eins", "Punkt zwei", "Zelle A", "Zelle B", "Schluss"}
+            << QStringList{"<", "&"};
+        QTest::newRow("equipment times as hours with sums")
+            << QStringList{"INSERT INTO entry_equipment (entry_id, pos, equipment, operating_zone, "
+                           "operating_time, downtime, downtime_reasons, comment) VALUES "
+                           "(1, 0, 'Bagger', 'Nord', 90, 30, ' ', ' '), (1, 1, 'Kran', 'Süd', 60, 0, ' ', ' "
+                           "')"}
+            << QStringList{"Geräte und Maschinen:",
+                           "Bagger",
+                           "Nord",
+                           "Einsatzzeiten:",
+                           "Stillstandszeiten:",
+                           "1:30 Stunden",
+                           "0:30 Stunden",
+                           "Kran",
+                           "Süd",
+                           "Einsatzzeiten:",
+                           "1:00 Stunden",
+                           "Summen:",
+                           "Einsatzzeiten:",
+                           "Stillstandszeiten:",
+                           "2:30 Stunden",
+                           "0:30 Stunden"}
+            << QStringList{"0:00 Stunden"};
     }
     void content()
     {
@@ -122,8 +172,12 @@ private slots:
         QFETCH(QStringList, hidden);
         QVERIFY(execOn(m_doc.database(), sql));
         const QString text = printed({1});
-        for (const QString& s : shown)
-            QVERIFY2(text.contains(s), qPrintable(s + QStringLiteral("\n") + text));
+        // Shown texts appear in the order given.
+        int at = 0;
+        for (const QString& s : shown) {
+            at = text.indexOf(s, at);
+            QVERIFY2(at >= 0, qPrintable(s + QStringLiteral("\n") + text));
+        }
         for (const QString& s : hidden)
             QVERIFY2(!text.contains(s), qPrintable(s + QStringLiteral("\n") + text));
     }
@@ -153,28 +207,47 @@ private slots:
         }
     }
 
-    // Two reports: the first long enough for several pages with every row kept, page labels restarting
-    // for the second, and the signature line on every page.
+    // Two reports: the first with 500 workforce rows over many pages, every company once and in pos order
+    // before the row without one, the totals at the end; page labels restart for the second report, and
+    // the signature line is on every page.
     void pagesPerReport()
     {
         QStringList sql{QString::fromLatin1(kReport).arg(2).arg(QStringLiteral("013"))};
-        QStringList values;
-        for (int i = 0; i < 500; ++i)
-            values << QStringLiteral("(1, %1, 'Zeile %2', 1, ' ')").arg(i).arg(i, 4, 10, QLatin1Char('0'));
+        QStringList companies, rows{QStringLiteral("(1, -1, NULL, 'ohne Firma', 1, ' ')")};
+        for (int i = 0; i < 500; ++i) {
+            companies << QStringLiteral(
+                             "(%1, 1, ' ', ' ', ' ', 'Firma %2', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0)")
+                             .arg(1000 + 500 - i)
+                             .arg(i, 4, 10, QLatin1Char('0'));
+            rows << QStringLiteral("(1, %1, %2, 'Zeile %3', 1, ' ')")
+                        .arg(i)
+                        .arg(1000 + 500 - i)
+                        .arg(i, 4, 10, QLatin1Char('0'));
+        }
         sql << QStringLiteral(
-                   "INSERT INTO entry_workforce (entry_id, pos, comment, person_count, person_type) "
-                   "VALUES ") +
-                   values.join(QLatin1Char(','));
+                   "INSERT INTO company (id, category, type, firstname, lastname, company, street, "
+                   "plz, city, telephone, telefax, mobile, email, pos) VALUES ") +
+                   companies.join(QLatin1Char(','))
+            << QStringLiteral(
+                   "INSERT INTO entry_workforce (entry_id, pos, company_id, comment, person_count, "
+                   "person_type) VALUES ") +
+                   rows.join(QLatin1Char(','));
         QVERIFY(execOn(m_doc.database(), sql));
         const QString pdf = m_dir.filePath(QStringLiteral("zwei.pdf"));
         CVdPrintoutReport printout(nullptr, {1, 2});
         QVERIFY(printout.print(CVdPrintout::Pdf, pdf, false, QString()));
         const int pages = pdfPages(pdf);
-        QVERIFY2(pages > 3, qPrintable(QString::number(pages)));
+        QVERIFY2(pages > 5, qPrintable(QString::number(pages)));
         const QString all = pdfText(pdf);
-        for (int i = 0; i < 500; ++i)
-            QVERIFY2(all.contains(QStringLiteral("Zeile %1").arg(i, 4, 10, QLatin1Char('0'))),
-                     qPrintable(QString::number(i)));
+        int at = 0;
+        for (int i = 0; i < 500; ++i) {
+            const QString name = QStringLiteral("Firma %1").arg(i, 4, 10, QLatin1Char('0'));
+            QVERIFY2(all.count(name) == 1 && all.indexOf(name) > at, qPrintable(name));
+            at = all.indexOf(name);
+        }
+        QVERIFY(all.indexOf(QStringLiteral("ohne Firma")) > at);
+        QVERIFY(all.indexOf(QStringLiteral("Summen:")) > all.indexOf(QStringLiteral("ohne Firma")));
+        QVERIFY(all.contains(QStringLiteral("501 Personen")));
         for (int page = 1; page <= pages; ++page) {
             const QString text = pdfText(pdf, page);
             const QString label = page < pages ? QStringLiteral("Seite %1/%2").arg(page).arg(pages - 1)
@@ -185,33 +258,127 @@ private slots:
         }
     }
 
-    // However far down the page the text before it ends, a caption stays on the page of its first lines.
+    // However far down the page the rows before it end, a caption stays on the page of its first line.
+    void captionKeepsItsLines_data()
+    {
+        QTest::addColumn<QString>("filler");   // %1: the number of filler rows
+        QTest::addColumn<QString>("lastFill"); // the last filler row, %1 its index
+        QTest::addColumn<QString>("section");
+        QTest::addColumn<QString>("caption");
+        QTest::addColumn<QString>("firstLine");
+        QTest::newRow("plain text after plain text")
+            << "UPDATE entry SET progress=(WITH RECURSIVE n(i) AS (SELECT 0 UNION ALL SELECT i+1 FROM n "
+               "WHERE i+1<%1) SELECT group_concat('Fortschritt ' || i, char(10)) FROM n)"
+            << "Fortschritt %1"
+            << "UPDATE entry SET interventions='Eingriff eins\nEingriff zwei\nEingriff drei'"
+            << "Eingriffe in Tragwerke:"
+            << "Eingriff eins";
+        QTest::newRow("rich text after workforce rows")
+            << "INSERT INTO entry_workforce (entry_id, pos, comment, person_count, person_type) WITH "
+               "RECURSIVE "
+               "n(i) AS (SELECT 0 UNION ALL SELECT i+1 FROM n WHERE i+1<%1) SELECT 1, i, 'Zeile ' || i, 1, ' "
+               "' "
+               "FROM n"
+            << "Zeile %1"
+            << "UPDATE entry SET progress='<p>Erster <b>Absatz</b></p><p>Zweiter Absatz</p>'"
+            << "Leistungsstand:"
+            << "Erster Absatz";
+    }
     void captionKeepsItsLines()
     {
+        QFETCH(QString, filler);
+        QFETCH(QString, lastFill);
+        QFETCH(QString, section);
+        QFETCH(QString, caption);
+        QFETCH(QString, firstLine);
         bool moved = false;
-        for (int lines = 40; lines <= 80 && !moved; ++lines) {
-            QStringList progress;
-            for (int i = 0; i < lines; ++i)
-                progress << QStringLiteral("Fortschritt %1").arg(i);
-            QVERIFY(execOn(
-                m_doc.database(),
-                {QStringLiteral("UPDATE entry SET progress='%1', interventions='Eingriff eins\nEingriff "
-                                "zwei\nEingriff drei'")
-                     .arg(progress.join(QLatin1Char('\n')))}));
+        for (int rows = 20; rows <= 90 && !moved; ++rows) {
+            QVERIFY(execOn(m_doc.database(), {"DELETE FROM entry_workforce", "UPDATE entry SET progress=' '",
+                                              filler.arg(rows), section}));
             const QString pdf = m_dir.filePath(QStringLiteral("fuss.pdf"));
             CVdPrintoutReport printout(nullptr, {1});
             QVERIFY(printout.print(CVdPrintout::Pdf, pdf, false, QString()));
             const int pages = pdfPages(pdf);
             for (int page = 1; page <= pages; ++page) {
                 const QString text = pdfText(pdf, page);
-                if (text.contains(QStringLiteral("Eingriffe in Tragwerke:"))) {
-                    QVERIFY2(text.contains(QStringLiteral("Eingriff zwei")), qPrintable(text));
-                    moved = page > 1 &&
-                            pdfText(pdf, page - 1).contains(QStringLiteral("Fortschritt %1").arg(lines - 1));
+                if (text.contains(caption)) {
+                    QVERIFY2(text.contains(firstLine), qPrintable(text));
+                    moved = page > 1 && pdfText(pdf, page - 1).contains(lastFill.arg(rows - 1));
                 }
             }
         }
         QVERIFY(moved);
+    }
+
+    // Over-long words, a 20,000-pixel image and a 20,000-pixel table stay inside the body: everything is
+    // printed once, the pages are bounded, and no word lies right of the print area or over the footer.
+    void staysInBody_data()
+    {
+        const QString word = QStringLiteral("abcdefghij").repeated(30);
+        QStringList tableRows;
+        for (int i = 0; i < 1000; ++i)
+            tableRows << QStringLiteral("<tr><td>R%1</td><td>W</td></tr>").arg(i, 4, 10, QLatin1Char('0'));
+        QTest::addColumn<QString>("sql");
+        QTest::addColumn<QStringList>("once");
+        QTest::addColumn<int>("maxPages");
+        QTest::newRow("300-character word")
+            << QStringLiteral("UPDATE entry SET progress='Anfang %1 Ende'").arg(word)
+            << QStringList{"Anfang" + word + "Ende"} << 1;
+        QTest::newRow("long address in a two-column cell")
+            << QStringLiteral("INSERT INTO entry_attendee (entry_id, pos, company_id, comment) VALUES "
+                              "(1, 0, NULL, 'siehe https://example.com/%1')")
+                   .arg(word)
+            << QStringList{"https://example.com/" + word} << 1;
+        QStringList lines;
+        for (int i = 0; i < 150; ++i)
+            lines << QStringLiteral("Zeile%1").arg(i, 3, 10, QLatin1Char('0'));
+        QTest::newRow("a 150-line cell continues over pages")
+            << QStringLiteral("UPDATE entry SET progress='%1'").arg(lines.join(QLatin1Char('\n'))) << lines
+            << 4;
+        QTest::newRow("20,000-pixel image")
+            << "UPDATE entry SET progress='<p>Vorher</p><p><img src=\"fehlt.png\" width=\"300\" "
+               "height=\"20000\"></p><p>Nachher</p>'"
+            << QStringList{"Vorher", "Nachher"} << 3;
+        QStringList cells;
+        for (int i = 0; i < 1000; ++i)
+            cells << QStringLiteral("R%1W").arg(i, 4, 10, QLatin1Char('0'));
+        QTest::newRow("20,000-pixel table")
+            << QStringLiteral("UPDATE entry SET progress='<table border=1>%1</table>'")
+                   .arg(tableRows.join(QString()))
+            << cells << 40;
+    }
+    void staysInBody()
+    {
+        QFETCH(QString, sql);
+        QFETCH(QStringList, once);
+        QFETCH(int, maxPages);
+        // The frame's own words, from a report without content, mark the footer.
+        const QString pdf = m_dir.filePath(QStringLiteral("rand.pdf"));
+        QVERIFY(CVdPrintoutReport(nullptr, {1}).print(CVdPrintout::Pdf, pdf, false, QString()));
+        qreal footerTop = 1e9, right = 0;
+        QSet<QString> footerWords;
+        for (const Word& w : words(pdf))
+            if (w.box.top() > w.pageHeight / 2) {
+                footerTop = qMin(footerTop, w.box.top());
+                footerWords << w.text;
+                right = qMax(right, w.box.right());
+            }
+        QVERIFY(!footerWords.isEmpty());
+
+        QVERIFY(execOn(m_doc.database(), {sql, "UPDATE entry SET special_incidents='Danach'"}));
+        QVERIFY(CVdPrintoutReport(nullptr, {1}).print(CVdPrintout::Pdf, pdf, false, QString()));
+        const int pages = pdfPages(pdf);
+        QVERIFY2(pages >= 1 && pages <= maxPages, qPrintable(QString::number(pages)));
+        const QString text = pdfText(pdf).remove(QRegularExpression(QStringLiteral("\\s")));
+        for (const QString& s : once + QStringList{"Danach"})
+            QVERIFY2(text.count(s) == 1, qPrintable(s));
+        const QRegularExpression pageLabel(QStringLiteral("^\\d+/\\d+$"));
+        for (const Word& w : words(pdf)) {
+            QVERIFY2(w.box.right() <= right + 0.5, qPrintable(w.text));
+            const bool footer = footerWords.contains(w.text) || pageLabel.match(w.text).hasMatch();
+            QVERIFY2(w.box.bottom() <= footerTop || (footer && w.box.top() >= footerTop - 0.5),
+                     qPrintable(w.text));
+        }
     }
 
     // An existing read-only PDF is refused with a message and stays as it was; nothing is left beside it.
@@ -233,6 +400,35 @@ private slots:
     }
 
 private:
+    struct Word
+    {
+        QString text;
+        QRectF box;
+        qreal pageHeight;
+    };
+    // Every word of a PDF with its box in points, as pdftotext -bbox reports it.
+    static QList<Word> words(const QString& pdf)
+    {
+        QList<Word> found;
+        qreal pageHeight = 0;
+        const QRegularExpression tag(QStringLiteral(
+            "<page width=\"[\\d.]+\" height=\"([\\d.]+)\">|<word xMin=\"([\\d.]+)\" yMin=\"([\\d.]+)\" "
+            "xMax=\"([\\d.]+)\" yMax=\"([\\d.]+)\">([^<]*)</word>"));
+        auto it = tag.globalMatch(tool(QStringLiteral("pdftotext"), {QStringLiteral("-bbox"), pdf, "-"}));
+        while (it.hasNext()) {
+            const auto m = it.next();
+            if (!m.captured(1).isEmpty()) {
+                pageHeight = m.captured(1).toDouble();
+                continue;
+            }
+            found << Word{m.captured(6),
+                          QRectF(QPointF(m.captured(2).toDouble(), m.captured(3).toDouble()),
+                                 QPointF(m.captured(4).toDouble(), m.captured(5).toDouble())),
+                          pageHeight};
+        }
+        return found;
+    }
+
     QString printed(const QList<int>& ids)
     {
         const QString pdf = m_dir.filePath(QStringLiteral("bericht.pdf"));
