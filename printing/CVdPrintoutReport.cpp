@@ -596,9 +596,14 @@ QVector<CVdPrintoutReport::Line> CVdPrintoutReport::cell_lines(QPainter& painter
         if (t.isEmpty())
             continue;
         const QFont f = run.hasFont ? run.font : font;
-        painter.setFont(f);
         const int height = QFontMetrics(f, painter.device()).lineSpacing();
-        for (const QString& l : break_line(painter, width, t).split(QLatin1Char('\n')))
+        const QString key = f.key() + QLatin1Char('|') + QString::number(width) + QLatin1Char('|') + t;
+        auto it = m_wrapped.constFind(key);
+        if (it == m_wrapped.constEnd()) {
+            painter.setFont(f);
+            it = m_wrapped.insert(key, break_line(painter, width, t).split(QLatin1Char('\n')));
+        }
+        for (const QString& l : it.value())
             lines << Line{l, f, height};
     }
     return lines;
@@ -642,13 +647,12 @@ void CVdPrintoutReport::draw_cell(QPainter& painter, const RowLayout& row, int c
     for (int i = from; i < qMin(to, lines.size()); ++i) {
         const Line& line = lines.at(i);
         if (m_drawing) {
+            // Lines are wrapped to the cell's width, so they need no clipping (which costs a
+            // graphics state per line in a PDF).
             const QRect rect = cell_rect(row, column, y, line.height);
             painter.setFont(line.font);
-            painter.save();
-            painter.setClipRect(rect);
             painter.drawText(rect, row.alignment.at(column) | Qt::AlignBottom | Qt::TextSingleLine,
                              line.text);
-            painter.restore();
         }
         y += line.height;
     }
@@ -1073,6 +1077,7 @@ bool CVdPrintoutReport::print(Output target, const QString& fileName, bool askFo
         currentPage = 1;
         m_drawing = true;
         print_document(painter);
+        m_wrapped.clear();
     }
     painter.end();
     return after_print();

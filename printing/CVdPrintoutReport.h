@@ -3,6 +3,7 @@
 #include "printing/CPhoto.h"
 #include "printing/CVdPrintout.h"
 
+#include <QHash>
 #include <QList>
 #include <QMap>
 #include <QPair>
@@ -132,6 +133,9 @@ private:
     int m_columnGap = 0, m_rowStep = 0, m_captionWidth = 0;
     QFont m_captionFont;
     bool m_drawing = false;
+    // Wrapped lines per font, width and text: the drawing pass reuses what the measuring pass
+    // laid out, which also keeps both passes' breaks identical.
+    QHash<QString, QStringList> m_wrapped;
     int m_y = 0;
     bool m_drawnSinceSeparator = false;
 
