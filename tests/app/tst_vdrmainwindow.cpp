@@ -16,6 +16,7 @@
 #include <QDir>
 #include <QDockWidget>
 #include <QLabel>
+#include <QLineEdit>
 #include <QLockFile>
 #include <QMenu>
 #include <QMenuBar>
@@ -185,6 +186,9 @@ private slots:
         QVERIFY(!action->associatedWidgets().isEmpty());
         // Commands that ask for a file are cancelled.
         m_prompt.expectFileName(QString());
+        // The report selection is closed as the user would.
+        if (target == QLatin1String("actionFilePrintEntries"))
+            clickWhenShown(QStringLiteral("pushButtonCancel"));
         QSignalSpy triggered(action, &QAction::triggered);
         QTest::keySequence(m_window.get(), keys);
         // Commands of later features are bound already, and wait disabled.
@@ -774,7 +778,7 @@ private slots:
     void printCommands_data()
     {
         QTest::addColumn<QString>("command");
-        QTest::addColumn<int>("diary"); // 0 none, 1 without reports, 2 with locked report 012 by AB
+        QTest::addColumn<int>("diary"); // 0 none, 1 without reports, 2 with the draft 012 by AB
         QTest::addColumn<QString>("outcome");
         QTest::addColumn<QString>("proposal"); // the PDF name the save dialog proposes
         QTest::newRow("preview, no diary") << "on_actionFilePreviewEntry_triggered" << 0 << ""
@@ -790,9 +794,9 @@ private slots:
         QTest::newRow("preview") << "on_actionFilePreviewEntry_triggered" << 2 << "preview"
                                  << "";
         QTest::newRow("pdf") << "on_actionFilePDFCurEntry_triggered" << 2 << "pdf"
-                             << "Projekt - Bericht 012-AB.pdf";
+                             << "Projekt - Bericht 012-AB (Entwurf).pdf";
         QTest::newRow("list row, pdf") << "slot_dockWidgetEntryList_doEntryAllPdf" << 2 << "pdf"
-                                       << "Projekt - Bericht 012-AB.pdf";
+                                       << "Projekt - Bericht 012-AB (Entwurf).pdf";
         QTest::newRow("list row, printer") << "slot_dockWidgetEntryList_doEntryAllPrint" << 2 << "viewer"
                                            << "";
         QTest::newRow("chosen reports, pdf") << "on_actionFilePrintEntries_triggered" << 2 << "pdf"
@@ -820,10 +824,11 @@ private slots:
             const QString path = folder + QStringLiteral("/Projekt.vd2");
             QFile::remove(path);
             QVERIFY(createDiary(path));
-            QVERIFY(
-                execSql(path, {"UPDATE vdr SET name = 'Projekt'",
-                               diary == 1 ? "DELETE FROM entry"
-                                          : "UPDATE entry SET number = '012', user_id = 'AB', locked = 1"}));
+            QVERIFY(execSql(path,
+                            {"UPDATE vdr SET name = 'Projekt'",
+                             diary == 1
+                                 ? "DELETE FROM entry"
+                                 : "UPDATE entry SET number = '012 (Entwurf)', user_id = 'AB', locked = 0"}));
             QCOMPARE(m_window->openDocument(path, false, true), 0);
         }
         QCOMPARE(m_window->ui().action(QStringLiteral("actionFilePDFCurEntry"))->isEnabled(), diary > 0);
@@ -832,8 +837,13 @@ private slots:
         if (outcome == QLatin1String("warning"))
             m_prompt.expect(QStringLiteral("Hinweis"),
                             QStringLiteral("Sie haben keinen Bautagesbericht ausgewählt!"));
-        if (outcome == QLatin1String("pdf"))
+        if (outcome == QLatin1String("pdf")) {
             m_prompt.expectFileName(pdf);
+            // Typed but not yet stored: the printout must see it all the same.
+            auto* weather = m_window->findChild<QLineEdit*>(QStringLiteral("entrydataEnvWeather1"));
+            weather->setFocus();
+            QTest::keyClicks(weather, QStringLiteral("heiter"));
+        }
         if (command == QLatin1String("on_actionFilePrintEntries_triggered") && diary > 0)
             clickWhenShown(QStringLiteral("pushButtonPdf"));
         if (command.startsWith(QLatin1String("slot_")))
@@ -844,7 +854,8 @@ private slots:
         const QString temporary = m_window->document()->temporaryFolder();
         if (outcome == QLatin1String("pdf")) {
             QCOMPARE(m_prompt.fileProposals, QStringList{QDir::toNativeSeparators(folder + "/" + proposal)});
-            QVERIFY(pdfText(pdf).contains(QStringLiteral("Baubericht-Nr.: 012-AB")));
+            const QString text = pdfText(pdf);
+            QVERIFY(text.contains(QStringLiteral("Baubericht-Nr.: 012-AB")) && text.contains("heiter"));
             QCOMPARE(opened, QStringList{pdf});
         } else if (outcome == QLatin1String("viewer")) {
             QTRY_COMPARE(opened, QStringList{temporary + QStringLiteral("/Varduna.pdf")});
