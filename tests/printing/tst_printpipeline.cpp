@@ -71,6 +71,9 @@ private slots:
     {
         m_prompt.reset();
         m_urls.clear();
+        m_opened.clear();
+        VDRPrintHooks::setOpenFile([this](const QString& path) { m_opened << path; });
+        VDRPrintHooks::setPreview(nullptr);
     }
     void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
@@ -86,8 +89,6 @@ private slots:
     void printerWritesIntoAFolderOfItsOwn()
     {
         QFETCH(QString, folder);
-        QStringList opened;
-        VDRPrintHooks::setOpenFile([&](const QString& path) { opened << path; });
         QString given;
         if (folder == QLatin1String("document")) {
             given = m_doc.temporaryFolder();
@@ -99,7 +100,7 @@ private slots:
         CVdPrintoutReport printout(nullptr, {1});
         printout.setTemporaryFolder(given);
         QVERIFY(printout.print(CVdPrintout::Printer, QString(), false, QString()));
-        QVERIFY(opened.isEmpty()); // not before the viewer's moment
+        QVERIFY(m_opened.isEmpty()); // not before the viewer's moment
         const QString pdf = printout.pdfFile();
         const QString expectedFolder =
             folder == QLatin1String("document") ? given : CVdPrintout::privateTemporaryFolder();
@@ -108,8 +109,7 @@ private slots:
         QVERIFY(!(QFileInfo(expectedFolder).permissions() & QFileDevice::WriteOther));
         QVERIFY(filesIn(m_sharedTemp, QStringLiteral("*.pdf")).isEmpty());
         QVERIFY(pdfText(pdf).contains(QStringLiteral("012-AB")));
-        QTRY_COMPARE(opened, QStringList{pdf});
-        VDRPrintHooks::setOpenFile(nullptr);
+        QTRY_COMPARE(m_opened, QStringList{pdf});
     }
 
     void previewPagesLiveWhileShown_data()
@@ -172,8 +172,6 @@ private slots:
         QCOMPARE(m_urls.first().toLocalFile(), path);
         QTRY_VERIFY(timer.isNull());
         QDesktopServices::unsetUrlHandler(QStringLiteral("file"));
-        VDRPrintHooks::setOpenFile(nullptr);
-        VDRPrintHooks::setPreview(nullptr);
         VDRPrintHooks::setPrintDialog(nullptr);
     }
 
@@ -216,6 +214,7 @@ private:
     VDRDocument m_doc;
     VDRTestPrompt m_prompt;
     QList<QUrl> m_urls;
+    QStringList m_opened;
 };
 
 QTEST_MAIN(TestPrintPipeline)
