@@ -98,7 +98,8 @@ void TestCli::helpListsCommandsAndExitCodes()
 {
     const Run r = cli({QStringLiteral("--help")});
     QCOMPARE(r.exitCode, 0);
-    for (const char* word : {"new FILE", "info FILE", "check FILE", "--yes", "held by a running instance"})
+    for (const char* word :
+         {"new FILE", "info FILE", "check FILE", "preview FILE", "--yes", "held by a running instance"})
         QVERIFY2(r.out.contains(QLatin1String(word)), word);
 }
 
@@ -108,6 +109,7 @@ void TestCli::usageErrors_data()
     QTest::newRow("nothing") << QStringList();
     QTest::newRow("no file") << QStringList{"info"};
     QTest::newRow("unknown command") << QStringList{"frobnicate", "x.vd2"};
+    QTest::newRow("preview without --out") << QStringList{"preview", "x.vd2"};
 }
 
 void TestCli::usageErrors()
