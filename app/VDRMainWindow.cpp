@@ -24,6 +24,7 @@
 #include "editing/VdEventsController.h"
 #include "printing/CVdPrintFirmList.h"
 #include "printing/CVdPrintoutFormblatt.h"
+#include "printing/CVdPrintoutReport.h"
 #include "printing/CVdTexts.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
@@ -44,6 +45,7 @@
 #include <QMessageBox>
 #include <QMetaMethod>
 #include <QPainter>
+#include <QRegularExpression>
 #include <QScreen>
 #include <QSettings>
 #include <QShortcut>
@@ -100,7 +102,11 @@ const char* const kWiredActions[] = {"actionFileNew",
                                      "actionEntryGotoLast",
                                      "actionEntryAlterNumber",
                                      "actionEntryChangeUID",
-                                     "actionSettingsChangeUID"};
+                                     "actionSettingsChangeUID",
+                                     "actionFilePrintCurEntry",
+                                     "actionFilePDFCurEntry",
+                                     "actionFilePreviewEntry",
+                                     "actionFilePrintEntries"};
 // Commands that need an open document.
 const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionFileSaveAs",
@@ -124,7 +130,11 @@ const char* const kDocumentActions[] = {"actionFileSave",
                                         "actionEntryGotoNext",
                                         "actionEntryGotoLast",
                                         "actionEntryAlterNumber",
-                                        "actionEntryChangeUID"};
+                                        "actionEntryChangeUID",
+                                        "actionFilePrintCurEntry",
+                                        "actionFilePDFCurEntry",
+                                        "actionFilePreviewEntry",
+                                        "actionFilePrintEntries"};
 // Commands the demo project refuses; disabled there rather than offered and refused.
 const char* const kSaveActions[] = {"actionFileSave", "actionFileSaveAs"};
 
@@ -271,6 +281,10 @@ VDRMainWindow::VDRMainWindow(QWidget* parent)
             &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllDelete);
     connect(m_entryList, &VDREntryListWidget::doEntryAllChangeUID, this,
             &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllChangeUID);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllPrint, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllPrint);
+    connect(m_entryList, &VDREntryListWidget::doEntryAllPdf, this,
+            &VDRMainWindow::slot_dockWidgetEntryList_doEntryAllPdf);
     m_dockEntryList->installEventFilter(this);
     m_dockEntryDate->installEventFilter(this);
 
@@ -1319,4 +1333,105 @@ void VDRMainWindow::on_actionEntryChangeUID_triggered()
 void VDRMainWindow::on_actionSettingsChangeUID_triggered()
 {
     entryWidget()->actionSettingsChangeUID();
+}
+
+bool VDRMainWindow::readyToPrint()
+{
+    if (!m_document->isStateValid())
+        return false;
+    VDREntryWidget* form = reportForm(this);
+    if (form && form->document() == m_document)
+        form->actionAskForSubmit();
+    return true;
+}
+
+int VDRMainWindow::currentEntryRow()
+{
+    VDREntryWidget* form = reportForm(this);
+    if (form && form->document() == m_document)
+        return form->currentEntryId() > 0 ? form->currentRow() : -1;
+    return m_entryList->currentRow();
+}
+
+void VDRMainWindow::printCurrentEntry(int output)
+{
+    if (!readyToPrint())
+        return;
+    const int row = currentEntryRow();
+    if (row < 0) {
+        VDRPrompt::warning(tr("Hinweis"), tr("Sie haben keinen Bautagesbericht ausgewählt!"));
+        return;
+    }
+    printEntryRow(row, output);
+}
+
+void VDRMainWindow::printEntryRow(int row, int output)
+{
+    VDRAllEntryTableModel* model = m_document->modelEntryAll();
+    if (!model || row < 0 || row >= model->rowCount())
+        return;
+    const int id = model->data(row, QStringLiteral("id"), Qt::EditRole).toInt();
+    QString name;
+    if (output == CVdPrintout::Pdf) {
+        name =
+            tr("%1 - Bericht %2.pdf").arg(m_document->projectName(), m_document->entryNumberWithUserId(row));
+        // The project's name or the author's id may hold characters that no file name can.
+        name.replace(QRegularExpression(QStringLiteral("[/\\\\:*?\"<>|\\x00-\\x1f]")), QStringLiteral("_"));
+    }
+    printEntries({id}, output, name);
+}
+
+void VDRMainWindow::printEntries(const QList<int>& ids, int output, const QString& pdfFileName)
+{
+    const QString diary = m_document->getFilepath();
+    CVdPrintoutReport printout(this, ids);
+    printout.setTemporaryFolder(m_document->temporaryFolder());
+    printout.print(CVdPrintout::Output(output), pdfFileName, true,
+                   diary.isEmpty() ? QString() : QFileInfo(diary).absolutePath());
+}
+
+void VDRMainWindow::on_actionFilePrintCurEntry_triggered()
+{
+    printCurrentEntry(CVdPrintout::Printer);
+}
+
+void VDRMainWindow::on_actionFilePDFCurEntry_triggered()
+{
+    printCurrentEntry(CVdPrintout::Pdf);
+}
+
+void VDRMainWindow::on_actionFilePreviewEntry_triggered()
+{
+    printCurrentEntry(CVdPrintout::Preview);
+}
+
+void VDRMainWindow::on_actionFilePrintEntries_triggered()
+{
+    if (!readyToPrint())
+        return;
+    QList<int> ids;
+    QString name;
+    const int mode =
+        currentEntryRow() >= 0 ? VDREntrySelectorWidget::CurrentEntry : VDREntrySelectorWidget::AllEntries;
+    const int result = displayEntrySelector(ids, mode, QString(), &name);
+    if (result == VDREntrySelectorWidget::Cancelled)
+        return;
+    if (ids.isEmpty()) {
+        VDRPrompt::warning(tr("Hinweis"), tr("Sie haben keinen Bautagesbericht ausgewählt!"));
+        return;
+    }
+    // "OK" prints, as "Drucken" does.
+    printEntries(ids, result == VDREntrySelectorWidget::Pdf ? CVdPrintout::Pdf : CVdPrintout::Printer, name);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllPrint(int row)
+{
+    if (readyToPrint())
+        printEntryRow(row, CVdPrintout::Printer);
+}
+
+void VDRMainWindow::slot_dockWidgetEntryList_doEntryAllPdf(int row)
+{
+    if (readyToPrint())
+        printEntryRow(row, CVdPrintout::Pdf);
 }

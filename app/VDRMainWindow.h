@@ -99,6 +99,8 @@ public slots:
     void slot_dockWidgetEntryList_doEntryAllCopy(int row);
     void slot_dockWidgetEntryList_doEntryAllDelete(int row);
     void slot_dockWidgetEntryList_doEntryAllChangeUID(int row);
+    void slot_dockWidgetEntryList_doEntryAllPrint(int row);
+    void slot_dockWidgetEntryList_doEntryAllPdf(int row);
 
 private slots:
     void on_actionFileNew_triggered();
@@ -140,6 +142,10 @@ private slots:
     void on_actionEntryAlterNumber_triggered();
     void on_actionEntryChangeUID_triggered();
     void on_actionSettingsChangeUID_triggered();
+    void on_actionFilePrintCurEntry_triggered();
+    void on_actionFilePDFCurEntry_triggered();
+    void on_actionFilePreviewEntry_triggered();
+    void on_actionFilePrintEntries_triggered();
 
 protected:
     bool event(QEvent* event) override;
@@ -163,6 +169,14 @@ private:
     void syncCompleterTexts();
     // The master-data dialog on one of its tabs; the window shows the result after OK.
     void showProjectData(int tab, bool printButton);
+    // A diary is open and the form's pending edits are in the working copy: printing may read it.
+    bool readyToPrint();
+    // The row of the report shown, -1 for none.
+    int currentEntryRow();
+    // 'output' is a CVdPrintout::Output; the PDF name is proposed in a dialog.
+    void printCurrentEntry(int output);
+    void printEntryRow(int row, int output);
+    void printEntries(const QList<int>& ids, int output, const QString& pdfFileName);
 
     Ui_VDRMainWindowClass m_ui;
     VDRDocument* m_document;

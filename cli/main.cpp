@@ -7,6 +7,7 @@
 #include "document/VDRFileOps.h"
 #include "printing/CVdConfig.h"
 #include "printing/CVdPrintoutReport.h"
+#include "printing/VDRPrintHooks.h"
 #include "sync/VDRMasterDataExport.h"
 #include "sync/VDRReportSynchronisation.h"
 
@@ -91,6 +92,11 @@ const char* const kHelp =
     "                      report, \"PROJECT - Berichte.pdf\" for several; an existing file there\n"
     "                      is replaced. Prints the path written. Opens FILE as info does and\n"
     "                      saves nothing.\n"
+    "  preview FILE --out DIR [--reports all|locked|drafts|NUMBER|FROM-TO]\n"
+    "                      Write the print preview's page images of the chosen reports (as for\n"
+    "                      pdf) into DIR as picture_0001.jpeg and on, one per page, replacing\n"
+    "                      older ones of those names; DIR is created when missing. Prints the\n"
+    "                      paths written. Opens FILE as info does and saves nothing.\n"
     "  follow-up FILE NEW.vd2\n"
     "                      Start a follow-up diary NEW.vd2 with FILE's project data, companies and\n"
     "                      address lists, knowing FILE's report numbers, with one first report;\n"
@@ -126,11 +132,11 @@ const char* const kHelp =
     "  2  refused or failed (the message on stderr says why)\n"
     "  3  cancelled: a question was answered with its cancelling choice (try --yes)\n"
     "\n"
-    "Exit codes of pdf:\n"
+    "Exit codes of pdf and preview:\n"
     "  0  written\n"
     "  1  usage error\n"
     "  2  refused or failed: the diary cannot be opened (held by a running instance),\n"
-    "     the PDF cannot be written, or no report matches --reports\n"
+    "     the PDF or a page image cannot be written, or no report matches --reports\n"
     "\n"
     "Exit codes of restore:\n"
     "  0  restored\n"
@@ -526,6 +532,17 @@ bool chooseReports(VDRDocument& doc, const QString& choice, QList<int>& ids, QSt
     return true;
 }
 
+// Dates in the language the application would print them in; the setting is only read.
+void usePrintingLanguage()
+{
+    QLocale::Language systemLanguage = QLocale::system().language();
+    if (systemLanguage != QLocale::English && systemLanguage != QLocale::Spanish)
+        systemLanguage = QLocale::German;
+    QLocale::setDefault(QLocale(
+        QLocale::Language(QSettings().value(QStringLiteral("language"), int(systemLanguage)).toInt())));
+    CVdConfig::self()->reload();
+}
+
 int cmdPdf(const QString& file, const QString& choice, const QString& target)
 {
     VDRDocument doc;
@@ -554,19 +571,75 @@ int cmdPdf(const QString& file, const QString& choice, const QString& target)
         name.replace(QRegularExpression(QStringLiteral("[/\\\\:*?\"<>|]")), QStringLiteral("_"));
         out4 = QFileInfo(file).absoluteDir().filePath(name);
     }
-    // Dates in the language the application would print them in; the setting is only read.
-    QLocale::Language systemLanguage = QLocale::system().language();
-    if (systemLanguage != QLocale::English && systemLanguage != QLocale::Spanish)
-        systemLanguage = QLocale::German;
-    QLocale::setDefault(QLocale(
-        QLocale::Language(QSettings().value(QStringLiteral("language"), int(systemLanguage)).toInt())));
-    CVdConfig::self()->reload();
+    usePrintingLanguage();
     CVdPrintoutReport printout(nullptr, ids);
     const bool written = printout.print(CVdPrintout::Pdf, out4, false, QString());
     doc.closeDocument();
     if (!written)
         return ExitRefused;
     out() << printout.pdfFile() << "\n";
+    out().flush();
+    return ExitOk;
+}
+
+int cmdPreview(const QString& file, const QString& choice, const QString& outDir)
+{
+    if (outDir.isEmpty()) {
+        err(QStringLiteral("varduna-cli: preview needs --out DIR; see varduna-cli --help"));
+        return ExitUsage;
+    }
+    VDRDocument doc;
+    // Printing reads only: a crashed session's working copy stays for its owner, nothing is saved.
+    doc.setInspecting(true);
+    if (!openForCommand(doc, file))
+        return ExitRefused;
+    QList<int> ids;
+    QStringList numbers;
+    if (!chooseReports(doc, choice, ids, numbers)) {
+        doc.closeDocument();
+        err(QStringLiteral("varduna-cli: --reports takes all, locked, drafts, NUMBER or FROM-TO"));
+        return ExitUsage;
+    }
+    if (ids.isEmpty()) {
+        doc.closeDocument();
+        VDRPrompt::warning(QObject::tr("Drucken"), QObject::tr("Keine Bautagesberichte ausgewählt."));
+        return ExitRefused;
+    }
+    const QDir dir(QFileInfo(outDir).absoluteFilePath());
+    if (!QDir().mkpath(dir.path())) {
+        doc.closeDocument();
+        VDRPrompt::critical(QObject::tr("Dateifehler"),
+                            QObject::tr("Der Ordner\n%1\nkann nicht angelegt werden.")
+                                .arg(QDir::toNativeSeparators(dir.path())));
+        return ExitRefused;
+    }
+    usePrintingLanguage();
+    // The preview's pages live in the diary's temporary folder only while it is shown: copied out here.
+    QStringList written;
+    bool copied = true;
+    VDRPrintHooks::setPreview([&](const QStringList& pages) {
+        for (const QString& page : pages) {
+            const QString target = dir.filePath(QFileInfo(page).fileName());
+            if (!copied || !VDRFileOps::copyDurably(page, target)) {
+                if (copied)
+                    VDRPrompt::critical(QObject::tr("Dateifehler"),
+                                        QObject::tr("Die Datei\n%1\nkann nicht geschrieben werden.")
+                                            .arg(QDir::toNativeSeparators(target)));
+                copied = false;
+                continue;
+            }
+            written << target;
+        }
+    });
+    CVdPrintoutReport printout(nullptr, ids);
+    printout.setTemporaryFolder(doc.temporaryFolder());
+    const bool printed = printout.print(CVdPrintout::Preview, QString(), false, QString());
+    VDRPrintHooks::setPreview(nullptr);
+    doc.closeDocument();
+    if (!printed || !copied || written.isEmpty())
+        return ExitRefused;
+    for (const QString& path : qAsConst(written))
+        out() << path << "\n";
     out().flush();
     return ExitOk;
 }
@@ -584,7 +657,7 @@ int main(int argc, char* argv[])
 {
     qInstallMessageHandler(quietMessageHandler);
     // Printing needs fonts and a paint engine; a command-line tool never shows a window.
-    const bool printing = argc > 1 && qstrcmp(argv[1], "pdf") == 0;
+    const bool printing = argc > 1 && (qstrcmp(argv[1], "pdf") == 0 || qstrcmp(argv[1], "preview") == 0);
     if (printing && !qEnvironmentVariableIsSet("QT_QPA_PLATFORM"))
         qputenv("QT_QPA_PLATFORM", "offscreen");
     std::unique_ptr<QCoreApplication> app(printing ? new QGuiApplication(argc, argv)
@@ -614,6 +687,13 @@ int main(int argc, char* argv[])
     if (pdfCommand &&
         (!takeValue(QStringLiteral("--reports"), reports) || !takeValue(QStringLiteral("-o"), pdfOut))) {
         err(QStringLiteral("varduna-cli: --reports and -o take one value each; see varduna-cli --help"));
+        return ExitUsage;
+    }
+    QString previewOut;
+    const bool previewCommand = args.value(0) == QLatin1String("preview");
+    if (previewCommand && (!takeValue(QStringLiteral("--reports"), reports) ||
+                           !takeValue(QStringLiteral("--out"), previewOut))) {
+        err(QStringLiteral("varduna-cli: --reports and --out take one value each; see varduna-cli --help"));
         return ExitUsage;
     }
     if (args.contains(QStringLiteral("-h")) || args.contains(QStringLiteral("--help"))) {
@@ -655,6 +735,8 @@ int main(int argc, char* argv[])
         result = cmdCompact(file);
     else if (command == QLatin1String("pdf"))
         result = cmdPdf(file, reports, pdfOut);
+    else if (command == QLatin1String("preview"))
+        result = cmdPreview(file, reports, previewOut);
     else if (command == QLatin1String("companies"))
         result = cmdCompanies(file, json);
     else if (command == QLatin1String("export-masterdata") && twoFiles)

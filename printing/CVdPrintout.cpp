@@ -6,6 +6,7 @@
 #include "document/VDRPrompt.h"
 #include "printing/CVdConfig.h"
 #include "printing/CVdTexts.h"
+#include "printing/PDFReaderTimer.h"
 #include "printing/VDRPrintHooks.h"
 
 #include <QCoreApplication>
@@ -19,8 +20,13 @@
 #include <QSettings>
 #include <QSqlQuery>
 #include <QStandardPaths>
+#include <QTemporaryDir>
 #include <QTextLayout>
 #include <QTimer>
+
+#ifdef Q_OS_UNIX
+#include <unistd.h>
+#endif
 
 const char* const CVdPrintout::TestText = "Xy";
 const int CVdPrintout::singleLineFlags = Qt::AlignLeft | Qt::AlignBottom | Qt::TextSingleLine;
@@ -41,6 +47,20 @@ QString fileErrorText(const QString& path)
 QString fileErrorTitle()
 {
     return QCoreApplication::translate("CVdPrintout", "Dateifehler");
+}
+
+// A folder nobody else can put files or links into: a real folder of this user's, not writable by
+// all.
+bool isOwnFolder(const QString& folder)
+{
+    const QFileInfo info(folder);
+    if (folder.isEmpty() || !info.isDir() || info.isSymLink())
+        return false;
+#ifdef Q_OS_UNIX
+    if (info.ownerId() != ::getuid())
+        return false;
+#endif
+    return !(info.permissions() & QFileDevice::WriteOther);
 }
 } // namespace
 
@@ -141,9 +161,22 @@ QString CVdPrintout::pdfDirSettingsKey(int kind)
     }
 }
 
+QString CVdPrintout::privateTemporaryFolder()
+{
+    // Lives as long as the process: the viewer may read its PDF long after the job ended.
+    static QTemporaryDir folder(QDir::tempPath() + QStringLiteral("/varduna-print-XXXXXX"));
+    return folder.isValid() ? folder.path() : QString();
+}
+
+QString CVdPrintout::temporaryFolder() const
+{
+    return isOwnFolder(m_temporaryFolder) ? m_temporaryFolder : privateTemporaryFolder();
+}
+
 bool CVdPrintout::init(Output o, const QString& fileName, bool askForFileName)
 {
     output = o;
+    m_openInViewer = false;
     printer = std::make_unique<QPrinter>(QPrinter::HighResolution);
     printer->setColorMode(QPrinter::Color);
     if (o == Printer) {
@@ -171,13 +204,29 @@ bool CVdPrintout::init(Output o, const QString& fileName, bool askForFileName)
     pageImage.setDotsPerMeterY(dpm);
     pageImage.fill(Qt::white);
     pictureFiles.clear();
+    m_pictureNumber = 0;
+    m_pageUnsaved = true;
     update_margins();
+    return true;
+}
+
+bool CVdPrintout::setOutput4Viewer()
+{
+    const QString folder = temporaryFolder();
+    if (folder.isEmpty()) {
+        VDRPrompt::critical(fileErrorTitle(), fileErrorText(QDir::tempPath() + tr("/Varduna.pdf")));
+        return false;
+    }
+    if (!setOutput4PDF(folder + tr("/Varduna.pdf"), false, 0, QString()))
+        return false;
+    m_openInViewer = true;
     return true;
 }
 
 bool CVdPrintout::setOutput4PDF(const QString& fileName, bool askForFileName, int kind, QString defaultDir)
 {
     output = Pdf;
+    m_openInViewer = false;
     const QString key = pdfDirSettingsKey(kind);
     QString dir;
     if (key.isEmpty()) {
@@ -513,6 +562,7 @@ void CVdPrintout::new_page(QPainter& painter)
     if (output == Preview) {
         save_picture();
         pageImage.fill(Qt::white);
+        m_pageUnsaved = true;
     } else if (printer) {
         printer->newPage();
     }
@@ -533,7 +583,11 @@ void CVdPrintout::save_picture()
         QPainter p(&sheet);
         p.drawImage((sheet.width() - scaled.width()) / 2, (sheet.height() - scaled.height()) / 2, scaled);
     }
-    const QString path = QDir::temp().filePath(QString::asprintf("picture_%04d.jpeg", currentPage));
+    m_pageUnsaved = false;
+    const QString folder = temporaryFolder();
+    if (folder.isEmpty())
+        return;
+    const QString path = QDir(folder).filePath(QString::asprintf("picture_%04d.jpeg", ++m_pictureNumber));
     QFile::remove(path);
     if (sheet.save(path, "JPEG"))
         pictureFiles << path;
@@ -543,7 +597,13 @@ bool CVdPrintout::after_print()
 {
     if (printer && printer->printerState() == QPrinter::Active) {
         m_waitOver = false;
-        QTimer::singleShot(30000, this, &CVdPrintout::timeout);
+        QTimer limit;
+        limit.setSingleShot(true);
+        connect(&limit, &QTimer::timeout, this, &CVdPrintout::timeout);
+        limit.start(30000);
+        // The printer's state changes without an event of its own; the tick makes the loop look again.
+        QTimer tick;
+        tick.start(50);
         QEventLoop loop;
         while (printer->printerState() == QPrinter::Active && !m_waitOver)
             loop.processEvents(QEventLoop::AllEvents | QEventLoop::WaitForMoreEvents);
@@ -555,7 +615,8 @@ bool CVdPrintout::after_print()
     }
     bool ok = true;
     if (output == Preview) {
-        if (pictureFiles.size() < pageCount)
+        // The page in progress; a count against pageCount would miss it after several reports.
+        if (m_pageUnsaved)
             save_picture();
         VDRPrintHooks::preview(pictureFiles);
         for (const QString& file : qAsConst(pictureFiles))
@@ -571,6 +632,8 @@ bool CVdPrintout::after_print()
         m_pdfTemporary.clear();
         if (ok && openAfterPrint)
             VDRPrintHooks::openFile(pdfFileName);
+        if (ok && m_openInViewer)
+            (new PDFReaderTimer(pdfFileName, QCoreApplication::instance()))->start(100);
     }
     return ok;
 }

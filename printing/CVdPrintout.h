@@ -57,6 +57,15 @@ public:
     void new_page(QPainter& painter);
     // Ends the job; false when a PDF could not be put in place.
     bool after_print();
+    // The daily report's way to the printer: a PDF in the temporary folder, written without a
+    // dialog and handed to the system's viewer shortly after the job ends.
+    bool setOutput4Viewer();
+
+    // Where the viewer's PDF and the preview's page images go: the open diary's own temporary
+    // folder. Without one (or one that is not ours alone) a folder private to this process.
+    void setTemporaryFolder(const QString& folder) { m_temporaryFolder = folder; }
+    QString temporaryFolder() const;
+    static QString privateTemporaryFolder();
 
     QSize page_size() const;
 
@@ -141,4 +150,9 @@ private:
     QString m_pdfTemporary;
     bool m_waitOver = false;
     bool m_busy = false;
+    QString m_temporaryFolder;
+    bool m_openInViewer = false;
+    // Page images are numbered through the job: page numbers restart with every report.
+    int m_pictureNumber = 0;
+    bool m_pageUnsaved = false;
 };

@@ -1040,8 +1040,13 @@ bool CVdPrintoutReport::print(Output target, const QString& fileName, bool askFo
 {
     if (m_entryIds.isEmpty())
         return false;
-    const bool ready = target == Pdf ? setOutput4PDF(fileName, askForFileName, 3, defaultDir)
-                                     : init(target, fileName, askForFileName);
+    bool ready = false;
+    if (target == Printer)
+        ready = setOutput4Viewer(); // the user prints from the system's viewer
+    else if (target == Pdf)
+        ready = setOutput4PDF(fileName, askForFileName, 3, defaultDir);
+    else
+        ready = init(target, fileName, askForFileName);
     if (!ready)
         return false;
     QPainter painter;

@@ -8,18 +8,22 @@
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 #include "editing/VDRCompleter.h"
+#include "editing/VDREntrySelectorWidget.h"
+#include "printing/VDRPrintHooks.h"
 
 #include <QAction>
 #include <QDesktopServices>
 #include <QDir>
 #include <QDockWidget>
 #include <QLabel>
+#include <QLineEdit>
 #include <QLockFile>
 #include <QMenu>
 #include <QMenuBar>
 #include <QMessageBox>
 #include <QProcess>
 #include <QPushButton>
+#include <QScopeGuard>
 #include <QScreen>
 #include <QSettings>
 #include <QSqlQuery>
@@ -182,6 +186,9 @@ private slots:
         QVERIFY(!action->associatedWidgets().isEmpty());
         // Commands that ask for a file are cancelled.
         m_prompt.expectFileName(QString());
+        // The report selection is closed as the user would.
+        if (target == QLatin1String("actionFilePrintEntries"))
+            clickWhenShown(QStringLiteral("pushButtonCancel"));
         QSignalSpy triggered(action, &QAction::triggered);
         QTest::keySequence(m_window.get(), keys);
         // Commands of later features are bound already, and wait disabled.
@@ -768,6 +775,99 @@ private slots:
             QCOMPARE(m_prompt.messages.last().buttons, QStringList({"Verwerfen", "Abbrechen"}));
     }
 
+    void printCommands_data()
+    {
+        QTest::addColumn<QString>("command");
+        QTest::addColumn<int>("diary"); // 0 none, 1 without reports, 2 with the draft 012 by AB
+        QTest::addColumn<QString>("outcome");
+        QTest::addColumn<QString>("proposal"); // the PDF name the save dialog proposes
+        QTest::newRow("preview, no diary") << "on_actionFilePreviewEntry_triggered" << 0 << ""
+                                           << "";
+        QTest::newRow("print, no diary") << "on_actionFilePrintEntries_triggered" << 0 << ""
+                                         << "";
+        QTest::newRow("preview, no report") << "on_actionFilePreviewEntry_triggered" << 1 << "warning"
+                                            << "";
+        QTest::newRow("pdf, no report") << "on_actionFilePDFCurEntry_triggered" << 1 << "warning"
+                                        << "";
+        QTest::newRow("printer") << "on_actionFilePrintCurEntry_triggered" << 2 << "viewer"
+                                 << "";
+        QTest::newRow("preview") << "on_actionFilePreviewEntry_triggered" << 2 << "preview"
+                                 << "";
+        QTest::newRow("pdf") << "on_actionFilePDFCurEntry_triggered" << 2 << "pdf"
+                             << "Projekt - Bericht 012-AB (Entwurf).pdf";
+        QTest::newRow("list row, pdf") << "slot_dockWidgetEntryList_doEntryAllPdf" << 2 << "pdf"
+                                       << "Projekt - Bericht 012-AB (Entwurf).pdf";
+        QTest::newRow("list row, printer") << "slot_dockWidgetEntryList_doEntryAllPrint" << 2 << "viewer"
+                                           << "";
+        QTest::newRow("chosen reports, pdf") << "on_actionFilePrintEntries_triggered" << 2 << "pdf"
+                                             << "Projekt - Bericht 012.pdf";
+    }
+
+    // The report commands: nothing without a diary, a note without a report, else the report's way out.
+    void printCommands()
+    {
+        QFETCH(QString, command);
+        QFETCH(int, diary);
+        QFETCH(QString, outcome);
+        QFETCH(QString, proposal);
+        QStringList opened, previewed;
+        VDRPrintHooks::setOpenFile([&](const QString& path) { opened << path; });
+        VDRPrintHooks::setPreview([&](const QStringList& files) { previewed = files; });
+        const auto hooks = qScopeGuard([] {
+            VDRPrintHooks::setOpenFile(nullptr);
+            VDRPrintHooks::setPreview(nullptr);
+        });
+        QSettings().remove(QStringLiteral("PDFExport"));
+        const QString folder = m_dir.filePath(QStringLiteral("Druck"));
+        QVERIFY(QDir().mkpath(folder));
+        if (diary > 0) {
+            const QString path = folder + QStringLiteral("/Projekt.vd2");
+            QFile::remove(path);
+            QVERIFY(createDiary(path));
+            QVERIFY(execSql(path,
+                            {"UPDATE vdr SET name = 'Projekt'",
+                             diary == 1
+                                 ? "DELETE FROM entry"
+                                 : "UPDATE entry SET number = '012 (Entwurf)', user_id = 'AB', locked = 0"}));
+            QCOMPARE(m_window->openDocument(path, false, true), 0);
+        }
+        QCOMPARE(m_window->ui().action(QStringLiteral("actionFilePDFCurEntry"))->isEnabled(), diary > 0);
+        const QString pdf = folder + QStringLiteral("/gewählt.pdf");
+        QFile::remove(pdf);
+        if (outcome == QLatin1String("warning"))
+            m_prompt.expect(QStringLiteral("Hinweis"),
+                            QStringLiteral("Sie haben keinen Bautagesbericht ausgewählt!"));
+        if (outcome == QLatin1String("pdf")) {
+            m_prompt.expectFileName(pdf);
+            // Typed but not yet stored: the printout must see it all the same.
+            auto* weather = m_window->findChild<QLineEdit*>(QStringLiteral("entrydataEnvWeather1"));
+            weather->setFocus();
+            QTest::keyClicks(weather, QStringLiteral("heiter"));
+        }
+        if (command == QLatin1String("on_actionFilePrintEntries_triggered") && diary > 0)
+            clickWhenShown(QStringLiteral("pushButtonPdf"));
+        if (command.startsWith(QLatin1String("slot_")))
+            QVERIFY(QMetaObject::invokeMethod(m_window.get(), command.toLatin1().constData(), Q_ARG(int, 0)));
+        else
+            QVERIFY(QMetaObject::invokeMethod(m_window.get(), command.toLatin1().constData()));
+
+        const QString temporary = m_window->document()->temporaryFolder();
+        if (outcome == QLatin1String("pdf")) {
+            QCOMPARE(m_prompt.fileProposals, QStringList{QDir::toNativeSeparators(folder + "/" + proposal)});
+            const QString text = pdfText(pdf);
+            QVERIFY(text.contains(QStringLiteral("Baubericht-Nr.: 012-AB")) && text.contains("heiter"));
+            QCOMPARE(opened, QStringList{pdf});
+        } else if (outcome == QLatin1String("viewer")) {
+            QTRY_COMPARE(opened, QStringList{temporary + QStringLiteral("/Varduna.pdf")});
+            QVERIFY(pdfText(opened.first()).contains(QStringLiteral("Baubericht-Nr.: 012-AB")));
+        } else if (outcome == QLatin1String("preview")) {
+            QCOMPARE(previewed.size(), 1);
+            QCOMPARE(QFileInfo(previewed.first()).absolutePath(), temporary);
+        } else {
+            QVERIFY(opened.isEmpty() && previewed.isEmpty());
+        }
+    }
+
 private:
     QString diary(const QString& name)
     {
@@ -782,6 +882,17 @@ private:
         const bool renamed = setProjectName(*m_window->document(), name);
         VDRDocument::setGlobalModified(renamed);
         return renamed;
+    }
+    // Clicks a button of the report selection once it shows, modally.
+    void clickWhenShown(const QString& button, int tries = 10000)
+    {
+        QTimer::singleShot(0, this, [this, button, tries] {
+            auto* selector = qobject_cast<VDREntrySelectorWidget*>(QApplication::activeModalWidget());
+            if (selector)
+                selector->findChild<QPushButton*>(button)->click();
+            else if (tries > 0)
+                clickWhenShown(button, tries - 1);
+        });
     }
     // Shortcuts work in the active window only.
     bool activateWindow()

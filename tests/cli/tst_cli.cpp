@@ -53,6 +53,8 @@ private slots:
     void compactReportsSizes();
     void pdfOfDemoReports_data();
     void pdfOfDemoReports();
+    void previewWritesOnePicturePerPage_data();
+    void previewWritesOnePicturePerPage();
 
 private:
     Run cli(const QStringList& args);
@@ -96,7 +98,8 @@ void TestCli::helpListsCommandsAndExitCodes()
 {
     const Run r = cli({QStringLiteral("--help")});
     QCOMPARE(r.exitCode, 0);
-    for (const char* word : {"new FILE", "info FILE", "check FILE", "--yes", "held by a running instance"})
+    for (const char* word :
+         {"new FILE", "info FILE", "check FILE", "preview FILE", "--yes", "held by a running instance"})
         QVERIFY2(r.out.contains(QLatin1String(word)), word);
 }
 
@@ -106,6 +109,7 @@ void TestCli::usageErrors_data()
     QTest::newRow("nothing") << QStringList();
     QTest::newRow("no file") << QStringList{"info"};
     QTest::newRow("unknown command") << QStringList{"frobnicate", "x.vd2"};
+    QTest::newRow("preview without --out") << QStringList{"preview", "x.vd2"};
 }
 
 void TestCli::usageErrors()
@@ -318,6 +322,11 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
     QCOMPARE(pdf.exitCode, 2);
     QVERIFY2(pdf.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: ")), qPrintable(pdf.err + pdf.out));
     QVERIFY(!QFile::exists(m_dir.filePath("held.pdf")));
+    const Run preview =
+        cli({QStringLiteral("preview"), path, QStringLiteral("--out"), m_dir.filePath("held pages")});
+    QCOMPARE(preview.exitCode, 2);
+    QVERIFY(preview.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: ")));
+    QVERIFY(!QFileInfo::exists(m_dir.filePath("held pages")));
 
     const Run check = cli({QStringLiteral("check"), path});
     QCOMPARE(check.exitCode, 4);
@@ -500,4 +509,45 @@ void TestCli::pdfOfDemoReports()
                  qPrintable(line));
     }
     QVERIFY(expected > 0);
+}
+
+void TestCli::previewWritesOnePicturePerPage_data()
+{
+    QTest::addColumn<QString>("reports");
+    QTest::newRow("one report") << QStringLiteral("4");
+    QTest::newRow("all") << QStringLiteral("all");
+}
+
+// As many page images as the PDF of the same reports has pages, each the picture of a portrait page.
+void TestCli::previewWritesOnePicturePerPage()
+{
+    QFETCH(QString, reports);
+    const QString path = m_dir.filePath(QStringLiteral("Vorschau.vd2"));
+    if (!QFile::exists(path)) {
+        QVERIFY(QFile::copy(
+            QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2"), path));
+        QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner);
+    }
+    const QByteArray before = fileHash(path);
+    const QString pdf = m_dir.filePath(QStringLiteral("Vorschau.pdf"));
+    QCOMPARE(
+        cli({QStringLiteral("pdf"), path, QStringLiteral("--reports"), reports, QStringLiteral("-o"), pdf})
+            .exitCode,
+        0);
+    const int pages = pdfPages(pdf);
+    QVERIFY(pages > 0);
+    const QString out = m_dir.filePath(QStringLiteral("Seiten ") + reports);
+    const Run r = cli({QStringLiteral("preview"), path, QStringLiteral("--reports"), reports,
+                       QStringLiteral("--out"), out});
+    QCOMPARE(r.exitCode, 0);
+    QCOMPARE(fileHash(path), before);
+    QStringList expected;
+    for (int page = 1; page <= pages; ++page)
+        expected << QDir(out).filePath(QString::asprintf("picture_%04d.jpeg", page));
+    QCOMPARE(r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts), expected);
+    QCOMPARE(QDir(out).entryList(QDir::Files).size(), pages);
+    for (const QString& file : expected) {
+        const QImage image(file);
+        QVERIFY2(image.width() >= 1024 && image.height() > image.width(), qPrintable(file));
+    }
 }

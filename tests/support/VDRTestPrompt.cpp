@@ -54,6 +54,7 @@ void VDRTestPrompt::reset()
     m_expected.clear();
     m_unexpected.clear();
     m_fileAnswers.clear();
+    fileProposals.clear();
 }
 
 void VDRTestPrompt::message(Kind kind, const QString& title, const QString& text)
@@ -84,8 +85,9 @@ int VDRTestPrompt::choose(Kind kind, const QString& title, const QString& text, 
     return answer;
 }
 
-QString VDRTestPrompt::openFileName(const QString& title, const QString&, const QString&)
+QString VDRTestPrompt::openFileName(const QString& title, const QString& proposal, const QString&)
 {
+    fileProposals << proposal;
     if (m_fileAnswers.isEmpty()) {
         m_unexpected << QStringLiteral("unexpected file dialog \"%1\"").arg(title);
         return QString();

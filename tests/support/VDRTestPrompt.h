@@ -33,6 +33,8 @@ public:
     void reset();
 
     QList<Message> messages;
+    // What each file dialog proposed (its folder or file name), in order.
+    QStringList fileProposals;
 
     void message(Kind kind, const QString& title, const QString& text) override;
     StandardButton question(Kind kind, const QString& title, const QString& text, StandardButtons buttons,
