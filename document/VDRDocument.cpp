@@ -27,8 +27,10 @@
 
 #include <cerrno>
 #include <cstdlib>
+#include <cstring>
 #include <ctime>
 #include <pwd.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -196,6 +198,21 @@ bool VDRDocument::writeLockInfo(const QString& lockInfoPath)
                          QDate::currentDate().toString() + QLatin1Char('\n') +
                          QTime::currentTime().toString(QStringLiteral("hh:mm")) + QLatin1Char('\n');
     return VDRFileOps::writeFileAtomically(lockInfoPath, text.toUtf8());
+}
+
+QString VDRDocument::createPrivateTempFolder()
+{
+    // The name can be guessed: a folder someone else made under it first is never used, and ours
+    // is for this user alone (it holds the diary's pictures, previews and PDFs).
+    for (int attempt = 0; attempt < 100; ++attempt) {
+        const QString name = findFreeTempFile(QString());
+        if (::mkdir(QFile::encodeName(name).constData(), 0700) == 0)
+            return name;
+        if (errno != EEXIST)
+            break;
+    }
+    qDebug() << "no temporary folder:" << std::strerror(errno);
+    return QString();
 }
 
 QString VDRDocument::findFreeTempFile(const QString& suffix)
@@ -422,8 +439,7 @@ bool VDRDocument::createDocument(bool hideSyncButton)
     m_new = true;
     m_modified = false;
     m_filePath.clear();
-    m_tempFolder = findFreeTempFile(QString());
-    QDir().mkpath(m_tempFolder);
+    m_tempFolder = createPrivateTempFolder();
     emit documentOpened(this);
 
     setGlobalModified(false);
@@ -859,8 +875,7 @@ bool VDRDocument::openDocumentImpl(const QString& path, bool& showError)
     m_valid = true;
     m_new = false;
     m_modified = resume;
-    m_tempFolder = findFreeTempFile(QString());
-    QDir().mkpath(m_tempFolder);
+    m_tempFolder = createPrivateTempFolder();
     emit syncButtonVisibilityChanged(isOnSyncList(diaryPath));
     emit documentOpened(this);
     return true;

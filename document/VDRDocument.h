@@ -70,6 +70,7 @@ public:
     static bool writeLockInfo(const QString& lockInfoPath);
 
     static QString findFreeTempFile(const QString& suffix);
+    static QString createPrivateTempFolder();
     // Like findFreeTempFile, and the file is deleted when the document closes.
     QString getFreeTempFile(const QString& suffix);
 

@@ -341,6 +341,37 @@ bool VDRFileOps::flush(const QString& path)
     return false;
 }
 
+QFileDevice::Permissions VDRFileOps::newFilePermissions()
+{
+    // Read, not set: umask(2) would change it for every thread while it is asked.
+    int mask = 022;
+    QFile status(QStringLiteral("/proc/self/status"));
+    if (status.open(QIODevice::ReadOnly)) {
+        for (const QByteArray& line : status.readAll().split('\n')) {
+            if (line.startsWith("Umask:")) {
+                bool ok = false;
+                const int value = line.mid(6).trimmed().toInt(&ok, 8);
+                if (ok)
+                    mask = value;
+                break;
+            }
+        }
+    }
+    QFileDevice::Permissions permissions;
+    const std::pair<int, QFileDevice::Permission> bits[] = {
+        {0400, QFileDevice::ReadOwner},  {0200, QFileDevice::WriteOwner}, {0040, QFileDevice::ReadGroup},
+        {0020, QFileDevice::WriteGroup}, {0004, QFileDevice::ReadOther},  {0002, QFileDevice::WriteOther}};
+    for (const auto& bit : bits)
+        if (!(mask & bit.first))
+            permissions |= bit.second;
+    // QFile reports the owner's bits also as the user's.
+    if (permissions & QFileDevice::ReadOwner)
+        permissions |= QFileDevice::ReadUser;
+    if (permissions & QFileDevice::WriteOwner)
+        permissions |= QFileDevice::WriteUser;
+    return permissions;
+}
+
 bool VDRFileOps::replaceFile(const QString& temporary, const QString& target, bool* renamed)
 {
     if (renamed)

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <QFileDevice>
 #include <QString>
 #include <QStringList>
 
@@ -47,6 +48,8 @@ public:
     // Renames 'temporary' over 'target' in one step, keeping the permissions of the file it
     // replaces, and makes the rename itself durable. 'renamed' tells a caller that must not undo
     // anything whether the rename happened even though flushing the folder failed.
+    // Permissions a newly created file gets from the process's umask (rw for whom it allows).
+    static QFileDevice::Permissions newFilePermissions();
     static bool replaceFile(const QString& temporary, const QString& target, bool* renamed = nullptr);
     // writeDurableCopy and replaceFile: 'target' is at every instant absent/old or the complete copy.
     static bool copyDurably(const QString& source, const QString& target);

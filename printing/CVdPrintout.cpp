@@ -623,6 +623,10 @@ bool CVdPrintout::after_print()
             QFile::remove(file);
         pictureFiles.clear();
     } else if (output == Pdf && !m_pdfTemporary.isEmpty()) {
+        // The temporary name is private to its creator; a new PDF is readable like any other new
+        // file (a replaced one keeps the permissions it had).
+        if (!QFileInfo::exists(pdfFileName))
+            QFile::setPermissions(m_pdfTemporary, VDRFileOps::newFilePermissions());
         ok = QFileInfo(m_pdfTemporary).size() > 0 && VDRFileOps::flush(m_pdfTemporary) &&
              VDRFileOps::replaceFile(m_pdfTemporary, pdfFileName);
         if (!ok) {

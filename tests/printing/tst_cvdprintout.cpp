@@ -17,6 +17,8 @@
 #include <QTemporaryDir>
 #include <QtTest>
 
+#include <sys/stat.h>
+
 using namespace VDRTestFixtures;
 
 namespace {
@@ -366,6 +368,7 @@ private slots:
     }
     void pdfNaming()
     {
+        ::umask(022);
         QFETCH(QString, name);
         QFETCH(bool, ask);
         QFETCH(QString, written);
@@ -395,6 +398,9 @@ private slots:
         VDRPrintHooks::setOpenFile(nullptr);
         const QString path = folder + QLatin1Char('/') + written;
         QVERIFY(QFile::exists(path));
+        // Written under a private temporary name, but a new PDF is as readable as any new file.
+        QCOMPARE(QFileInfo(path).permissions() & QFileDevice::Permissions(0x0777),
+                 QFileDevice::Permissions(0x0644));
         QCOMPARE(opened, ask ? QStringList{path} : QStringList());
     }
 
