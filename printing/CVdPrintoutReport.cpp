@@ -596,7 +596,9 @@ QVector<CVdPrintoutReport::Line> CVdPrintoutReport::cell_lines(QPainter& painter
         if (t.isEmpty())
             continue;
         const QFont f = run.hasFont ? run.font : font;
-        const int height = QFontMetrics(f, painter.device()).lineSpacing();
+        const QFontMetrics metrics(f, painter.device());
+        const int height = metrics.lineSpacing();
+        const int descent = metrics.descent();
         const QString key = f.key() + QLatin1Char('|') + QString::number(width) + QLatin1Char('|') + t;
         auto it = m_wrapped.constFind(key);
         if (it == m_wrapped.constEnd()) {
@@ -604,7 +606,7 @@ QVector<CVdPrintoutReport::Line> CVdPrintoutReport::cell_lines(QPainter& painter
             it = m_wrapped.insert(key, break_line(painter, width, t).split(QLatin1Char('\n')));
         }
         for (const QString& l : it.value())
-            lines << Line{l, f, height};
+            lines << Line{l, f, height, descent};
     }
     return lines;
 }
@@ -651,8 +653,13 @@ void CVdPrintoutReport::draw_cell(QPainter& painter, const RowLayout& row, int c
             // graphics state per line in a PDF).
             const QRect rect = cell_rect(row, column, y, line.height);
             painter.setFont(line.font);
-            painter.drawText(rect, row.alignment.at(column) | Qt::AlignBottom | Qt::TextSingleLine,
-                             line.text);
+            const int alignment = row.alignment.at(column);
+            if ((alignment & Qt::AlignHorizontal_Mask) == Qt::AlignLeft)
+                // On its baseline: the same place as bottom-aligned in the rectangle, without laying
+                // the line out again.
+                painter.drawText(QPoint(rect.left(), rect.top() + rect.height() - line.descent), line.text);
+            else
+                painter.drawText(rect, alignment | Qt::AlignBottom | Qt::TextSingleLine, line.text);
         }
         y += line.height;
     }

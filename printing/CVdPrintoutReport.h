@@ -47,6 +47,7 @@ private:
         QString text;
         QFont font;
         int height = 0;
+        int descent = 0;
     };
     // A row laid out: per column its x, width, alignment and lines.
     struct RowLayout
