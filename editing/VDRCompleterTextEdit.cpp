@@ -1,5 +1,6 @@
 #include "editing/VDRCompleterTextEdit.h"
 
+#include "document/VDRRichTextResources.h"
 #include "editing/VDRCompleter.h"
 #include "editing/VDRSpellChecker.h"
 
@@ -143,4 +144,10 @@ void VDRCompleterTextEdit::setSpellChecker(VDRSpellChecker* checker)
     if (!checker || document()->findChild<SpellHighlighter*>())
         return;
     new SpellHighlighter(document(), checker);
+}
+
+void VDRCompleterTextEdit::setStoredHtml(const QString& html)
+{
+    VDRRichTextResources::guard(document(), html);
+    setHtml(html);
 }

@@ -12,8 +12,14 @@ class VDRSpellChecker;
 class VDRCompleterTextEdit : public QTextEdit
 {
     Q_OBJECT
+    // Stored texts come in through here (the form's mapper writes this property).
+    Q_PROPERTY(QString html READ toHtml WRITE setStoredHtml NOTIFY textChanged USER true)
 public:
     explicit VDRCompleterTextEdit(QWidget* parent = nullptr, VDRSpellChecker* checker = nullptr);
+
+    // Like setHtml, but pictures the text names on this computer are not read (only those it
+    // carries itself are shown).
+    void setStoredHtml(const QString& html);
 
     // Takes over the list; an earlier own list is deleted.
     void setCompleter(VDRCompleter* completer);

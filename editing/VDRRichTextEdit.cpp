@@ -103,7 +103,7 @@ QString VDRRichTextEdit::html() const
 
 void VDRRichTextEdit::setHtml(const QString& html)
 {
-    m_edit->setHtml(html);
+    m_edit->setStoredHtml(html);
 }
 
 void VDRRichTextEdit::setCompleter(VDRCompleter* completer)

@@ -2,6 +2,7 @@
 
 #include "document/CVdShared.h"
 #include "document/VDRDocument.h"
+#include "document/VDRRichTextResources.h"
 #include "printing/CVdTexts.h"
 
 #include <QAbstractTextDocumentLayout>
@@ -904,6 +905,7 @@ bool CVdPrintoutReport::drawRichText(QPainter& painter, const QString& caption, 
     html.replace(QRegularExpression(QStringLiteral("(<body[^>]*?)\\s+style=\"[^\"]*\""),
                                     QRegularExpression::CaseInsensitiveOption),
                  QStringLiteral("\\1"));
+    VDRRichTextResources::guard(&doc, html);
     doc.setHtml(html);
     if (doc.toPlainText().trimmed().isEmpty())
         return draw_table(painter, caption, note, Cells());

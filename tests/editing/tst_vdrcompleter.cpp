@@ -82,6 +82,25 @@ private slots:
         QSettings().setValue(QStringLiteral("language"), int(QLocale::German));
     }
 
+    // A stored text that names a picture on this computer shows a gap, and keeps the name.
+    void storedTextReadsNoPictureFromDisk()
+    {
+        QImage picture(200, 100, QImage::Format_RGB32);
+        picture.fill(Qt::red);
+        const QString local = m_settings.filePath(QStringLiteral("geheim.png"));
+        QVERIFY(picture.save(local));
+        VDRCompleterTextEdit edit;
+        edit.resize(400, 300);
+        QVERIFY(edit.setProperty("html", QStringLiteral("<p>A</p><img src=\"%1\">").arg(local)));
+        edit.show();
+        QVERIFY(QTest::qWaitForWindowExposed(&edit));
+        QVERIFY(edit.document()->size().height() > 0);
+        const QImage shown =
+            edit.document()->resource(QTextDocument::ImageResource, QUrl(local)).value<QImage>();
+        QVERIFY(!shown.isNull() && shown.size() != picture.size());
+        QVERIFY(edit.toHtml().contains(local));
+    }
+
     void init()
     {
         m_prompt.reset();

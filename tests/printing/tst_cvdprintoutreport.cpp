@@ -4,6 +4,7 @@
 #include "printing/CVdConfig.h"
 #include "printing/CVdPrintoutReport.h"
 
+#include <QBuffer>
 #include <QDir>
 #include <QProcess>
 #include <QRegularExpression>
@@ -379,6 +380,32 @@ private slots:
             QVERIFY2(w.box.bottom() <= footerTop || (footer && w.box.top() >= footerTop - 0.5),
                      qPrintable(w.text));
         }
+    }
+
+    // A stored text shows the pictures it carries, never a file of this computer it names.
+    void richTextShowsOnlyItsOwnPictures()
+    {
+        const auto png = [](int w, int h) {
+            QImage image(w, h, QImage::Format_RGB32);
+            image.fill(Qt::red);
+            QByteArray bytes;
+            QBuffer buffer(&bytes);
+            buffer.open(QIODevice::WriteOnly);
+            image.save(&buffer, "PNG");
+            return bytes;
+        };
+        const QString local = m_dir.filePath(QStringLiteral("geheim.png"));
+        QVERIFY(writeFile(local, png(200, 100)));
+        QVERIFY(execOn(m_doc.database(),
+                       {QStringLiteral("UPDATE entry SET progress='<p>A</p><img src=\"%1\"><img "
+                                       "src=\"file://%1\"><img src=\"data:image/png;base64,%2\"><p>B</p>'")
+                            .arg(local, QString::fromLatin1(png(30, 20).toBase64()))}));
+        const QString pdf = m_dir.filePath(QStringLiteral("bilder.pdf"));
+        QVERIFY(CVdPrintoutReport(nullptr, {1}).print(CVdPrintout::Pdf, pdf, false, QString()));
+        const QString list = tool(QStringLiteral("pdfimages"), {QStringLiteral("-list"), pdf});
+        QVERIFY2(list.contains(QRegularExpression(QStringLiteral("image\\s+30\\s+20\\s"))), qPrintable(list));
+        QVERIFY2(!list.contains(QRegularExpression(QStringLiteral("image\\s+200\\s+100\\s"))),
+                 qPrintable(list));
     }
 
     // An existing read-only PDF is refused with a message and stays as it was; nothing is left beside it.
