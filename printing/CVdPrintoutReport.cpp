@@ -19,7 +19,9 @@
 #include <QTextLayout>
 #include <QTextObjectInterface>
 #include <QTime>
+
 #include <QUrl>
+#include <limits>
 
 #include <algorithm>
 #include <cmath>
@@ -41,14 +43,21 @@ QString val(const QSqlQuery& q, const char* name)
     return q.value(QLatin1String(name)).toString().trimmed();
 }
 
-// Equipment durations are stored in minutes.
-QString hours(const QVariant& minutes)
+// Equipment durations are stored in minutes; any stored number prints, however absurd.
+QString hours(qint64 minutes)
 {
-    const int m = minutes.toInt();
+    const quint64 magnitude = minutes < 0 ? 0 - quint64(minutes) : quint64(minutes);
     return QStringLiteral("%1%2:%3")
-        .arg(m < 0 ? QStringLiteral("-") : QString())
-        .arg(qAbs(m) / 60)
-        .arg(qAbs(m) % 60, 2, 10, QLatin1Char('0'));
+        .arg(minutes < 0 ? QStringLiteral("-") : QString())
+        .arg(magnitude / 60)
+        .arg(magnitude % 60, 2, 10, QLatin1Char('0'));
+}
+
+// Sums of stored numbers stop at the ends of the range instead of wrapping.
+void addTo(qint64& sum, qint64 value)
+{
+    if (__builtin_add_overflow(sum, value, &sum))
+        sum = value > 0 ? std::numeric_limits<qint64>::max() : std::numeric_limits<qint64>::min();
 }
 
 QString joinNonEmpty(const QStringList& parts, const QString& sep)
@@ -303,8 +312,8 @@ void CVdPrintoutReport::get_attendee(int, Cells& companies, Cells& comments) con
                  });
 }
 
-void CVdPrintoutReport::get_workforce(int, Cells& companies, Cells& persons, Cells& manHours, int& personSum,
-                                      double& manHourSum, bool& anyManHours) const
+void CVdPrintoutReport::get_workforce(int, Cells& companies, Cells& persons, Cells& manHours,
+                                      qint64& personSum, double& manHourSum, bool& anyManHours) const
 {
     personSum = 0;
     manHourSum = 0;
@@ -314,8 +323,8 @@ void CVdPrintoutReport::get_workforce(int, Cells& companies, Cells& persons, Cel
                      QList<CText> who = cell(company);
                      addRun(who, val(q, "comment"));
                      companies << who;
-                     const int count = q.value(QStringLiteral("person_count")).toInt();
-                     personSum += count;
+                     const qint64 count = q.value(QStringLiteral("person_count")).toLongLong();
+                     addTo(personSum, count);
                      QList<CText> people = cell(text(8).arg(count));
                      addRun(people, val(q, "person_type"));
                      persons << people;
@@ -494,7 +503,7 @@ void CVdPrintoutReport::get_documents(int, Cells& companies, Cells& texts, Cells
 }
 
 void CVdPrintoutReport::get_equipment(int, Cells& equipment, Cells& zones, Cells& operating, Cells& down,
-                                      int& operatingSum, int& downSum) const
+                                      qint64& operatingSum, qint64& downSum) const
 {
     operatingSum = 0;
     downSum = 0;
@@ -512,14 +521,15 @@ void CVdPrintoutReport::get_equipment(int, Cells& equipment, Cells& zones, Cells
                 addRun(where, text(61).arg(out));
             zones << where;
             const QVariant op = q.value(QStringLiteral("operating_time"));
-            operatingSum += op.toInt();
-            operating << (op.isNull() ? QList<CText>()
-                                      : cell(text(65) + hours(op) + QLatin1Char(' ') + tr("Stunden")));
+            addTo(operatingSum, op.toLongLong());
+            operating << (op.isNull()
+                              ? QList<CText>()
+                              : cell(text(65) + hours(op.toLongLong()) + QLatin1Char(' ') + tr("Stunden")));
             const QVariant stop = q.value(QStringLiteral("downtime"));
-            downSum += stop.toInt();
+            addTo(downSum, stop.toLongLong());
             QList<CText> stopped;
-            if (!stop.isNull() && stop.toInt() != 0)
-                stopped = cell(text(66) + hours(stop) + QLatin1Char(' ') + tr("Stunden"));
+            if (!stop.isNull() && stop.toLongLong() != 0)
+                stopped = cell(text(66) + hours(stop.toLongLong()) + QLatin1Char(' ') + tr("Stunden"));
             if (!val(q, "downtime_reasons").isEmpty())
                 addRun(stopped, text(64).arg(val(q, "downtime_reasons")));
             down << stopped;
@@ -838,7 +848,7 @@ bool CVdPrintoutReport::drawTable4ThreeColumns(QPainter& painter, const QString&
 bool CVdPrintoutReport::draw_table4Workforce(QPainter& painter, int entryId)
 {
     Cells companies, persons, manHours;
-    int personSum = 0;
+    qint64 personSum = 0;
     double manHourSum = 0;
     bool anyManHours = false;
     get_workforce(entryId, companies, persons, manHours, personSum, manHourSum, anyManHours);
@@ -857,10 +867,10 @@ bool CVdPrintoutReport::draw_table4Workforce(QPainter& painter, int entryId)
 bool CVdPrintoutReport::draw_table4Equipment(QPainter& painter, int entryId)
 {
     Cells equipment, zones, operating, down;
-    int operatingSum = 0, downSum = 0;
+    qint64 operatingSum = 0, downSum = 0;
     get_equipment(entryId, equipment, zones, operating, down, operatingSum, downSum);
     if (!equipment.isEmpty()) {
-        const auto sum = [](int id, int minutes) {
+        const auto sum = [](int id, qint64 minutes) {
             return cell(text(id) + hours(minutes) + QLatin1Char(' ') + tr("Stunden"));
         };
         equipment << QList<CText>{CText(text(69), m_captionFont)};

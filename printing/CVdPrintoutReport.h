@@ -65,7 +65,7 @@ private:
                       const std::function<void(const QString&, const QSqlQuery&)>& row) const;
 
     void get_attendee(int entryId, Cells& companies, Cells& comments) const;
-    void get_workforce(int entryId, Cells& companies, Cells& persons, Cells& manHours, int& personSum,
+    void get_workforce(int entryId, Cells& companies, Cells& persons, Cells& manHours, qint64& personSum,
                        double& manHourSum, bool& anyManHours) const;
     QString get_progress(int entryId) const;
     QString get_incidents(int entryId) const;
@@ -86,7 +86,7 @@ private:
     void get_sample(int entryId, Cells& rows) const;
     void get_documents(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
     void get_equipment(int entryId, Cells& equipment, Cells& zones, Cells& operating, Cells& down,
-                       int& operatingSum, int& downSum) const;
+                       qint64& operatingSum, qint64& downSum) const;
     static QString reformatDate4Deficiencies(const QString& isoDate);
     static QString reformatDate4Delays(const QString& isoDate);
     static QString reformat_time(const QString& stored);

@@ -165,6 +165,19 @@ private slots:
                            "2:30 Stunden",
                            "0:30 Stunden"}
             << QStringList{"0:00 Stunden"};
+        // Numbers no form would store, from a file written by hand: printed as they are, sums stop
+        // at the end of the range.
+        QTest::newRow("absurd stored numbers")
+            << QStringList{"INSERT INTO entry_equipment (entry_id, pos, equipment, operating_zone, "
+                           "operating_time, downtime, downtime_reasons, comment) VALUES "
+                           "(1, 0, 'Bagger', ' ', -9223372036854775808, -9223372036854775808, ' ', ' '), "
+                           "(1, 1, 'Kran', ' ', -2147483648, -1, ' ', ' ')",
+                           "INSERT INTO entry_workforce (entry_id, pos, company_id, comment, person_count, "
+                           "person_type) VALUES "
+                           "(1, 0, NULL, ' ', 9223372036854775807, ' '), (1, 1, NULL, ' ', "
+                           "9223372036854775807, ' ')"}
+            << QStringList{"9223372036854775807", "-153722867280912930:08", "-35791394:08"}
+            << QStringList{"-2 Personen", "-2\n"};
     }
     void content()
     {
