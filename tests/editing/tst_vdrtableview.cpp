@@ -755,44 +755,23 @@ private:
     {
         for (int i = 0; i < rows; ++i) {
             const QString text(QChar(first.at(0).unicode() + i));
-            bool ok = false;
-            switch (model->tableNameId()) {
-            case M::TN_PHOTO_PROGRESS:
-                ok = m_doc->appendEntryPhoto1(kEntry, QDate::currentDate(), text, 0);
-                break;
-            case M::TN_TIME_RECORDING:
-                ok = m_doc->appendEntryTimeRecording(kEntry, 1);
-                break;
-            case M::TN_ATTENDEE:
-                ok = m_doc->appendEntryAttendee(kEntry);
-                break;
-            case M::TN_WORKFORCE:
-                ok = m_doc->appendEntryWorkforce(kEntry);
-                break;
-            case M::TN_DELAY:
-                ok = m_doc->appendEntryDelay(kEntry);
-                break;
-            case M::TN_OBSTRUCTION:
-                ok = m_doc->appendEntryObstruction(kEntry);
-                break;
-            case M::TN_DEFICIENCY:
-                ok = m_doc->appendEntryDfcy(kEntry);
-                break;
-            case M::TN_CONSTRUCTION_MATERIAL:
-                ok = m_doc->appendEntryConstructionmaterial(kEntry);
-                break;
-            case M::TN_TELEPHONE_NOTICE:
-                ok = m_doc->appendEntryTelephoneNotice(kEntry);
-                break;
-            case M::TN_CONCERN:
-                ok = m_doc->appendEntryConcern(kEntry);
-                break;
-            case M::TN_EQUIPMENT:
-                ok = m_doc->appendEntryEquipment(kEntry);
-                break;
-            default:
-                break;
-            }
+            using Append = bool (VDRDocument::*)(int);
+            static const QHash<int, Append> appends = {
+                {M::TN_ATTENDEE, &VDRDocument::appendEntryAttendee},
+                {M::TN_WORKFORCE, &VDRDocument::appendEntryWorkforce},
+                {M::TN_DELAY, &VDRDocument::appendEntryDelay},
+                {M::TN_OBSTRUCTION, &VDRDocument::appendEntryObstruction},
+                {M::TN_DEFICIENCY, &VDRDocument::appendEntryDfcy},
+                {M::TN_CONSTRUCTION_MATERIAL, &VDRDocument::appendEntryConstructionmaterial},
+                {M::TN_TELEPHONE_NOTICE, &VDRDocument::appendEntryTelephoneNotice},
+                {M::TN_CONCERN, &VDRDocument::appendEntryConcern},
+                {M::TN_EQUIPMENT, &VDRDocument::appendEntryEquipment}};
+            const int table = model->tableNameId();
+            const bool ok = table == M::TN_PHOTO_PROGRESS
+                                ? m_doc->appendEntryPhoto1(kEntry, QDate::currentDate(), text, 0)
+                            : table == M::TN_TIME_RECORDING ? m_doc->appendEntryTimeRecording(kEntry, 1)
+                            : appends.contains(table)       ? (m_doc.get()->*appends.value(table))(kEntry)
+                                                            : false;
             if (model->fieldIndex(QStringLiteral("description")) >= 0)
                 model->setData(model->rowCount() - 1, QStringLiteral("description"), text);
             QVERIFY(ok);
