@@ -150,22 +150,21 @@ private slots:
         const auto standard = [](QKeySequence::StandardKey key, const QKeySequence& fallback) {
             return QKeySequence::keyBindings(key).value(0, fallback);
         };
+        // clang-format off
         QTest::newRow("new") << "actionFileNew" << standard(QKeySequence::New, QKeySequence("Ctrl+N"));
         QTest::newRow("open") << "actionFileOpen" << standard(QKeySequence::Open, QKeySequence("Ctrl+O"));
         QTest::newRow("save") << "actionFileSave" << standard(QKeySequence::Save, QKeySequence("Ctrl+S"));
-        QTest::newRow("save as") << "actionFileSaveAs"
-                                 << standard(QKeySequence::SaveAs, QKeySequence("Ctrl+Shift+S"));
-        QTest::newRow("print") << "actionFilePrintEntries"
-                               << standard(QKeySequence::Print, QKeySequence("Ctrl+P"));
+        QTest::newRow("save as") << "actionFileSaveAs" << standard(QKeySequence::SaveAs, QKeySequence("Ctrl+Shift+S"));
+        QTest::newRow("print") << "actionFilePrintEntries" << standard(QKeySequence::Print, QKeySequence("Ctrl+P"));
         QTest::newRow("quit") << "actionFileExit" << standard(QKeySequence::Quit, QKeySequence("Ctrl+Q"));
-        QTest::newRow("help") << "actionHelpShowHelp"
-                              << standard(QKeySequence::HelpContents, QKeySequence("F1"));
+        QTest::newRow("help") << "actionHelpShowHelp" << standard(QKeySequence::HelpContents, QKeySequence("F1"));
         QTest::newRow("previous report") << "actionEntryGotoPrevious" << QKeySequence("Ctrl+PgUp");
         QTest::newRow("next report") << "actionEntryGotoNext" << QKeySequence("Ctrl+PgDown");
         QTest::newRow("first report") << "actionEntryGotoFirst" << QKeySequence("Ctrl+Shift+PgUp");
         QTest::newRow("last report") << "actionEntryGotoLast" << QKeySequence("Ctrl+Shift+PgDown");
         QTest::newRow("Alt+D opens Datei") << "menuFile" << QKeySequence("Alt+D");
         QTest::newRow("F10 opens the menu bar") << "menuFile" << QKeySequence("F10");
+        // clang-format on
     }
 
     void standardShortcuts()
@@ -317,14 +316,13 @@ private slots:
         QTest::addColumn<QRect>("available");
         QTest::addColumn<QRect>("fitted");
         const QRect laptop(0, 0, 1366, 736);
+        // clang-format off
         QTest::newRow("fits already") << QRect(100, 100, 800, 600) << laptop << QRect(100, 100, 800, 600);
-        QTest::newRow("default size on a laptop")
-            << QRect(83, -32, 1200, 800) << laptop << QRect(83, 0, 1200, 736);
-        QTest::newRow("saved off the right edge")
-            << QRect(1000, 100, 1200, 700) << laptop << QRect(166, 36, 1200, 700);
+        QTest::newRow("default size on a laptop") << QRect(83, -32, 1200, 800) << laptop << QRect(83, 0, 1200, 736);
+        QTest::newRow("saved off the right edge") << QRect(1000, 100, 1200, 700) << laptop << QRect(166, 36, 1200, 700);
         QTest::newRow("larger than the screen") << QRect(-50, -50, 3000, 2000) << laptop << laptop;
-        QTest::newRow("second screen")
-            << QRect(0, 0, 800, 600) << QRect(1920, 0, 1366, 736) << QRect(1920, 0, 800, 600);
+        QTest::newRow("second screen") << QRect(0, 0, 800, 600) << QRect(1920, 0, 1366, 736) << QRect(1920, 0, 800, 600);
+        // clang-format on
     }
 
     void geometryFitsTheScreen()
@@ -709,11 +707,11 @@ private slots:
     {
         QTest::addColumn<QStringList>("arguments");
         QTest::addColumn<QStringList>("rest");
+        // clang-format off
         QTest::newRow("no arguments") << QStringList{"varduna"} << QStringList();
-        QTest::newRow("a diary") << QStringList{"./varduna", "/home/a/Bau.vd2"}
-                                 << QStringList{"/home/a/Bau.vd2"};
-        QTest::newRow("-file") << QStringList{"/opt/varduna", "-file", "x.vd2"}
-                               << QStringList{"-file", "x.vd2"};
+        QTest::newRow("a diary") << QStringList{"./varduna", "/home/a/Bau.vd2"} << QStringList{"/home/a/Bau.vd2"};
+        QTest::newRow("-file") << QStringList{"/opt/varduna", "-file", "x.vd2"} << QStringList{"-file", "x.vd2"};
+        // clang-format on
     }
 
     void restartCommand()
@@ -781,26 +779,18 @@ private slots:
         QTest::addColumn<int>("diary"); // 0 none, 1 without reports, 2 with the draft 012 by AB
         QTest::addColumn<QString>("outcome");
         QTest::addColumn<QString>("proposal"); // the PDF name the save dialog proposes
-        QTest::newRow("preview, no diary") << "on_actionFilePreviewEntry_triggered" << 0 << ""
-                                           << "";
-        QTest::newRow("print, no diary") << "on_actionFilePrintEntries_triggered" << 0 << ""
-                                         << "";
-        QTest::newRow("preview, no report") << "on_actionFilePreviewEntry_triggered" << 1 << "warning"
-                                            << "";
-        QTest::newRow("pdf, no report") << "on_actionFilePDFCurEntry_triggered" << 1 << "warning"
-                                        << "";
-        QTest::newRow("printer") << "on_actionFilePrintCurEntry_triggered" << 2 << "viewer"
-                                 << "";
-        QTest::newRow("preview") << "on_actionFilePreviewEntry_triggered" << 2 << "preview"
-                                 << "";
-        QTest::newRow("pdf") << "on_actionFilePDFCurEntry_triggered" << 2 << "pdf"
-                             << "Projekt - Bericht 012-AB (Entwurf).pdf";
-        QTest::newRow("list row, pdf") << "slot_dockWidgetEntryList_doEntryAllPdf" << 2 << "pdf"
-                                       << "Projekt - Bericht 012-AB (Entwurf).pdf";
-        QTest::newRow("list row, printer") << "slot_dockWidgetEntryList_doEntryAllPrint" << 2 << "viewer"
-                                           << "";
-        QTest::newRow("chosen reports, pdf") << "on_actionFilePrintEntries_triggered" << 2 << "pdf"
-                                             << "Projekt - Bericht 012.pdf";
+        // clang-format off
+        QTest::newRow("preview, no diary") << "on_actionFilePreviewEntry_triggered" << 0 << "" << "";
+        QTest::newRow("print, no diary") << "on_actionFilePrintEntries_triggered" << 0 << "" << "";
+        QTest::newRow("preview, no report") << "on_actionFilePreviewEntry_triggered" << 1 << "warning" << "";
+        QTest::newRow("pdf, no report") << "on_actionFilePDFCurEntry_triggered" << 1 << "warning" << "";
+        QTest::newRow("printer") << "on_actionFilePrintCurEntry_triggered" << 2 << "viewer" << "";
+        QTest::newRow("preview") << "on_actionFilePreviewEntry_triggered" << 2 << "preview" << "";
+        QTest::newRow("pdf") << "on_actionFilePDFCurEntry_triggered" << 2 << "pdf" << "Projekt - Bericht 012-AB (Entwurf).pdf";
+        QTest::newRow("list row, pdf") << "slot_dockWidgetEntryList_doEntryAllPdf" << 2 << "pdf" << "Projekt - Bericht 012-AB (Entwurf).pdf";
+        QTest::newRow("list row, printer") << "slot_dockWidgetEntryList_doEntryAllPrint" << 2 << "viewer" << "";
+        QTest::newRow("chosen reports, pdf") << "on_actionFilePrintEntries_triggered" << 2 << "pdf" << "Projekt - Bericht 012.pdf";
+        // clang-format on
     }
 
     // The report commands: nothing without a diary, a note without a report, else the report's way out.

@@ -38,7 +38,6 @@ private slots:
     void usageErrors();
     void newWritesAFreshDiary();
     void newRefusesExistingFile();
-    void newLeavesNoDocumentsOfAnEarlierDiary();
     void infoListsReports_data();
     void infoListsReports();
     void infoUpgradesOnlyTheWorkingCopy();
@@ -58,6 +57,8 @@ private slots:
 
 private:
     Run cli(const QStringList& args);
+    // A copy of the demo diary under 'name', made once per run.
+    QString demoCopy(const QString& name);
     QTemporaryDir m_dir;
     VDRTestPrompt m_prompt;
 };
@@ -94,6 +95,16 @@ Run TestCli::cli(const QStringList& args)
     return r;
 }
 
+QString TestCli::demoCopy(const QString& name)
+{
+    const QString path = m_dir.filePath(name);
+    if (!QFile::exists(path) &&
+        QFile::copy(QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2"),
+                    path))
+        QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner);
+    return path;
+}
+
 void TestCli::helpListsCommandsAndExitCodes()
 {
     const Run r = cli({QStringLiteral("--help")});
@@ -123,9 +134,13 @@ void TestCli::usageErrors()
 void TestCli::newWritesAFreshDiary()
 {
     const QString path = m_dir.filePath(QStringLiteral("Neubau Müllerstraße.vd2"));
+    // Documents left by an earlier diary of the same name must not attach to the new one.
+    const QString documents = VDRDocument::documentsDbPathFor(path);
+    QVERIFY(execSql(documents, {"CREATE TABLE documents (id INTEGER)"}));
     const Run r = cli({QStringLiteral("new"), path});
     QCOMPARE(r.exitCode, 0);
     QVERIFY(QFile::exists(path));
+    QVERIFY(!QFile::exists(documents));
     QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
     QVERIFY(!QFile::exists(VDRDocument::lockInfoPathFor(path)));
     QCOMPARE(queryTexts(path, "SELECT number FROM entry"), QStringList{"001 (Entwurf)"});
@@ -138,15 +153,6 @@ void TestCli::newWritesAFreshDiary()
     QCOMPARE(tableNames(path), tableNames(reference));
     for (const QString& table : tableNames(reference))
         QCOMPARE(tableLayout(path, table), tableLayout(reference, table));
-}
-
-void TestCli::newLeavesNoDocumentsOfAnEarlierDiary()
-{
-    const QString path = m_dir.filePath(QStringLiteral("wieder.vd2"));
-    const QString documents = VDRDocument::documentsDbPathFor(path);
-    QVERIFY(execSql(documents, {"CREATE TABLE documents (id INTEGER)"}));
-    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
-    QVERIFY(!QFile::exists(documents));
 }
 
 void TestCli::newRefusesExistingFile()
@@ -468,12 +474,8 @@ void TestCli::pdfOfDemoReports()
 {
     QFETCH(QString, reports);
     QFETCH(int, exitCode);
-    const QString path = m_dir.filePath(QStringLiteral("Demo.vd2"));
-    if (!QFile::exists(path)) {
-        QVERIFY(QFile::copy(
-            QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2"), path));
-        QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner);
-    }
+    const QString path = demoCopy(QStringLiteral("Demo.vd2"));
+    QVERIFY(QFile::exists(path));
     const QByteArray before = fileHash(path);
     const QString pdf = m_dir.filePath(QStringLiteral("Demo Berichte.pdf"));
     QFile::remove(pdf);
@@ -490,10 +492,7 @@ void TestCli::pdfOfDemoReports()
     }
     QCOMPARE(r.out.trimmed(), pdf);
 
-    QProcess text;
-    text.start(QStringLiteral("pdftotext"), {QStringLiteral("-layout"), pdf, QStringLiteral("-")});
-    QVERIFY(text.waitForFinished(60000));
-    const QString printed = QString::fromUtf8(text.readAllStandardOutput());
+    const QString printed = pdfText(pdf);
     const QStringList lines =
         cli({QStringLiteral("info"), path}).out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
     int expected = 0;
@@ -522,12 +521,8 @@ void TestCli::previewWritesOnePicturePerPage_data()
 void TestCli::previewWritesOnePicturePerPage()
 {
     QFETCH(QString, reports);
-    const QString path = m_dir.filePath(QStringLiteral("Vorschau.vd2"));
-    if (!QFile::exists(path)) {
-        QVERIFY(QFile::copy(
-            QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2"), path));
-        QFile::setPermissions(path, QFile::ReadOwner | QFile::WriteOwner);
-    }
+    const QString path = demoCopy(QStringLiteral("Vorschau.vd2"));
+    QVERIFY(QFile::exists(path));
     const QByteArray before = fileHash(path);
     const QString pdf = m_dir.filePath(QStringLiteral("Vorschau.pdf"));
     QCOMPARE(

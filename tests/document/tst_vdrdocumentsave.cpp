@@ -355,25 +355,20 @@ private slots:
     void damagedDiaryIsRestoredFromNewestIntactBackup_data()
     {
         QTest::addColumn<QStringList>("damaged"); // which of diary, bak, 01, 02 are damaged
-        QTest::addColumn<int>("answer");
         QTest::addColumn<QString>("text");
         QTest::addColumn<QString>("restoredFrom");
-
-        QTest::newRow("newest backup intact")
-            << QStringList{"d.vd2"} << 0 << "Das neueste unbeschädigte Backup stammt vom"
-            << "Stand 3";
-        QTest::newRow("newest backup damaged too")
-            << QStringList{"d.vd2", "d.vd2.bak"} << 0 << "Das neueste unbeschädigte Backup stammt vom"
-            << "Stand 2";
-        QTest::newRow("all backups damaged")
-            << QStringList{"d.vd2", "d.vd2.bak", "d.vd2.01.bak", "d.vd2.02.bak", "d.vd2.03.bak"} << 0
+        const QString newest = "Das neueste unbeschädigte Backup stammt vom";
+        // clang-format off
+        QTest::newRow("newest backup intact") << QStringList{"d.vd2"} << newest << "Stand 3";
+        QTest::newRow("newest backup damaged too") << QStringList{"d.vd2", "d.vd2.bak"} << newest << "Stand 2";
+        QTest::newRow("all backups damaged") << QStringList{"d.vd2", "d.vd2.bak", "d.vd2.01.bak", "d.vd2.02.bak", "d.vd2.03.bak"}
             << "Die Backup-Dateien sind ebenfalls beschädigt. Wenn sie über Sicherungskopien" << QString();
+        // clang-format on
     }
 
     void damagedDiaryIsRestoredFromNewestIntactBackup()
     {
         QFETCH(QStringList, damaged);
-        QFETCH(int, answer);
         QFETCH(QString, text);
         QFETCH(QString, restoredFrom);
         const QString path = diary(QStringLiteral("d.vd2"));
@@ -384,7 +379,7 @@ private slots:
 
         VDRDocument doc;
         bool showError = true;
-        m_prompt.expect(QStringLiteral("Beschädigte Datenbank-Datei"), text, answer);
+        m_prompt.expect(QStringLiteral("Beschädigte Datenbank-Datei"), text, 0);
         if (restoredFrom.isEmpty()) {
             QVERIFY(!doc.openDocument(path, showError)); // "Abbrechen"
             QVERIFY(!showError);
@@ -524,17 +519,14 @@ private slots:
         QTest::addColumn<int>("answer");
         QTest::addColumn<bool>("notAgain");
         QTest::addColumn<int>("result");
+        // clang-format off
         QTest::newRow("below the limit") << 2 << QString() << -1 << false << int(VDRFileSizeDialog::NotDue);
-        QTest::newRow("over the limit, export")
-            << 0 << QString() << 0 << false << int(VDRFileSizeDialog::ExportRequested);
-        QTest::newRow("over the limit, cancel")
-            << 0 << QString() << 1 << false << int(VDRFileSizeDialog::Dismissed);
-        QTest::newRow("not again for this file")
-            << 0 << QString() << 1 << true << int(VDRFileSizeDialog::Dismissed);
-        QTest::newRow("warning switched off")
-            << 0 << "NoFileSizeWarning" << -1 << false << int(VDRFileSizeDialog::NotDue);
-        QTest::newRow("master data exported")
-            << 0 << "exportedTo" << -1 << false << int(VDRFileSizeDialog::NotDue);
+        QTest::newRow("over the limit, export") << 0 << QString() << 0 << false << int(VDRFileSizeDialog::ExportRequested);
+        QTest::newRow("over the limit, cancel") << 0 << QString() << 1 << false << int(VDRFileSizeDialog::Dismissed);
+        QTest::newRow("not again for this file") << 0 << QString() << 1 << true << int(VDRFileSizeDialog::Dismissed);
+        QTest::newRow("warning switched off") << 0 << "NoFileSizeWarning" << -1 << false << int(VDRFileSizeDialog::NotDue);
+        QTest::newRow("master data exported") << 0 << "exportedTo" << -1 << false << int(VDRFileSizeDialog::NotDue);
+        // clang-format on
     }
 
     void fileSizeCheckAfterOpening()

@@ -48,9 +48,9 @@ QString valueText(const QVariant& v)
     return v.toString();
 }
 
-// Opens a cell's editor with the edit key, replaces its text by typing, and commits with Return.
-// An editor that refuses the text stays open; Escape closes it then.
-void typeIntoCell(VDRTableView* view, int row, const QString& field, const QString& typed)
+// Opens a cell's editor with the edit key, replaces its text by typing (or pasting), and commits with
+// Return. An editor that refuses the text stays open; Escape closes it then.
+void typeIntoCell(VDRTableView* view, int row, const QString& field, const QString& typed, bool paste = false)
 {
     const QModelIndex index = view->vdrModel()->index(row, field);
     view->setCurrentIndex(index);
@@ -69,10 +69,17 @@ void typeIntoCell(VDRTableView* view, int row, const QString& field, const QStri
     } else if (auto* text = qobject_cast<QTextEdit*>(editor)) {
         text->selectAll();
     }
-    if (typed.isEmpty())
+    if (paste) {
+        QApplication::clipboard()->setText(typed);
+        if (auto* text = qobject_cast<QTextEdit*>(target))
+            text->paste();
+        else if (auto* line = qobject_cast<QLineEdit*>(target))
+            line->paste();
+    } else if (typed.isEmpty()) {
         QTest::keyClick(target, Qt::Key_Delete);
-    else
+    } else {
         QTest::keyClicks(target, typed);
+    }
     QTest::keyClick(target, Qt::Key_Return);
     QTest::qWait(0);
     QCoreApplication::processEvents();
@@ -132,75 +139,33 @@ private slots:
         QTest::addColumn<QString>("message");
 
         const QString today = QDate::currentDate().toString(Qt::ISODate);
-        QTest::newRow("company by name")
-            << int(M::TN_WORKFORCE) << QStringList{"company_id=Bau GmbH (Rohbau)"} << "company_id"
-            << "ID"
-            << "";
-        QTest::newRow("duration 0:05") << int(M::TN_EQUIPMENT) << QStringList{"downtime=0:05"} << "downtime"
-                                       << "5"
-                                       << "";
-        QTest::newRow("duration one-digit minutes refused")
-            << int(M::TN_EQUIPMENT) << QStringList{"operating_time=0:5"} << "operating_time"
-            << "NULL"
-            << "";
-        QTest::newRow("time 7") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=7"} << "time"
-                                << "07:00"
-                                << "";
-        QTest::newRow("time 7:5") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=7:5"} << "time"
-                                  << "07:05"
-                                  << "";
+        const auto row = [](const char* tag, M::TABLE_NAMES table, const QStringList& edits,
+                            const char* field, const QString& expected, const char* message = "") {
+            QTest::newRow(tag) << int(table) << edits << QString::fromUtf8(field) << expected
+                               << QString::fromUtf8(message);
+        };
+        // clang-format off
+        row("company by name", M::TN_WORKFORCE, {"company_id=Bau GmbH (Rohbau)"}, "company_id", "ID");
+        row("duration 0:05", M::TN_EQUIPMENT, {"downtime=0:05"}, "downtime", "5");
+        row("duration one-digit minutes refused", M::TN_EQUIPMENT, {"operating_time=0:5"}, "operating_time", "NULL");
+        row("time 7", M::TN_TELEPHONE_NOTICE, {"time=7"}, "time", "07:00");
+        row("time 7:5", M::TN_TELEPHONE_NOTICE, {"time=7:5"}, "time", "07:05");
         // The validator refuses the keystroke that would make the text invalid.
-        QTest::newRow("time 25:00") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=25:00"} << "time"
-                                    << "02:00"
-                                    << "";
-        QTest::newRow("time 12:60") << int(M::TN_TELEPHONE_NOTICE) << QStringList{"time=12:60"} << "time"
-                                    << "12:06"
-                                    << "";
-        QTest::newRow("date 1.2.15") << int(M::TN_DELAY) << QStringList{"date=1.2.15"} << "date"
-                                     << "2015-02-01"
-                                     << "";
-        QTest::newRow("date 1.2.1999") << int(M::TN_DELAY) << QStringList{"date=1.2.1999"} << "date"
-                                       << "2099-02-01"
-                                       << "";
-        QTest::newRow("invalid date")
-            << int(M::TN_DELAY) << QStringList{"date=31.2.2020"} << "date" << today << "Format-Fehler";
-        QTest::newRow("text in a number cell")
-            << int(M::TN_CONSTRUCTION_MATERIAL) << QStringList{"quantity=abc"} << "quantity"
-            << "NULL"
-            << "";
-        QTest::newRow("decimal") << int(M::TN_CONSTRUCTION_MATERIAL) << QStringList{"quantity=12.5"}
-                                 << "quantity"
-                                 << "12.5"
-                                 << "";
-        QTest::newRow("empty comment") << int(M::TN_ATTENDEE) << QStringList{"comment="} << "comment"
-                                       << " "
-                                       << "";
-        QTest::newRow("blanks reduced")
-            << int(M::TN_CONCERN) << QStringList{"description=a   b  c"} << "description"
-            << "a b c"
-            << "";
-        QTest::newRow("one-line text")
-            << int(M::TN_EQUIPMENT) << QStringList{"equipment=Bagger"} << "equipment"
-            << "Bagger"
-            << "";
-        QTest::newRow("equipment over midnight")
-            << int(M::TN_EQUIPMENT) << QStringList{"entry_time=22:00", "exit_time=6"} << "operating_time"
-            << "480"
-            << "";
-        QTest::newRow("equipment exit cleared")
-            << int(M::TN_EQUIPMENT) << QStringList{"entry_time=8", "exit_time=9", "exit_time="}
-            << "entry_time"
-            << "NULL"
-            << "";
-        QTest::newRow("duplicate deficiency")
-            << int(M::TN_DEFICIENCY) << QStringList{"description=Riss", "description=Riss@1"}
-            << "description@1"
-            << "B"
-            << "Mängeltabelle";
-        QTest::newRow("spin box") << int(M::TN_TIME_RECORDING) << QStringList{"person_count=3"}
-                                  << "person_count"
-                                  << "3"
-                                  << "";
+        row("time 25:00", M::TN_TELEPHONE_NOTICE, {"time=25:00"}, "time", "02:00");
+        row("time 12:60", M::TN_TELEPHONE_NOTICE, {"time=12:60"}, "time", "12:06");
+        row("date 1.2.15", M::TN_DELAY, {"date=1.2.15"}, "date", "2015-02-01");
+        row("date 1.2.1999", M::TN_DELAY, {"date=1.2.1999"}, "date", "2099-02-01");
+        row("invalid date", M::TN_DELAY, {"date=31.2.2020"}, "date", today, "Format-Fehler");
+        row("text in a number cell", M::TN_CONSTRUCTION_MATERIAL, {"quantity=abc"}, "quantity", "NULL");
+        row("decimal", M::TN_CONSTRUCTION_MATERIAL, {"quantity=12.5"}, "quantity", "12.5");
+        row("empty comment", M::TN_ATTENDEE, {"comment="}, "comment", " ");
+        row("blanks reduced", M::TN_CONCERN, {"description=a   b  c"}, "description", "a b c");
+        row("one-line text", M::TN_EQUIPMENT, {"equipment=Bagger"}, "equipment", "Bagger");
+        row("equipment over midnight", M::TN_EQUIPMENT, {"entry_time=22:00", "exit_time=6"}, "operating_time", "480");
+        row("equipment exit cleared", M::TN_EQUIPMENT, {"entry_time=8", "exit_time=9", "exit_time="}, "entry_time", "NULL");
+        row("duplicate deficiency", M::TN_DEFICIENCY, {"description=Riss", "description=Riss@1"}, "description@1", "B", "Mängeltabelle");
+        row("spin box", M::TN_TIME_RECORDING, {"person_count=3"}, "person_count", "3");
+        // clang-format on
     }
 
     void editCells()
@@ -458,22 +423,7 @@ private slots:
         QFETCH(int, storedLength);
         M* model = showTable(M::TABLE_NAMES(table), 1);
         const QVariant before = model->data(0, field, Qt::EditRole);
-        const QModelIndex index = model->index(0, field);
-        m_view->setCurrentIndex(index);
-        QTest::keyClick(m_view.get(), Qt::Key_F2);
-        QWidget* editor = m_view->indexWidget(index);
-        QVERIFY(editor);
-        QApplication::clipboard()->setText(QString(1024 * 1024, QLatin1Char('x')));
-        QWidget* target = editor;
-        if (auto* text = qobject_cast<QTextEdit*>(editor))
-            text->paste();
-        else if (auto* line = qobject_cast<QLineEdit*>(target))
-            line->paste();
-        QTest::keyClick(target, Qt::Key_Return);
-        QCoreApplication::processEvents();
-        if (m_view->indexWidget(index))
-            QTest::keyClick(m_view->indexWidget(index), Qt::Key_Escape);
-        QTRY_VERIFY(!m_view->indexWidget(index));
+        typeIntoCell(m_view.get(), 0, field, QString(1024 * 1024, QLatin1Char('x')), true);
         const QVariant after = model->data(0, field, Qt::EditRole);
         if (storedLength < 0)
             QCOMPARE(after.toTime().toString(QStringLiteral("hh:mm")),
@@ -519,12 +469,10 @@ private slots:
         QTest::addColumn<int>("table");
         QTest::addColumn<QString>("dependents");
         QTest::addColumn<QStringList>("expected");
-        QTest::newRow("workforce") << int(M::TN_WORKFORCE)
-                                   << "SELECT workforce_id FROM entry_time_recording ORDER BY id"
-                                   << QStringList{"OTHER"};
-        QTest::newRow("deficiency") << int(M::TN_DEFICIENCY)
-                                    << "SELECT relation_id FROM entry_photo ORDER BY id"
-                                    << QStringList{"-1", "OTHER"};
+        // clang-format off
+        QTest::newRow("workforce") << int(M::TN_WORKFORCE) << "SELECT workforce_id FROM entry_time_recording ORDER BY id" << QStringList{"OTHER"};
+        QTest::newRow("deficiency") << int(M::TN_DEFICIENCY) << "SELECT relation_id FROM entry_photo ORDER BY id" << QStringList{"-1", "OTHER"};
+        // clang-format on
     }
 
     void removalCascades()
@@ -558,12 +506,7 @@ private slots:
         QVERIFY(m_view->isRowHidden(0));
         QVERIFY(model->submitAll());
         expected.replaceInStrings(QStringLiteral("OTHER"), QString::number(otherId));
-        QStringList rows;
-        QSqlQuery q(m_doc->database());
-        QVERIFY(q.exec(dependents));
-        while (q.next())
-            rows << q.value(0).toString();
-        QCOMPARE(rows, expected);
+        QCOMPARE(textsOn(m_doc->database(), dependents), expected);
         QCOMPARE(model->rowCount(), 1);
     }
 
@@ -600,13 +543,13 @@ private slots:
         QTest::addColumn<QList<int>>("rows");
         QTest::addColumn<QStringList>("expected");
         QTest::addColumn<QString>("message");
-        QTest::newRow("rows 2-3 of 5 to the end")
-            << int(M::TN_CONCERN) << QList<int>{1, 2} << QStringList{"A|1", "D|2", "E|3", "B|4", "C|5"} << "";
+        // clang-format off
+        QTest::newRow("rows 2-3 of 5 to the end") << int(M::TN_CONCERN) << QList<int>{1, 2} << QStringList{"A|1", "D|2", "E|3", "B|4", "C|5"} << "";
         QTest::newRow("photos not one block")
             << int(M::TN_PHOTO_PROGRESS) << QList<int>{0, 2} << QStringList{"A|1", "B|2", "C|3", "D|4", "E|5"}
             << "Drag&Drop-Fehler";
-        QTest::newRow("photo block") << int(M::TN_PHOTO_PROGRESS) << QList<int>{0, 1}
-                                     << QStringList{"C|1", "D|2", "E|3", "A|4", "B|5"} << "";
+        QTest::newRow("photo block") << int(M::TN_PHOTO_PROGRESS) << QList<int>{0, 1} << QStringList{"C|1", "D|2", "E|3", "A|4", "B|5"} << "";
+        // clang-format on
     }
 
     void dragAndDrop()
@@ -673,19 +616,14 @@ private slots:
         QTest::addColumn<QString>("manHours");
         QTest::addColumn<int>("persons");
         QTest::addColumn<QString>("types");
-        QTest::newRow("3 persons 07:00-16:30, 30 min") << QStringList{"3|Maurer|7|16:30|30"} << ""
-                                                       << "27" << 3 << "Maurer";
-        QTest::newRow("over midnight") << QStringList{"1|Polier|22:00|6|"} << ""
-                                       << "8" << 1 << "Polier";
-        QTest::newRow("same time twice") << QStringList{"2||8|8|"} << ""
-                                         << "0" << 2 << "";
-        QTest::newRow("no times") << QStringList{"2|Helfer|||", "1|Helfer|||"} << ""
-                                  << "NULL" << 3 << "Helfer";
-        QTest::newRow("types united")
-            << QStringList{"1|Maurer|||", "1|Helfer|||", "1|Maurer|||", "1||||"} << ""
-            << "NULL" << 4 << "Maurer, Helfer";
-        QTest::newRow("typed hours clear the times") << QStringList{"2|Maurer|7|9|"} << "5"
-                                                     << "5" << 2 << "Maurer";
+        // clang-format off
+        QTest::newRow("3 persons 07:00-16:30, 30 min") << QStringList{"3|Maurer|7|16:30|30"} << "" << "27" << 3 << "Maurer";
+        QTest::newRow("over midnight") << QStringList{"1|Polier|22:00|6|"} << "" << "8" << 1 << "Polier";
+        QTest::newRow("same time twice") << QStringList{"2||8|8|"} << "" << "0" << 2 << "";
+        QTest::newRow("no times") << QStringList{"2|Helfer|||", "1|Helfer|||"} << "" << "NULL" << 3 << "Helfer";
+        QTest::newRow("types united") << QStringList{"1|Maurer|||", "1|Helfer|||", "1|Maurer|||", "1||||"} << "" << "NULL" << 4 << "Maurer, Helfer";
+        QTest::newRow("typed hours clear the times") << QStringList{"2|Maurer|7|9|"} << "5" << "5" << 2 << "Maurer";
+        // clang-format on
     }
 
     void timeRecording()
@@ -812,44 +750,23 @@ private:
     {
         for (int i = 0; i < rows; ++i) {
             const QString text(QChar(first.at(0).unicode() + i));
-            bool ok = false;
-            switch (model->tableNameId()) {
-            case M::TN_PHOTO_PROGRESS:
-                ok = m_doc->appendEntryPhoto1(kEntry, QDate::currentDate(), text, 0);
-                break;
-            case M::TN_TIME_RECORDING:
-                ok = m_doc->appendEntryTimeRecording(kEntry, 1);
-                break;
-            case M::TN_ATTENDEE:
-                ok = m_doc->appendEntryAttendee(kEntry);
-                break;
-            case M::TN_WORKFORCE:
-                ok = m_doc->appendEntryWorkforce(kEntry);
-                break;
-            case M::TN_DELAY:
-                ok = m_doc->appendEntryDelay(kEntry);
-                break;
-            case M::TN_OBSTRUCTION:
-                ok = m_doc->appendEntryObstruction(kEntry);
-                break;
-            case M::TN_DEFICIENCY:
-                ok = m_doc->appendEntryDfcy(kEntry);
-                break;
-            case M::TN_CONSTRUCTION_MATERIAL:
-                ok = m_doc->appendEntryConstructionmaterial(kEntry);
-                break;
-            case M::TN_TELEPHONE_NOTICE:
-                ok = m_doc->appendEntryTelephoneNotice(kEntry);
-                break;
-            case M::TN_CONCERN:
-                ok = m_doc->appendEntryConcern(kEntry);
-                break;
-            case M::TN_EQUIPMENT:
-                ok = m_doc->appendEntryEquipment(kEntry);
-                break;
-            default:
-                break;
-            }
+            using Append = bool (VDRDocument::*)(int);
+            static const QHash<int, Append> appends = {
+                {M::TN_ATTENDEE, &VDRDocument::appendEntryAttendee},
+                {M::TN_WORKFORCE, &VDRDocument::appendEntryWorkforce},
+                {M::TN_DELAY, &VDRDocument::appendEntryDelay},
+                {M::TN_OBSTRUCTION, &VDRDocument::appendEntryObstruction},
+                {M::TN_DEFICIENCY, &VDRDocument::appendEntryDfcy},
+                {M::TN_CONSTRUCTION_MATERIAL, &VDRDocument::appendEntryConstructionmaterial},
+                {M::TN_TELEPHONE_NOTICE, &VDRDocument::appendEntryTelephoneNotice},
+                {M::TN_CONCERN, &VDRDocument::appendEntryConcern},
+                {M::TN_EQUIPMENT, &VDRDocument::appendEntryEquipment}};
+            const int table = model->tableNameId();
+            const bool ok = table == M::TN_PHOTO_PROGRESS
+                                ? m_doc->appendEntryPhoto1(kEntry, QDate::currentDate(), text, 0)
+                            : table == M::TN_TIME_RECORDING ? m_doc->appendEntryTimeRecording(kEntry, 1)
+                            : appends.contains(table)       ? (m_doc.get()->*appends.value(table))(kEntry)
+                                                            : false;
             if (model->fieldIndex(QStringLiteral("description")) >= 0)
                 model->setData(model->rowCount() - 1, QStringLiteral("description"), text);
             QVERIFY(ok);
