@@ -543,15 +543,14 @@ void usePrintingLanguage()
     CVdConfig::self()->reload();
 }
 
-int cmdPdf(const QString& file, const QString& choice, const QString& target)
+// Opens FILE for reading only and picks the reports to print; an exit code when that fails.
+int openForPrinting(VDRDocument& doc, const QString& file, const QString& choice, QList<int>& ids,
+                    QStringList& numbers)
 {
-    VDRDocument doc;
     // Printing reads only: a crashed session's working copy stays for its owner, nothing is saved.
     doc.setInspecting(true);
     if (!openForCommand(doc, file))
         return ExitRefused;
-    QList<int> ids;
-    QStringList numbers;
     if (!chooseReports(doc, choice, ids, numbers)) {
         doc.closeDocument();
         err(QStringLiteral("varduna-cli: --reports takes all, locked, drafts, NUMBER or FROM-TO"));
@@ -562,6 +561,16 @@ int cmdPdf(const QString& file, const QString& choice, const QString& target)
         VDRPrompt::warning(QObject::tr("Drucken"), QObject::tr("Keine Bautagesberichte ausgewählt."));
         return ExitRefused;
     }
+    return ExitOk;
+}
+
+int cmdPdf(const QString& file, const QString& choice, const QString& target)
+{
+    VDRDocument doc;
+    QList<int> ids;
+    QStringList numbers;
+    if (const int refused = openForPrinting(doc, file, choice, ids, numbers))
+        return refused;
     QString out4 = target;
     if (out4.isEmpty()) {
         // File names cannot hold a slash; a project or report number may.
@@ -589,22 +598,10 @@ int cmdPreview(const QString& file, const QString& choice, const QString& outDir
         return ExitUsage;
     }
     VDRDocument doc;
-    // Printing reads only: a crashed session's working copy stays for its owner, nothing is saved.
-    doc.setInspecting(true);
-    if (!openForCommand(doc, file))
-        return ExitRefused;
     QList<int> ids;
     QStringList numbers;
-    if (!chooseReports(doc, choice, ids, numbers)) {
-        doc.closeDocument();
-        err(QStringLiteral("varduna-cli: --reports takes all, locked, drafts, NUMBER or FROM-TO"));
-        return ExitUsage;
-    }
-    if (ids.isEmpty()) {
-        doc.closeDocument();
-        VDRPrompt::warning(QObject::tr("Drucken"), QObject::tr("Keine Bautagesberichte ausgewählt."));
-        return ExitRefused;
-    }
+    if (const int refused = openForPrinting(doc, file, choice, ids, numbers))
+        return refused;
     const QDir dir(QFileInfo(outDir).absoluteFilePath());
     if (!QDir().mkpath(dir.path())) {
         doc.closeDocument();

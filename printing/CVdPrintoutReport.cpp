@@ -398,19 +398,20 @@ void CVdPrintoutReport::get_defects(int, Cells& companies, Cells& texts, Cells& 
                  });
 }
 
-void CVdPrintoutReport::get_advantage(int, Cells& companies, Cells& texts, Cells& dates) const
+void CVdPrintoutReport::get_advantage(int entryId, Cells& companies, Cells& texts, Cells& dates) const
 {
-    company_rows(QStringLiteral("entry_progress"), QStringLiteral("AND t.type=1"),
-                 [&](const QString& company, const QSqlQuery& q) {
-                     companies << cell(company);
-                     texts << cell(val(q, "description"));
-                     dates << cell(reformatDate4Delays(val(q, "date")));
-                 });
+    get_delay_rows(entryId, 1, companies, texts, dates);
 }
 
-void CVdPrintoutReport::get_invalidities(int, Cells& companies, Cells& texts, Cells& dates) const
+void CVdPrintoutReport::get_invalidities(int entryId, Cells& companies, Cells& texts, Cells& dates) const
 {
-    company_rows(QStringLiteral("entry_progress"), QStringLiteral("AND t.type=2"),
+    get_delay_rows(entryId, 2, companies, texts, dates);
+}
+
+// Delays (type 1) and obstructions (type 2) print alike.
+void CVdPrintoutReport::get_delay_rows(int, int type, Cells& companies, Cells& texts, Cells& dates) const
+{
+    company_rows(QStringLiteral("entry_progress"), QStringLiteral("AND t.type=%1").arg(type),
                  [&](const QString& company, const QSqlQuery& q) {
                      companies << cell(company);
                      texts << cell(val(q, "description"));

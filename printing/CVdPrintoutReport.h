@@ -73,6 +73,7 @@ private:
     void get_defects(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
     void get_advantage(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
     void get_invalidities(int entryId, Cells& companies, Cells& texts, Cells& dates) const;
+    void get_delay_rows(int entryId, int type, Cells& companies, Cells& texts, Cells& dates) const;
     void get_measures(int entryId, Cells& companies, Cells& texts, Cells& times) const;
     void get_tasks(int entryId, int type, Cells& companies, Cells& texts) const;
     QString get_interventions(int entryId) const;
