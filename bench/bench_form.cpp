@@ -3,6 +3,7 @@
 // Usage: bench_form [--reports N] [--json]  (run offscreen: QT_QPA_PLATFORM=offscreen)
 // --json prints one JSON object on stdout: show_ms_median, show_ms_max, baseline_ms_median,
 // rss_mb_after_50, rss_mb_after_all, reports.
+#include "bench_fill.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "editing/VDREntryWidget.h"
@@ -64,24 +65,7 @@ const char* const kSubTables[] = {"entry_attendee",
 bool generate(VDRDocument& doc, int reports)
 {
     const int id = doc.modelEntryAll()->data(0, QStringLiteral("id"), Qt::EditRole).toInt();
-    for (int i = 0; i < 3; ++i) {
-        doc.appendEntryAttendee(id);
-        doc.appendEntryWorkforce(id);
-        doc.appendEntryDelay(id);
-        doc.appendEntryObstruction(id);
-        doc.appendEntryDfcy(id);
-        doc.appendEntryAcceptance(id);
-        doc.appendEntryDirective(id);
-        doc.appendEntryAuxiliaryservice(id);
-        doc.appendEntryConstructionmeasure(id);
-        doc.appendEntryConstructionmaterial(id);
-        doc.appendEntryScheduleddelivery(id);
-        doc.appendEntryTelephoneNotice(id);
-        doc.appendEntryConcern(id);
-        doc.appendEntryEquipment(id);
-    }
-    for (VDRSqlTableModel* m : doc.entryModels(id))
-        m->submitAll();
+    fillEveryList(doc, id);
     QSqlQuery q(doc.database());
     exec(q, QStringLiteral(
                 "UPDATE entry SET progress = '<p>Decke über EG betoniert, Schalung OG begonnen.</p>', "

@@ -7,6 +7,7 @@
 // --json prints one JSON object on stdout (progress goes to stderr): reports, pages, seconds (the
 // printout), baseline_seconds, ratio, peak_rss_mb (peak while printing, generation excluded),
 // pdf_mb and baseline_pdf_mb.
+#include "bench_fill.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "printing/CVdConfig.h"
@@ -146,24 +147,7 @@ bool generate(VDRDocument& doc, int reports, const QString& folder)
 {
     QSqlDatabase db = doc.database();
     const int id = doc.modelEntryAll()->data(0, QStringLiteral("id"), Qt::EditRole).toInt();
-    for (int i = 0; i < 3; ++i) {
-        doc.appendEntryAttendee(id);
-        doc.appendEntryWorkforce(id);
-        doc.appendEntryDelay(id);
-        doc.appendEntryObstruction(id);
-        doc.appendEntryDfcy(id);
-        doc.appendEntryAcceptance(id);
-        doc.appendEntryDirective(id);
-        doc.appendEntryAuxiliaryservice(id);
-        doc.appendEntryConstructionmeasure(id);
-        doc.appendEntryConstructionmaterial(id);
-        doc.appendEntryScheduleddelivery(id);
-        doc.appendEntryTelephoneNotice(id);
-        doc.appendEntryConcern(id);
-        doc.appendEntryEquipment(id);
-    }
-    for (VDRSqlTableModel* m : doc.entryModels(id))
-        m->submitAll();
+    fillEveryList(doc, id);
     QSqlQuery q(db);
     bool ok = exec(q, QStringLiteral("INSERT INTO company (id, category, type, firstname, lastname, company, "
                                      "street, plz, city, telephone, telefax, mobile, email, pos) VALUES "

@@ -752,6 +752,18 @@ void CVdPrintoutReport::draw_row(QPainter& painter, const RowLayout& row)
     }
 }
 
+// Draws a section's caption in the caption column at the current y; returns where it ends.
+int CVdPrintoutReport::draw_caption(QPainter& painter, const QVector<Line>& captionLines)
+{
+    RowLayout captionRow;
+    captionRow.x << leftMargin;
+    captionRow.width << m_captionWidth;
+    captionRow.alignment << Qt::AlignLeft;
+    captionRow.lines << captionLines;
+    draw_cell(painter, captionRow, 0, 0, captionLines.size(), m_y);
+    return m_y + lines_height(captionLines, 0, captionLines.size());
+}
+
 bool CVdPrintoutReport::draw_section(QPainter& painter, const QString& caption, const QString& note,
                                      const QList<Column>& columns)
 {
@@ -794,14 +806,8 @@ bool CVdPrintoutReport::draw_section(QPainter& painter, const QString& caption, 
     const QVector<Line> captionLines = caption_lines(painter, caption, note);
     if (m_y > contentTop && !checkCell4OrphanLines(captionLines, rows.isEmpty() ? nullptr : &rows.first()))
         next_page(painter);
-    RowLayout captionRow;
-    captionRow.x << leftMargin;
-    captionRow.width << m_captionWidth;
-    captionRow.alignment << Qt::AlignLeft;
-    captionRow.lines << captionLines;
-    draw_cell(painter, captionRow, 0, 0, captionLines.size(), m_y);
     const int captionPage = currentPage;
-    const int captionBottom = m_y + lines_height(captionLines, 0, captionLines.size());
+    const int captionBottom = draw_caption(painter, captionLines);
 
     for (int r = 0; r < rows.size(); ++r) {
         if (r > 0 && checkRow4FormFeed(rows.at(r)))
@@ -938,14 +944,8 @@ bool CVdPrintoutReport::drawRichText(QPainter& painter, const QString& caption, 
     if (m_y > contentTop &&
         m_y + qMax(lines_height(captionLines, 0, captionLines.size()), firstLines) > contentBottom)
         next_page(painter);
-    RowLayout captionRow;
-    captionRow.x << leftMargin;
-    captionRow.width << m_captionWidth;
-    captionRow.alignment << Qt::AlignLeft;
-    captionRow.lines << captionLines;
-    draw_cell(painter, captionRow, 0, 0, captionLines.size(), m_y);
     const int captionPage = currentPage;
-    const int captionBottom = m_y + lines_height(captionLines, 0, captionLines.size());
+    const int captionBottom = draw_caption(painter, captionLines);
 
     qreal from = 0;
     while (from < end - 0.5) {

@@ -106,6 +106,7 @@ private:
     bool draw_table4Equipment(QPainter& painter, int entryId);
     bool drawRichText(QPainter& painter, const QString& caption, const QString& note, const QString& stored);
     // The common frame of every table section: caption, emptiness rule, page breaks.
+    int draw_caption(QPainter& painter, const QVector<Line>& captionLines);
     bool draw_section(QPainter& painter, const QString& caption, const QString& note,
                       const QList<Column>& columns);
     void draw_separator(QPainter& painter);

@@ -98,9 +98,7 @@ private slots:
     void initTestCase()
     {
         QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        QVERIFY(QDir().mkpath(m_dir.filePath(QStringLiteral("tmp"))));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.filePath(QStringLiteral("tmp"))));
+        QVERIFY(!isolateRun(m_dir.path()).isEmpty());
         CVdConfig::self()->reload();
         const QString demo =
             QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2");

@@ -54,9 +54,7 @@ private slots:
     void initTestCase()
     {
         QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        QVERIFY(QDir().mkpath(m_dir.filePath(QStringLiteral("tmp"))));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.filePath(QStringLiteral("tmp"))));
+        QVERIFY(!isolateRun(m_dir.path()).isEmpty());
         CVdConfig::self()->reload();
         m_path = m_dir.filePath(QStringLiteral("Bericht.vd2"));
         QVERIFY(createDiary(m_path));

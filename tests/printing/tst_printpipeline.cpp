@@ -48,10 +48,8 @@ private slots:
     void initTestCase()
     {
         QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        m_sharedTemp = m_dir.filePath(QStringLiteral("tmp"));
-        QVERIFY(QDir().mkpath(m_sharedTemp));
-        qputenv("TMPDIR", QFile::encodeName(m_sharedTemp));
+        m_sharedTemp = isolateRun(m_dir.path());
+        QVERIFY(!m_sharedTemp.isEmpty());
         CVdConfig::self()->reload();
         const QString path = m_dir.filePath(QStringLiteral("Bericht.vd2"));
         QVERIFY(createDiary(path));

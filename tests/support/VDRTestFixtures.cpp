@@ -46,6 +46,16 @@ void isolateSettings(const QString& folder)
     qputenv("XDG_CONFIG_HOME", QFile::encodeName(folder));
 }
 
+QString isolateRun(const QString& folder)
+{
+    isolateSettings(folder + QStringLiteral("/settings"));
+    const QString temporary = folder + QStringLiteral("/tmp");
+    if (!QDir().mkpath(temporary))
+        return QString();
+    qputenv("TMPDIR", QFile::encodeName(temporary));
+    return temporary;
+}
+
 bool createDiary(const QString& path)
 {
     VDRDocument doc;

@@ -12,6 +12,9 @@ namespace VDRTestFixtures {
 
 // Settings go to a folder of the test's own; call before anything reads QSettings.
 void isolateSettings(const QString& folder);
+// Settings and temporary files (TMPDIR) of this run both go below 'folder'; returns the
+// temporary folder, empty when it cannot be made.
+QString isolateRun(const QString& folder);
 
 // A new diary written to 'path' exactly as the application creates and saves one.
 bool createDiary(const QString& path);
