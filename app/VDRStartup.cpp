@@ -2,7 +2,7 @@
 
 #include "app/VDRMainWindow.h"
 #include "document/VDRPrompt.h"
-#include "editing/VDRSpellChecker.h"
+#include "editing/completion/VDRSpellChecker.h"
 
 #include <QDir>
 #include <QFileInfo>

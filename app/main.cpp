@@ -5,9 +5,9 @@
 #include "app/VDRSignalWatcher.h"
 #include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
-#include "editing/VDRCompleter.h"
-#include "editing/VDRPrintWidgets.h"
-#include "editing/VDRSpellChecker.h"
+#include "editing/completion/VDRCompleter.h"
+#include "editing/printdialogs/VDRPrintWidgets.h"
+#include "editing/completion/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
 
 #include <QDir>

@@ -6,7 +6,7 @@
 #include "bench_fill.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
-#include "editing/VDREntryWidget.h"
+#include "editing/form/VDREntryWidget.h"
 
 #include <QApplication>
 #include <QElapsedTimer>

@@ -2,9 +2,9 @@
 #include "VDRTestPrompt.h"
 #include "app/VDRMainWindow.h"
 #include "document/VDRDocument.h"
-#include "editing/VDROutputSelectDialog.h"
-#include "editing/VDRProjectDataWidget.h"
-#include "editing/VDRProjectLogoWidget.h"
+#include "editing/printdialogs/VDROutputSelectDialog.h"
+#include "editing/masterdata/VDRProjectDataWidget.h"
+#include "editing/masterdata/VDRProjectLogoWidget.h"
 
 #include <QAction>
 #include <QApplication>

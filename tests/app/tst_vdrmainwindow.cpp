@@ -7,8 +7,8 @@
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
-#include "editing/VDRCompleter.h"
-#include "editing/VDREntrySelectorWidget.h"
+#include "editing/completion/VDRCompleter.h"
+#include "editing/reportlist/VDREntrySelectorWidget.h"
 #include "printing/VDRPrintHooks.h"
 
 #include <QAction>
