@@ -153,6 +153,8 @@ protected:
     void closeEvent(QCloseEvent* event) override;
 
 private:
+    // The report form if it has been built; unlike entryWidget() it never builds one.
+    VDREntryWidget* existingEntryWidget() const;
     QDockWidget* addDock(const QString& title, const QString& objectName, QWidget* content,
                          Qt::DockWidgetArea area);
     void connectActions();

@@ -174,7 +174,9 @@ const QVector<ViewLayout>& viewLayouts()
     return layouts;
 }
 
-struct RichSpec
+// A rich-text field of the form: its widget, its column of `entry`, and the register whose
+// suggestion texts it offers.
+struct RichTextField
 {
     const char* objectName;
     const char* column;
@@ -182,11 +184,12 @@ struct RichSpec
     int registerIndex;
 };
 // Indexed by field number.
-const RichSpec kRich[5] = {{"entrydataProgress", "progress", "Leistungsstand", 0},
-                           {"entrydataSpecialIncident", "special_incidents", "Vorkommnisse", 0},
-                           {"entrydataIntervention", "interventions", "Eingriffe", 3},
-                           {"entrydataTests", "tests", "Prüfungen", 4},
-                           {"entrydataNotice", "notice", "Notizen", 4}};
+const RichTextField kRichTextFields[5] = {
+    {"entrydataProgress", "progress", "Leistungsstand", 0},
+    {"entrydataSpecialIncident", "special_incidents", "Vorkommnisse", 0},
+    {"entrydataIntervention", "interventions", "Eingriffe", 3},
+    {"entrydataTests", "tests", "Prüfungen", 4},
+    {"entrydataNotice", "notice", "Notizen", 4}};
 
 const int kDeficiencyView = 4;
 
@@ -211,8 +214,9 @@ void moveDeficiencySections(VDRTableView* v)
 const QString kUidPattern = QStringLiteral("([a-z]|[A-Z]|[0-9]){2}");
 const QString kUidSettingsKey = QStringLiteral("entry/UID");
 
-// A button whose function comes with a later part of the program.
-QPushButton* laterButton(QWidget* parent, const char* objectName, const QString& text, const QString& tip)
+// A button whose function is not available yet: disabled, and its tool tip says so.
+QPushButton* notYetAvailableButton(QWidget* parent, const char* objectName, const QString& text,
+                                   const QString& tip)
 {
     auto* b = new QPushButton(text, parent);
     b->setObjectName(QLatin1String(objectName));
@@ -274,11 +278,11 @@ void VDREntryWidget::buildLayout()
 
     for (int i = 0; i < 5; ++i) {
         m_rich[i] = new VDRRichTextEdit(this, m_checker);
-        m_rich[i]->setObjectName(QLatin1String(kRich[i].objectName));
+        m_rich[i]->setObjectName(QLatin1String(kRichTextFields[i].objectName));
         m_rich[i]->setFieldNumber(i);
         m_rich[i]->setCompleter(new VDRCompleter(
-            kRich[i].registerIndex, QString::fromUtf8(kRich[i].registerTitle), VDRSqlTableModel::TN_ENTRY,
-            VDRCompleter::SimpleColumn, i, m_rich[i]->textEdit()));
+            kRichTextFields[i].registerIndex, QString::fromUtf8(kRichTextFields[i].registerTitle),
+            VDRSqlTableModel::TN_ENTRY, VDRCompleter::SimpleColumn, i, m_rich[i]->textEdit()));
         connect(m_rich[i], &VDRRichTextEdit::enlargeRequested, this, &VDREntryWidget::slotEnlarge);
     }
     auto weather = [this](int i, const char* name, const char* tip, const char* title) {
@@ -347,10 +351,10 @@ void VDREntryWidget::buildLayout()
         layout->addWidget(field, stretch);
     };
     auto printButton = [this](const char* name, const QString& tip) {
-        return laterButton(this, name, tr("Drucken"), tip);
+        return notYetAvailableButton(this, name, tr("Drucken"), tip);
     };
     auto photos = [this](const char* name, int group) {
-        QPushButton* b = laterButton(this, name, tr("Fotos"), QString());
+        QPushButton* b = notYetAvailableButton(this, name, tr("Fotos"), QString());
         connect(b, &QPushButton::clicked, this, [this, group] {
             switch (group) {
             case 1:
@@ -404,26 +408,28 @@ void VDREntryWidget::buildLayout()
     t->addLayout(head);
     section(t, tr("Abnahmen:"), view(QStringLiteral("entrydataAcceptance")), {}, 1);
     section(t, tr("Besondere Vorkommnisse:"), m_rich[1], {}, 1);
-    m_audio = laterButton(this, "pbAudio", tr("Diktat"), QString());
+    m_audio = notYetAvailableButton(this, "pbAudio", tr("Diktat"), QString());
     section(t, tr("Leistungsstand:"), m_rich[0],
-            {photos("pushButtonPhotos1", 1), laterButton(this, "pushButtonSketch1", tr("Skizze"), QString()),
-             m_audio},
+            {photos("pushButtonPhotos1", 1),
+             notYetAvailableButton(this, "pushButtonSketch1", tr("Skizze"), QString()), m_audio},
             3);
     // 2 Anwesende
     t = newTab("tabData2", tr("Anwesende"));
     section(t, tr("Anwesende Personen:"), view(QStringLiteral("entrydataAttendees")), {}, 1);
     section(t, tr("Baustellenbesetzung:"), view(QStringLiteral("entrydataWorkforce")),
-            {m_workforceCount, laterButton(this, "pbPrintTimeRecording", tr("Drucken"),
-                                           tr("Baubesetzung Stundenlisten drucken"))},
+            {m_workforceCount, notYetAvailableButton(this, "pbPrintTimeRecording", tr("Drucken"),
+                                                     tr("Baubesetzung Stundenlisten drucken"))},
             2);
     // 3 Störungen
     t = newTab("tabData3", tr("Störungen"));
     section(t, tr("Behinderungen:"), view(QStringLiteral("entrydataObstruction")),
-            {photos("pushButtonPhotos3", 3), laterButton(this, "pushButtonSketch3", tr("Skizze"), QString()),
+            {photos("pushButtonPhotos3", 3),
+             notYetAvailableButton(this, "pushButtonSketch3", tr("Skizze"), QString()),
              printButton("pbPrintObstructionList", tr("Behinderungen drucken"))},
             1);
     section(t, tr("Mängel:"), view(QStringLiteral("entrydataDfcy")),
-            {photos("pushButtonPhotos2", 2), laterButton(this, "pushButtonSketch2", tr("Skizze"), QString()),
+            {photos("pushButtonPhotos2", 2),
+             notYetAvailableButton(this, "pushButtonSketch2", tr("Skizze"), QString()),
              printButton("pbPrintDfcyList", tr("Mängelliste drucken"))},
             1);
     section(t, tr("Verzüge:"), view(QStringLiteral("entrydataDelay")),
@@ -471,7 +477,7 @@ void VDREntryWidget::buildLayout()
     auto* buttons = new QHBoxLayout;
     m_finish = new QPushButton(tr("Bericht abschließen"), this);
     named(m_finish, "pushButtonFinish");
-    m_sync = laterButton(this, "pbSynch", tr("Synchronisieren"), QString());
+    m_sync = notYetAvailableButton(this, "pbSynch", tr("Synchronisieren"), QString());
     m_save = new QPushButton(tr("Änderung speichern"), this);
     named(m_save, "pushButtonSave");
     m_revert = new QPushButton(tr("Verwerfen"), this);
@@ -548,7 +554,7 @@ void VDREntryWidget::AddMappings()
     m_mapper->addMapping(m_temperature, QStringLiteral("env_temperature"), "text");
     m_mapper->addMapping(m_humidity, QStringLiteral("env_humidity"), "text");
     for (int i = 0; i < 5; ++i)
-        m_mapper->addMapping(m_rich[i], QLatin1String(kRich[i].column), "richtext");
+        m_mapper->addMapping(m_rich[i], QLatin1String(kRichTextFields[i].column), "richtext");
     m_mapper->addMapping(m_sample, QStringLiteral("construction_material_sample"), "checked");
     m_mapper->addMapping(m_printTelephone, QStringLiteral("print_telephone_notice"), "checked");
     m_mapper->addMapping(m_printNotice, QStringLiteral("print_notice"), "checked");
@@ -674,7 +680,7 @@ void VDREntryWidget::actionGoto(int row, int tab)
     if (tab >= 1 && tab <= 7)
         m_tabs->setCurrentIndex(tab - 1);
     for (int i = 0; i < 5; ++i) {
-        const QString column = QLatin1String(kRich[i].column);
+        const QString column = QLatin1String(kRichTextFields[i].column);
         m_rich[i]->setCell(all, all->index(row, column), column);
         m_rich[i]->setFieldNumber(i);
     }
