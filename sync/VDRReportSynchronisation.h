@@ -163,6 +163,16 @@ private:
     // VDRReportSynchronisationDocuments.cpp
     void importDocuments(const QHash<int, QList<ReplacedDocument>>& replaced);
 
+    // ---- The steps of importMasterData: false or a result other than 0 ends it ----
+    struct MasterDataRow;
+    bool masterDataImportable(QSqlDatabase exchangeFile, const QString& path, bool& keepCompanies);
+    int readProjectData(QSqlDatabase exchangeFile, const QString& path, QList<MasterDataRow>& projects);
+    int readCompanies(QSqlDatabase exchangeFile, const QString& path, QList<MasterDataRow>& companies);
+    int writeMasterData(const QString& path, const QList<MasterDataRow>& projects,
+                        const QList<MasterDataRow>& companies, bool keepCompanies);
+    int writeProjectData(const QString& path, const QList<MasterDataRow>& projects);
+    int replaceCompanies(const QString& path, const QList<MasterDataRow>& companies);
+
     void message(int kind, const QString& title, const QString& text);
 
     VDRDocument* m_document;
