@@ -245,30 +245,26 @@ bool VDRMasterDataExport::check4ExportedMasterData(VDRDocument* document, bool& 
     return true;
 }
 
-bool VDRMasterDataExport::ExportMasterData(VDRDocument* document, QSqlDatabase newDiary, const QString& path)
-{
-    Q_UNUSED(path)
-    QSqlDatabase old = document->database();
-    const QString oldPath = document->getFilepath();
-    QString error;
-    const auto failed = [&](const QString& text) {
-        VDRPrompt::critical(tr("SQL Error"), text);
-        return false;
-    };
-    if (!runScript(newDiary, VDRDatabaseSchema::createScriptPath(), error)) {
-        VDRPrompt::critical(tr("Fehler"), tr("Export-Datenbank konnte nicht erstellt werden!"));
-        return false;
-    }
-    VDRDatabaseSchema::createEntryIndexes(newDiary);
-    if (!insertMasterData(old, newDiary, QStringLiteral("id_generator"), QString()))
-        return false;
+// The steps of a follow-up diary; each tells the user when it fails.
+namespace {
 
+bool sqlFailed(const QString& text)
+{
+    VDRPrompt::critical(VDRMasterDataExport::tr("SQL Error"), text);
+    return false;
+}
+
+// The predecessor's meta data, but not where it was exported to or from; the file version is this
+// program's.
+bool copyMeta(QSqlDatabase old, QSqlDatabase newDiary)
+{
+    QString error;
     QSqlQuery meta(old);
     meta.prepare(QStringLiteral("SELECT key, value FROM meta WHERE key <> :key1 AND key <> :key2"));
     meta.bindValue(QStringLiteral(":key1"), QStringLiteral("exportedTo"));
     meta.bindValue(QStringLiteral(":key2"), QStringLiteral("exportedFrom"));
     if (!exec(meta, error))
-        return failed(error);
+        return sqlFailed(error);
     QSqlQuery insert(newDiary);
     insert.prepare(QStringLiteral("INSERT INTO meta (key, value) VALUES (:key, :value)"));
     while (meta.next()) {
@@ -278,47 +274,63 @@ bool VDRMasterDataExport::ExportMasterData(VDRDocument* document, QSqlDatabase n
                                                        ? QVariant(VDRDatabaseSchema::currentVersion())
                                                        : meta.value(1));
         if (!exec(insert, error))
-            return failed(error);
+            return sqlFailed(error);
     }
+    return true;
+}
+
+bool copyMasterData(QSqlDatabase old, QSqlDatabase newDiary)
+{
     for (const char* table : {"addresslist", "addresslist_item", "vdr"}) {
-        if (!insertMasterData(old, newDiary, QLatin1String(table), QString()))
+        if (!VDRMasterDataExport::insertMasterData(old, newDiary, QLatin1String(table), QString()))
             return false;
     }
     // The frozen copies of locked reports stay behind with their reports.
-    if (!insertMasterData(old, newDiary, QStringLiteral("company"), QStringLiteral("WHERE category > 0")))
+    if (!VDRMasterDataExport::insertMasterData(old, newDiary, QStringLiteral("company"),
+                                               QStringLiteral("WHERE category > 0")))
         return false;
     // The two logos keep their ids, which vdr names.
-    if (!insertMasterData(
-            old, newDiary, QStringLiteral("image"),
-            QStringLiteral("WHERE id IN (SELECT logo_image_id FROM vdr UNION SELECT logo2_image_id FROM "
-                           "vdr)")))
-        return false;
+    return VDRMasterDataExport::insertMasterData(
+        old, newDiary, QStringLiteral("image"),
+        QStringLiteral("WHERE id IN (SELECT logo_image_id FROM vdr UNION SELECT logo2_image_id FROM "
+                       "vdr)"));
+}
 
+// The new diary knows the predecessor's report numbers and where it came from.
+bool copyReportNumbers(QSqlDatabase old, QSqlDatabase newDiary, const QString& oldPath)
+{
+    QString error;
     QSqlQuery numbers(old);
     if (!numbers.exec(QStringLiteral("SELECT number FROM entry")))
-        return failed(numbers.lastError().text());
+        return sqlFailed(numbers.lastError().text());
+    QSqlQuery insert(newDiary);
     insert.prepare(
         QStringLiteral("INSERT INTO external_entry_number (number, filepath) VALUES (:number, :filepath)"));
     while (numbers.next()) {
         insert.bindValue(QStringLiteral(":number"), numbers.value(0));
         insert.bindValue(QStringLiteral(":filepath"), oldPath);
         if (!exec(insert, error))
-            return failed(error);
+            return sqlFailed(error);
     }
     insert.prepare(QStringLiteral("INSERT INTO meta (key, value) VALUES (:key, :value)"));
     insert.bindValue(QStringLiteral(":key"), QStringLiteral("exportedFrom"));
     insert.bindValue(QStringLiteral(":value"), oldPath);
     if (!exec(insert, error))
-        return failed(error);
+        return sqlFailed(error);
+    return true;
+}
 
-    // The first report takes the next id of the copied counter.
-    int newId = 1;
+// The first report takes the next id of the copied counter.
+bool takeFirstEntryId(QSqlDatabase newDiary, int& newId)
+{
+    QString error;
+    newId = 1;
     QSqlQuery counter(newDiary);
     counter.prepare(
         QStringLiteral("SELECT id_table, id_counter FROM id_generator WHERE id_table = :tablename"));
     counter.bindValue(QStringLiteral(":tablename"), QStringLiteral("entry"));
     if (!exec(counter, error))
-        return failed(error);
+        return sqlFailed(error);
     if (counter.next()) {
         newId = counter.value(1).toInt() + 1;
         counter.finish();
@@ -328,15 +340,21 @@ bool VDRMasterDataExport::ExportMasterData(VDRDocument* document, QSqlDatabase n
         update.bindValue(QStringLiteral(":newid"), newId);
         update.bindValue(QStringLiteral(":tablename"), QStringLiteral("entry"));
         if (!exec(update, error))
-            return failed(error);
+            return sqlFailed(error);
     } else {
         QSqlQuery add(newDiary);
         add.prepare(QStringLiteral("INSERT INTO id_generator (id_table, id_counter) VALUES (:tablename, 1)"));
         add.bindValue(QStringLiteral(":tablename"), QStringLiteral("entry"));
         if (!exec(add, error))
-            return failed(error);
+            return sqlFailed(error);
     }
+    return true;
+}
 
+// An empty draft, numbered after the predecessor's highest report.
+bool addFirstReport(QSqlDatabase old, QSqlDatabase newDiary, int newId)
+{
+    QString error;
     const QString number = QString::number(highestNumber(old) + 1).rightJustified(3, QLatin1Char('0')) +
                            QStringLiteral(" (Entwurf)");
     const QTime now = QTime::currentTime();
@@ -361,13 +379,33 @@ bool VDRMasterDataExport::ExportMasterData(VDRDocument* document, QSqlDatabase n
                     QSettings().value(QStringLiteral("entry/UID"), QString()).toString() +
                         QStringLiteral(""));
     if (!exec(entry, error))
-        return failed(error);
+        return sqlFailed(error);
     QSqlQuery counterText(newDiary);
     counterText.prepare(QStringLiteral("UPDATE vdr SET entrycounter = :id WHERE id = 1"));
     counterText.bindValue(QStringLiteral(":id"), newId);
     if (!exec(counterText, error))
-        return failed(error);
+        return sqlFailed(error);
     return true;
+}
+
+} // namespace
+
+bool VDRMasterDataExport::ExportMasterData(VDRDocument* document, QSqlDatabase newDiary, const QString& path)
+{
+    Q_UNUSED(path)
+    QSqlDatabase old = document->database();
+    QString error;
+    if (!runScript(newDiary, VDRDatabaseSchema::createScriptPath(), error)) {
+        VDRPrompt::critical(tr("Fehler"), tr("Export-Datenbank konnte nicht erstellt werden!"));
+        return false;
+    }
+    VDRDatabaseSchema::createEntryIndexes(newDiary);
+    if (!insertMasterData(old, newDiary, QStringLiteral("id_generator"), QString()))
+        return false;
+    int newId = 1;
+    return copyMeta(old, newDiary) && copyMasterData(old, newDiary) &&
+           copyReportNumbers(old, newDiary, document->getFilepath()) && takeFirstEntryId(newDiary, newId) &&
+           addFirstReport(old, newDiary, newId);
 }
 
 int VDRMasterDataExport::createFollowUpDiary(VDRDocument* document, const QString& newPath)

@@ -59,7 +59,7 @@ public:
     static int maxTextChars() { return 1000000; }
     static int maxBlobBytes() { return 52224000; }
 
-    // ---- The format ----
+    // ---- The format (VDRReportSynchronisationFile.cpp) ----
     bool checkFileVersion(QSqlDatabase database, const QString& path);
     bool checkDatabaseName(QSqlDatabase database, const QString& path, const QString& diaryFileName);
     bool getImportVersion(QSqlDatabase database, QDateTime& dateTime);
@@ -120,18 +120,36 @@ private:
         QString name;
     };
 
+    // ---- The exchange file (VDRReportSynchronisationFile.cpp) ----
     // Opens 'path' read-only on the exchange connection; false (the user told) when refused.
     bool openExchangeFile(const QString& path);
     void closeExchangeFile();
+    static int countReports(const QString& path);
+
+    // ---- Runs ----
     int importOpenedFile(QSqlDatabase db, const QString& path, int totalReports, int reportsBefore,
                          int& importedCount, bool& masterDataImported, bool& projectDataChanged);
-    static int countReports(const QString& path);
     QString buildSummary(bool manual) const;
     void runFiles(const QStringList& paths, bool deleteImported, bool& projectDataChanged, bool manual);
 
+    // ---- One report (VDRReportSynchronisationReport.cpp, VDRReportSynchronisationRows.cpp) ----
+    struct ReportImport;
     // One report; the result status.
     int importReport(QSqlDatabase exchangeFile, const QString& path, const QVariantHash& row,
                      const QDateTime& importVersion, VDRReportSynchronisationResult* result);
+    // The steps of one report return 0 to go on, else the report's status.
+    int readReport(const QVariantHash& raw, const QString& path, ReportImport& report);
+    int locateReport(const QDateTime& importVersion, ReportImport& report);
+    bool deletedInDiary(const ReportImport& report);
+    // Replaces or adds the report in one savepoint; false with the reason in the report's error.
+    bool writeReport(QSqlDatabase exchangeFile, const QString& path, const QDateTime& importVersion,
+                     ReportImport& report);
+    bool removeReplacedRows(ReportImport& report);
+    bool writeEntryRow(const QString& path, const QDateTime& importVersion, ReportImport& report);
+    bool updateEntryCounter(ReportImport& report);
+    bool removeUnusedMedia(const ReportImport& report);
+    // Tells the user; the status of a report refused for a database error.
+    int reportFailed(const QString& text);
     int entryBySynchId(int id, const QString& userId, const QDateTime& creationDate, int& row);
     bool checkReportVersion(int id, const QDateTime& importVersion);
     bool checkImportedReportNumber(const QString& number, const QDate& date, const QTime& time,
@@ -142,7 +160,19 @@ private:
     bool storeIdCounters();
     void renumber(int entryId, int highestNumber, int highestId, VDRReportSynchronisationResult* result);
     void refreshModels();
+    // VDRReportSynchronisationDocuments.cpp
     void importDocuments(const QHash<int, QList<ReplacedDocument>>& replaced);
+
+    // ---- The steps of importMasterData: false or a result other than 0 ends it ----
+    struct MasterDataRow;
+    bool masterDataImportable(QSqlDatabase exchangeFile, const QString& path, bool& keepCompanies);
+    int readProjectData(QSqlDatabase exchangeFile, const QString& path, QList<MasterDataRow>& projects);
+    int readCompanies(QSqlDatabase exchangeFile, const QString& path, QList<MasterDataRow>& companies);
+    int writeMasterData(const QString& path, const QList<MasterDataRow>& projects,
+                        const QList<MasterDataRow>& companies, bool keepCompanies);
+    int writeProjectData(const QString& path, const QList<MasterDataRow>& projects);
+    int replaceCompanies(const QString& path, const QList<MasterDataRow>& companies);
+
     void message(int kind, const QString& title, const QString& text);
 
     VDRDocument* m_document;

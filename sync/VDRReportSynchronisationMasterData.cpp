@@ -48,16 +48,74 @@ int countOf(QSqlDatabase db, const QString& sql, bool* ok = nullptr)
     return done ? q.value(0).toInt() : 0;
 }
 
+// The id and the checked values of one row; false with the first failure in 'error'.
+bool convertMasterDataRow(const QSqlQuery& q, const std::vector<Column>& columns, QVariant& id,
+                          QVariantHash& values, QString& error)
+{
+    bool ok = convertValue(q.value(0), {"id", KInt, true}, id, error);
+    for (const Column& c : columns) {
+        QVariant v;
+        ok = ok && convertValue(q.value(QLatin1String(c.name)), c, v, error);
+        values.insert(QLatin1String(c.name), v);
+    }
+    return ok;
+}
+
 } // namespace
+
+// A row of the project data or of the company list, read and checked.
+struct VDRReportSynchronisation::MasterDataRow
+{
+    int id;
+    QVariantHash values;
+};
 
 int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const QString& path,
                                                bool& companiesChanged, bool& projectDataChanged)
 {
     companiesChanged = false;
     projectDataChanged = false;
+    bool keepCompanies = false;
+    if (!masterDataImportable(exchangeFile, path, keepCompanies))
+        return 1;
+    VDRPrompt::instance()->noticeText(tr("Stammdaten werden aktualisiert ..."));
+
+    // Read and check everything first; then write it in one savepoint.
+    QList<MasterDataRow> projects;
+    int result = readProjectData(exchangeFile, path, projects);
+    if (result != 0)
+        return result;
+    QList<MasterDataRow> companies;
+    if (!keepCompanies) {
+        result = readCompanies(exchangeFile, path, companies);
+        if (result != 0)
+            return result;
+    }
+    result = writeMasterData(path, projects, companies, keepCompanies);
+    if (result != 0)
+        return result;
+
+    projectDataChanged = !projects.isEmpty();
+    companiesChanged = !keepCompanies;
+    if (m_document->modelVdr())
+        m_document->modelVdr()->select();
+    if (companiesChanged) {
+        if (m_document->modelCompany1())
+            m_document->modelCompany1()->select();
+        if (m_document->modelCompany2())
+            m_document->modelCompany2()->select();
+    }
+    m_document->setModified(true);
+    return 0;
+}
+
+// Whether the file's master data may replace the diary's; 'keepCompanies' when the file has no
+// companies and the user keeps the diary's.
+bool VDRReportSynchronisation::masterDataImportable(QSqlDatabase exchangeFile, const QString& path,
+                                                    bool& keepCompanies)
+{
     QSqlDatabase diary = m_document->database();
     const QString syncTitle = tr("Synchronisationsfehler");
-    const QString dbTitle = tr("Datenbankfehler");
 
     // Companies frozen for reports locked since the app last got the master data would be lost.
     const int fileFrozen =
@@ -71,7 +129,7 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
                    "mobile Gerät nicht durchgeführt wurde.\nBitte aktualisieren Sie zunächst die Stammdaten "
                    "in der "
                    "App und wiederholen Sie anschließend die Synchronisation."));
-        return 1;
+        return false;
     }
     const int vdrCount = countOf(exchangeFile, QStringLiteral("SELECT Count(*) FROM vdr"));
     const int companyCount = countOf(exchangeFile, QStringLiteral("SELECT Count(*) FROM company"));
@@ -81,9 +139,9 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
                    "wenden Sie "
                    "sich an den Support.")
                     .arg(path));
-        return 1;
+        return false;
     }
-    bool keepCompanies = false;
+    keepCompanies = false;
     if (companyCount == 0 &&
         countOf(diary, QStringLiteral("SELECT Count(*) FROM company WHERE category IN (1, -1, 2, -2)")) > 0) {
         for (int i = 0; i < m_busy; ++i)
@@ -99,95 +157,103 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
             VDRPrompt::instance()->setBusy(true);
         keepCompanies = answer != 0;
     }
-    VDRPrompt::instance()->noticeText(tr("Stammdaten werden aktualisiert ..."));
+    return true;
+}
 
-    // Read and check everything first; then write it in one savepoint.
-    struct Row
-    {
-        int id;
-        QVariantHash values;
-    };
-    QList<Row> projects;
-    {
-        QSqlQuery q(exchangeFile);
-        if (!q.exec(QStringLiteral(
-                "SELECT id, name, headline_left, headline_center, headline_right, footer_left, "
-                "footer_center, footer_right, createdate FROM vdr"))) {
-            message(VDRPrompt::Critical, dbTitle,
-                    tr("Die Tabelle 'vdr' der Datei\n%1\n konnte nicht importiert werden.\n%2")
-                        .arg(path, q.lastError().text()));
+int VDRReportSynchronisation::readProjectData(QSqlDatabase exchangeFile, const QString& path,
+                                              QList<MasterDataRow>& projects)
+{
+    const QString dbTitle = tr("Datenbankfehler");
+    QSqlQuery q(exchangeFile);
+    if (!q.exec(
+            QStringLiteral("SELECT id, name, headline_left, headline_center, headline_right, footer_left, "
+                           "footer_center, footer_right, createdate FROM vdr"))) {
+        message(VDRPrompt::Critical, dbTitle,
+                tr("Die Tabelle 'vdr' der Datei\n%1\n konnte nicht importiert werden.\n%2")
+                    .arg(path, q.lastError().text()));
+        return 3;
+    }
+    while (q.next()) {
+        MasterDataRow row;
+        QVariant id;
+        QString error;
+        if (!convertMasterDataRow(q, vdrColumns(), id, row.values, error)) {
+            message(
+                VDRPrompt::Critical, dbTitle,
+                tr("Die Tabelle 'vdr' der Datei\n%1\n konnte nicht importiert werden.\n%2").arg(path, error));
             return 3;
         }
-        while (q.next()) {
-            Row row;
-            QVariant id;
-            QString error;
-            bool ok = convertValue(q.value(0), {"id", KInt, true}, id, error);
-            for (const Column& c : vdrColumns()) {
-                QVariant v;
-                ok = ok && convertValue(q.value(QLatin1String(c.name)), c, v, error);
-                row.values.insert(QLatin1String(c.name), v);
-            }
-            if (!ok) {
-                message(VDRPrompt::Critical, dbTitle,
-                        tr("Die Tabelle 'vdr' der Datei\n%1\n konnte nicht importiert werden.\n%2")
-                            .arg(path, error));
-                return 3;
-            }
-            row.id = id.toInt();
-            projects << row;
-        }
+        row.id = id.toInt();
+        projects << row;
     }
-    QList<Row> companies;
-    if (!keepCompanies) {
-        QSqlQuery q(exchangeFile);
-        if (!q.exec(
-                QStringLiteral("SELECT id, type, category, firstname, lastname, company, street, plz, city, "
+    return 0;
+}
+
+int VDRReportSynchronisation::readCompanies(QSqlDatabase exchangeFile, const QString& path,
+                                            QList<MasterDataRow>& companies)
+{
+    QSqlQuery q(exchangeFile);
+    if (!q.exec(QStringLiteral("SELECT id, type, category, firstname, lastname, company, street, plz, city, "
                                "telephone, telefax, mobile, email, pos FROM company ORDER BY id"))) {
-            message(VDRPrompt::Critical, dbTitle,
-                    tr("Die Tabelle 'company' der Datei\n%1\n konnte nicht importiert werden.\n%2")
-                        .arg(path, q.lastError().text()));
+        message(VDRPrompt::Critical, tr("Datenbankfehler"),
+                tr("Die Tabelle 'company' der Datei\n%1\n konnte nicht importiert werden.\n%2")
+                    .arg(path, q.lastError().text()));
+        return 1;
+    }
+    while (q.next()) {
+        MasterDataRow row;
+        QVariant id;
+        QString error;
+        bool ok = convertMasterDataRow(q, companyColumns(), id, row.values, error);
+        const int category = row.values.value(QStringLiteral("category")).toInt();
+        if (ok && category != 1 && category != -1 && category != 2 && category != -2) {
+            ok = false;
+            error = tr("Die Spalte 'category' enthält einen ungültigen Wert: %1").arg(category);
+        }
+        if (ok && id.toInt() <= 0) {
+            ok = false;
+            error = tr("Die Spalte 'id' enthält einen ungültigen Wert: %1").arg(id.toInt());
+        }
+        if (!ok) {
+            message(VDRPrompt::Critical, tr("Synchronisationsfehler"),
+                    tr("Fehler beim Import der Firmenliste der Importdatei\n%1.\nDas Anlegen eines "
+                       "Firmeneintrags "
+                       "ist fehlgeschlagen.\nDie Firmenliste wurde nicht importiert.")
+                            .arg(path) +
+                        QLatin1Char('\n') + error);
             return 1;
         }
-        while (q.next()) {
-            Row row;
-            QVariant id;
-            QString error;
-            bool ok = convertValue(q.value(0), {"id", KInt, true}, id, error);
-            for (const Column& c : companyColumns()) {
-                QVariant v;
-                ok = ok && convertValue(q.value(QLatin1String(c.name)), c, v, error);
-                row.values.insert(QLatin1String(c.name), v);
-            }
-            const int category = row.values.value(QStringLiteral("category")).toInt();
-            if (ok && category != 1 && category != -1 && category != 2 && category != -2) {
-                ok = false;
-                error = tr("Die Spalte 'category' enthält einen ungültigen Wert: %1").arg(category);
-            }
-            if (ok && id.toInt() <= 0) {
-                ok = false;
-                error = tr("Die Spalte 'id' enthält einen ungültigen Wert: %1").arg(id.toInt());
-            }
-            if (!ok) {
-                message(VDRPrompt::Critical, syncTitle,
-                        tr("Fehler beim Import der Firmenliste der Importdatei\n%1.\nDas Anlegen eines "
-                           "Firmeneintrags "
-                           "ist fehlgeschlagen.\nDie Firmenliste wurde nicht importiert.")
-                                .arg(path) +
-                            QLatin1Char('\n') + error);
-                return 1;
-            }
-            row.id = id.toInt();
-            companies << row;
-        }
+        row.id = id.toInt();
+        companies << row;
     }
+    return 0;
+}
 
+int VDRReportSynchronisation::writeMasterData(const QString& path, const QList<MasterDataRow>& projects,
+                                              const QList<MasterDataRow>& companies, bool keepCompanies)
+{
+    QSqlDatabase diary = m_document->database();
     // All of it or nothing: a failure at any row leaves project data and companies as they were.
     m_document->beginTransaction();
     QSqlQuery(diary).exec(QStringLiteral("SAVEPOINT vdx_masterdata"));
-    int result = 0;
-    for (const Row& row : qAsConst(projects)) {
-        QSqlQuery q(diary);
+    int result = writeProjectData(path, projects);
+    if (result == 0 && !keepCompanies)
+        result = replaceCompanies(path, companies);
+    if (result == 0) {
+        QSqlQuery(diary).exec(QStringLiteral("RELEASE vdx_masterdata"));
+    } else {
+        QSqlQuery(diary).exec(QStringLiteral("ROLLBACK TO vdx_masterdata"));
+        QSqlQuery(diary).exec(QStringLiteral("RELEASE vdx_masterdata"));
+    }
+    if (!m_document->endTransaction() && result == 0)
+        result = 1; // the commit failed: nothing was stored, and the user has been told
+    return result;
+}
+
+int VDRReportSynchronisation::writeProjectData(const QString& path, const QList<MasterDataRow>& projects)
+{
+    for (const MasterDataRow& row : projects) {
+        QSqlQuery q(m_document->database());
         q.prepare(
             QStringLiteral("UPDATE vdr SET name = :name, headline_left = :headline_left, headline_center = "
                            ":headline_center, headline_right = :headline_right, footer_left = :footer_left, "
@@ -197,87 +263,65 @@ int VDRReportSynchronisation::importMasterData(QSqlDatabase exchangeFile, const 
             q.bindValue(QLatin1Char(':') + QLatin1String(c.name), row.values.value(QLatin1String(c.name)));
         q.bindValue(QStringLiteral(":id"), row.id);
         if (!q.exec()) {
-            message(VDRPrompt::Critical, dbTitle,
+            message(VDRPrompt::Critical, tr("Datenbankfehler"),
                     tr("Die Tabelle 'vdr' der Datei\n%1\n konnte nicht importiert werden.\n%2")
                         .arg(path, q.lastError().text()));
-            result = 3;
-            break;
+            return 3;
         }
     }
-    if (result == 0 && !keepCompanies) {
-        QSqlQuery remove(diary);
-        if (!remove.exec(QStringLiteral("DELETE FROM company WHERE category IN (1, -1, 2, -2)"))) {
-            message(VDRPrompt::Critical, syncTitle,
-                    tr("Fehler beim Import der Importdatei \n%1.\nDie Firmenliste konnte nicht gelöscht "
-                       "werden.\n\n "
-                       "Bitte wenden Sie sich an den Support.")
-                        .arg(path));
-            result = 1;
-        }
+    return 0;
+}
+
+// The diary's companies give way to the file's, which keep their ids.
+int VDRReportSynchronisation::replaceCompanies(const QString& path, const QList<MasterDataRow>& companies)
+{
+    QSqlDatabase diary = m_document->database();
+    const QString syncTitle = tr("Synchronisationsfehler");
+    QSqlQuery remove(diary);
+    if (!remove.exec(QStringLiteral("DELETE FROM company WHERE category IN (1, -1, 2, -2)"))) {
+        message(VDRPrompt::Critical, syncTitle,
+                tr("Fehler beim Import der Importdatei \n%1.\nDie Firmenliste konnte nicht gelöscht "
+                   "werden.\n\n "
+                   "Bitte wenden Sie sich an den Support.")
+                    .arg(path));
+        return 1;
     }
     int highest = 0;
-    if (result == 0 && !keepCompanies) {
-        QSqlQuery insert(diary);
-        insert.prepare(
-            QStringLiteral("INSERT INTO company (id, category, type, firstname, lastname, company, street, "
-                           "plz, city, telephone, telefax, mobile, email, pos) VALUES (?, ?, ?, ?, ?, ?, ?, "
-                           "?, ?, ?, ?, ?, ?, ?)"));
-        for (const Row& row : qAsConst(companies)) {
-            insert.addBindValue(row.id);
-            for (const Column& c : companyColumns())
-                insert.addBindValue(row.values.value(QLatin1String(c.name)));
-            if (!insert.exec()) {
-                message(VDRPrompt::Critical, syncTitle,
-                        tr("Fehler beim Import der Firmenliste der Importdatei\n%1.\nDas Anlegen eines "
-                           "Firmeneintrags "
-                           "ist fehlgeschlagen.\nDie Firmenliste wurde nicht importiert.")
-                                .arg(path) +
-                            QLatin1Char('\n') + insert.lastError().text());
-                result = 1;
-                break;
-            }
-            highest = std::max(highest, row.id);
-        }
-    }
-    if (result == 0 && !keepCompanies) {
-        // Ids are never handed out twice: the counter only grows.
-        QSqlQuery q(diary);
-        q.prepare(QStringLiteral("UPDATE id_generator SET id_counter = :id WHERE id_table = :tablename;"));
-        q.bindValue(
-            QStringLiteral(":id"),
-            std::max(highest, countOf(diary, QStringLiteral("SELECT id_counter FROM id_generator WHERE "
-                                                            "id_table = 'company'"))));
-        q.bindValue(QStringLiteral(":tablename"), QStringLiteral("company"));
-        if (!q.exec()) {
+    QSqlQuery insert(diary);
+    insert.prepare(
+        QStringLiteral("INSERT INTO company (id, category, type, firstname, lastname, company, street, "
+                       "plz, city, telephone, telefax, mobile, email, pos) VALUES (?, ?, ?, ?, ?, ?, ?, "
+                       "?, ?, ?, ?, ?, ?, ?)"));
+    for (const MasterDataRow& row : companies) {
+        insert.addBindValue(row.id);
+        for (const Column& c : companyColumns())
+            insert.addBindValue(row.values.value(QLatin1String(c.name)));
+        if (!insert.exec()) {
             message(VDRPrompt::Critical, syncTitle,
-                    tr("Update der Tabelle 'id_generator' ist fehlgeschlagen. (Import-Datei %1)\nDie "
-                       "Firmenliste wurde "
-                       "nicht importiert.\n\n%2")
-                        .arg(path, q.lastError().text()));
-            result = 1;
+                    tr("Fehler beim Import der Firmenliste der Importdatei\n%1.\nDas Anlegen eines "
+                       "Firmeneintrags "
+                       "ist fehlgeschlagen.\nDie Firmenliste wurde nicht importiert.")
+                            .arg(path) +
+                        QLatin1Char('\n') + insert.lastError().text());
+            return 1;
         }
+        highest = std::max(highest, row.id);
     }
-    if (result == 0) {
-        QSqlQuery(diary).exec(QStringLiteral("RELEASE vdx_masterdata"));
-    } else {
-        QSqlQuery(diary).exec(QStringLiteral("ROLLBACK TO vdx_masterdata"));
-        QSqlQuery(diary).exec(QStringLiteral("RELEASE vdx_masterdata"));
-    }
-    if (!m_document->endTransaction() && result == 0)
-        result = 1; // the commit failed: nothing was stored, and the user has been told
-    if (result != 0)
-        return result;
 
-    projectDataChanged = !projects.isEmpty();
-    companiesChanged = !keepCompanies;
-    if (m_document->modelVdr())
-        m_document->modelVdr()->select();
-    if (companiesChanged) {
-        if (m_document->modelCompany1())
-            m_document->modelCompany1()->select();
-        if (m_document->modelCompany2())
-            m_document->modelCompany2()->select();
+    // Ids are never handed out twice: the counter only grows.
+    QSqlQuery q(diary);
+    q.prepare(QStringLiteral("UPDATE id_generator SET id_counter = :id WHERE id_table = :tablename;"));
+    q.bindValue(QStringLiteral(":id"),
+                std::max(highest, countOf(diary, QStringLiteral("SELECT id_counter FROM id_generator WHERE "
+                                                                "id_table = 'company'"))));
+    q.bindValue(QStringLiteral(":tablename"), QStringLiteral("company"));
+    if (!q.exec()) {
+        message(VDRPrompt::Critical, syncTitle,
+                tr("Update der Tabelle 'id_generator' ist fehlgeschlagen. (Import-Datei %1)\nDie "
+                   "Firmenliste wurde "
+                   "nicht importiert.\n\n%2")
+                    .arg(path, q.lastError().text()));
+        return 1;
     }
-    m_document->setModified(true);
     return 0;
 }
