@@ -401,6 +401,12 @@ private:
     void cleanUpInterruptedSave(const QString& diaryPath);
     bool compactWorkingCopy();
     int saveDocumentImpl(const QString& path, bool compacted);
+    bool compactIfManyDeletions();
+    bool diaryWritable(bool sameFile);
+    bool currentFormatConfirmed();
+    void closeForSaving();
+    bool writeOverDiary(bool compacted);
+    void finishSave();
     QString vacuumInto(const QString& target);
     int reopenAfterSave(int result);
     bool replaceDiaryKeepingBackups(const QString& temporary);
