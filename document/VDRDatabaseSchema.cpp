@@ -113,6 +113,12 @@ public:
             exec(QStringLiteral("ALTER TABLE %1 ADD %2 %3").arg(table, column, definition));
     }
 
+    void createTable(const QString& table, const QString& statement)
+    {
+        if (!m_failed && !VDRDatabaseSchema::tableExists(m_db, table))
+            exec(statement);
+    }
+
     // Runs 'work' inside one transaction; a failure rolls the step back.
     void transaction(const std::function<void()>& work)
     {
@@ -350,6 +356,132 @@ void upgradeMaterial(Upgrader& u)
     });
 }
 
+void addPhotoCompanyAndDeliveryDocument(Upgrader& u)
+{
+    u.addColumn("entry_photo", "company_id", "INTEGER");
+    u.addColumn("entry_scheduleddelivery", "document", "TEXT");
+}
+
+// The project's number, address and description, what the printout's head and foot show, and a
+// second logo.
+void addProjectDataColumns(Upgrader& u)
+{
+    for (const char* c : {"projectnumber", "projectaddress", "projectdescription"})
+        u.addColumn("vdr", c, "TEXT");
+    for (const char* c : {"show_projectname", "show_projectnumber", "show_headleft", "show_headcenter",
+                          "show_headright", "show_footerleft", "show_footercenter", "show_footerright",
+                          "show_projectaddress", "show_projectdescription"})
+        u.addColumn("vdr", c, "INTEGER NOT NULL DEFAULT 0");
+    for (const char* c : {"show_address1", "show_address2", "show_address3"})
+        u.addColumn("vdr", c, "INTEGER DEFAULT 0");
+    for (const char* c : {"address1", "address2", "address3"})
+        u.addColumn("vdr", c, "INTEGER DEFAULT -1");
+    u.addColumn("vdr", "logo2_image_id", "INTEGER NOT NULL DEFAULT 0");
+    u.addColumn("vdr", "logo2_align", "INTEGER NOT NULL DEFAULT 0");
+}
+
+void addMaterialDocumentAndMeasureLocation(Upgrader& u)
+{
+    u.addColumn("entry_constructionmaterial", "document", "TEXT");
+    u.addColumn("entry_constructionmeasure", "location", "TEXT");
+    u.addColumn("entry_constructionmeasure", "kks", "TEXT");
+}
+
+void createExternalEntryNumberTable(Upgrader& u)
+{
+    u.createTable("external_entry_number",
+                  "CREATE TABLE external_entry_number (number TEXT NOT NULL, filepath TEXT NOT NULL)");
+}
+
+void addReportNoticeColumns(Upgrader& u)
+{
+    u.addColumn("entry", "notice", "TEXT");
+    u.addColumn("entry", "print_notice", "INTEGER NOT NULL DEFAULT 1");
+    u.addColumn("entry", "print_telephone_notice", "INTEGER NOT NULL DEFAULT 1");
+}
+
+void createTelephoneNoticeAndConcernTables(Upgrader& u)
+{
+    u.createTable("entry_telephone_notice",
+                  "CREATE TABLE entry_telephone_notice (id INTEGER NOT NULL PRIMARY KEY, "
+                  "entry_id INTEGER NOT NULL, description TEXT NOT NULL, company_id INTEGER, "
+                  "time TIME NOT NULL)");
+    u.createTable("entry_concern",
+                  "CREATE TABLE entry_concern (id INTEGER NOT NULL PRIMARY KEY, "
+                  "entry_id INTEGER NOT NULL, description TEXT NOT NULL, company_id INTEGER)");
+}
+
+// The rows keep the order they were made in.
+void addWorkforcePositions(Upgrader& u)
+{
+    if (u.hasColumn("entry_workforce", "pos"))
+        return;
+    u.exec("ALTER TABLE entry_workforce ADD pos INTEGER NOT NULL DEFAULT 0");
+    u.exec("UPDATE entry_workforce SET pos=id;");
+}
+
+void createEquipmentTable(Upgrader& u)
+{
+    u.createTable(
+        "entry_equipment",
+        "CREATE TABLE entry_equipment (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
+        "equipment TEXT NOT NULL, operating_zone TEXT NOT NULL, company_id INTEGER, entry_time TIME, "
+        "exit_time TIME, operating_time INTEGER, downtime INTEGER, downtime_reasons TEXT NOT NULL, "
+        "comment TEXT NOT NULL)");
+}
+
+void addProgressRoomColumns(Upgrader& u)
+{
+    u.addColumn("entry_progress", "roomname", "TEXT NOT NULL DEFAULT \"\"");
+    u.addColumn("entry_progress", "roombook_number", "TEXT NOT NULL DEFAULT \"\"");
+}
+
+// Rows the user can reorder; the existing ones keep the order they were made in.
+void addPositionColumns(Upgrader& u)
+{
+    for (const char* table :
+         {"company", "entry_attendee", "entry_progress", "entry_task", "entry_constructionmeasure",
+          "entry_constructionmaterial", "entry_scheduleddelivery", "entry_telephone_notice", "entry_concern",
+          "entry_equipment", "entry_time_recording"}) {
+        if (!u.failed() && VDRDatabaseSchema::tableExists(u.db(), table) && !u.hasColumn(table, "pos")) {
+            u.exec(QStringLiteral("ALTER TABLE %1 ADD pos INTEGER NOT NULL DEFAULT 0")
+                       .arg(QLatin1String(table)));
+            u.exec(QStringLiteral("UPDATE %1 SET pos=id").arg(QLatin1String(table)));
+        }
+    }
+}
+
+void addPhotoRelationAndAudioColumns(Upgrader& u)
+{
+    u.addColumn("entry_photo", "relation_id", "INTEGER");
+    u.addColumn("entry_progress", "image_cnt", "INTEGER");
+    u.addColumn("entry", "progress_audio_id", "INTEGER");
+}
+
+void createAudioTable(Upgrader& u)
+{
+    u.createTable(
+        "audio",
+        "CREATE TABLE audio (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, recording BLOB NOT NULL, "
+        "recording_date DATE NOT NULL, recording_time TIME NOT NULL, "
+        "recording_status INTEGER NOT NULL DEFAULT 0)");
+}
+
+// The report's author, when it was made, and whether the mobile app exported it.
+void addReportAuthorColumns(Upgrader& u)
+{
+    if (u.hasColumn("entry", "user_id"))
+        return;
+    u.exec("ALTER TABLE entry ADD user_id TEXT");
+    u.addColumn("entry", "creation_date", "DATETIME");
+    u.addColumn("entry", "exported_by_app", "INTEGER DEFAULT 0");
+}
+
+void addReportImportVersion(Upgrader& u)
+{
+    u.addColumn("entry", "import_version", "DATETIME");
+}
+
 } // namespace
 
 bool VDRDatabaseSchema::runScript(QSqlDatabase db, const QString& resourcePath, const QString& dbErrorTitle)
@@ -438,96 +570,33 @@ QStringList VDRDatabaseSchema::columns(QSqlDatabase db, const QString& table)
 
 bool VDRDatabaseSchema::upgrade(QSqlDatabase db, bool& extended)
 {
+    // In the order the structure grew: a later step may rely on what an earlier one made.
+    using UpgradeStep = void (*)(Upgrader&);
+    static const UpgradeStep steps[] = {
+        addPhotoCompanyAndDeliveryDocument,
+        addProjectDataColumns,
+        addMaterialDocumentAndMeasureLocation,
+        upgradeProgressDate,
+        createExternalEntryNumberTable,
+        addReportNoticeColumns,
+        createTelephoneNoticeAndConcernTables,
+        upgradeTimeRecording,
+        addWorkforcePositions,
+        upgradeMaterial,
+        createEquipmentTable,
+        addProgressRoomColumns,
+        addPositionColumns,
+        addPhotoRelationAndAudioColumns,
+        createAudioTable,
+        addReportAuthorColumns,
+        addReportImportVersion,
+    };
     Upgrader u(db);
-
-    // 1, 2
-    u.addColumn("entry_photo", "company_id", "INTEGER");
-    u.addColumn("entry_scheduleddelivery", "document", "TEXT");
-    // 3
-    for (const char* c : {"projectnumber", "projectaddress", "projectdescription"})
-        u.addColumn("vdr", c, "TEXT");
-    for (const char* c : {"show_projectname", "show_projectnumber", "show_headleft", "show_headcenter",
-                          "show_headright", "show_footerleft", "show_footercenter", "show_footerright",
-                          "show_projectaddress", "show_projectdescription"})
-        u.addColumn("vdr", c, "INTEGER NOT NULL DEFAULT 0");
-    for (const char* c : {"show_address1", "show_address2", "show_address3"})
-        u.addColumn("vdr", c, "INTEGER DEFAULT 0");
-    for (const char* c : {"address1", "address2", "address3"})
-        u.addColumn("vdr", c, "INTEGER DEFAULT -1");
-    u.addColumn("vdr", "logo2_image_id", "INTEGER NOT NULL DEFAULT 0");
-    u.addColumn("vdr", "logo2_align", "INTEGER NOT NULL DEFAULT 0");
-    // 4, 5
-    u.addColumn("entry_constructionmaterial", "document", "TEXT");
-    u.addColumn("entry_constructionmeasure", "location", "TEXT");
-    u.addColumn("entry_constructionmeasure", "kks", "TEXT");
-    // 6
-    if (!u.failed())
-        upgradeProgressDate(u);
-    // 7
-    if (!u.failed() && !tableExists(db, "external_entry_number"))
-        u.exec("CREATE TABLE external_entry_number (number TEXT NOT NULL, filepath TEXT NOT NULL)");
-    // 8
-    u.addColumn("entry", "notice", "TEXT");
-    u.addColumn("entry", "print_notice", "INTEGER NOT NULL DEFAULT 1");
-    u.addColumn("entry", "print_telephone_notice", "INTEGER NOT NULL DEFAULT 1");
-    // 9, 10
-    if (!u.failed() && !tableExists(db, "entry_telephone_notice"))
-        u.exec("CREATE TABLE entry_telephone_notice (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT "
-               "NULL, "
-               "description TEXT NOT NULL, company_id INTEGER, time TIME NOT NULL)");
-    if (!u.failed() && !tableExists(db, "entry_concern"))
-        u.exec("CREATE TABLE entry_concern (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
-               "description TEXT NOT NULL, company_id INTEGER)");
-    // 11
-    if (!u.failed())
-        upgradeTimeRecording(u);
-    // 12
-    if (!u.failed() && !u.hasColumn("entry_workforce", "pos")) {
-        u.exec("ALTER TABLE entry_workforce ADD pos INTEGER NOT NULL DEFAULT 0");
-        u.exec("UPDATE entry_workforce SET pos=id;");
+    for (const UpgradeStep step : steps) {
+        if (u.failed())
+            break;
+        step(u);
     }
-    // 13
-    if (!u.failed())
-        upgradeMaterial(u);
-    // 14
-    if (!u.failed() && !tableExists(db, "entry_equipment"))
-        u.exec("CREATE TABLE entry_equipment (id INTEGER NOT NULL PRIMARY KEY, entry_id INTEGER NOT NULL, "
-               "equipment TEXT NOT NULL, operating_zone TEXT NOT NULL, company_id INTEGER, entry_time TIME, "
-               "exit_time TIME, operating_time INTEGER, downtime INTEGER, downtime_reasons TEXT NOT NULL, "
-               "comment TEXT NOT NULL)");
-    // 15
-    u.addColumn("entry_progress", "roomname", "TEXT NOT NULL DEFAULT \"\"");
-    u.addColumn("entry_progress", "roombook_number", "TEXT NOT NULL DEFAULT \"\"");
-    // 16
-    for (const char* table :
-         {"company", "entry_attendee", "entry_progress", "entry_task", "entry_constructionmeasure",
-          "entry_constructionmaterial", "entry_scheduleddelivery", "entry_telephone_notice", "entry_concern",
-          "entry_equipment", "entry_time_recording"}) {
-        if (!u.failed() && tableExists(db, table) && !u.hasColumn(table, "pos")) {
-            u.exec(QStringLiteral("ALTER TABLE %1 ADD pos INTEGER NOT NULL DEFAULT 0")
-                       .arg(QLatin1String(table)));
-            u.exec(QStringLiteral("UPDATE %1 SET pos=id").arg(QLatin1String(table)));
-        }
-    }
-    // 17 to 19
-    u.addColumn("entry_photo", "relation_id", "INTEGER");
-    u.addColumn("entry_progress", "image_cnt", "INTEGER");
-    u.addColumn("entry", "progress_audio_id", "INTEGER");
-    // 20
-    if (!u.failed() && !tableExists(db, "audio"))
-        u.exec(
-            "CREATE TABLE audio (id INTEGER NOT NULL PRIMARY KEY AUTOINCREMENT, recording BLOB NOT NULL, "
-            "recording_date DATE NOT NULL, recording_time TIME NOT NULL, recording_status INTEGER NOT NULL "
-            "DEFAULT 0)");
-    // 21
-    if (!u.failed() && !u.hasColumn("entry", "user_id")) {
-        u.exec("ALTER TABLE entry ADD user_id TEXT");
-        u.addColumn("entry", "creation_date", "DATETIME");
-        u.addColumn("entry", "exported_by_app", "INTEGER DEFAULT 0");
-    }
-    // 22
-    u.addColumn("entry", "import_version", "DATETIME");
-
     extended = u.extended();
     return !u.failed();
 }

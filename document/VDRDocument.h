@@ -386,7 +386,37 @@ private:
     bool openWorkingCopyConnection(bool showErrors);
     void closeConnection();
     void abandonOpening(bool removeWorkingCopy);
-    bool openDocumentImpl(const QString& path, bool& showError);
+
+    // What an opening step tells the sequence: go on with the next step, refuse (the caller adds
+    // its general message), refuse quietly (the step has explained why), or start again with the
+    // file in Opening::reopenPath.
+    enum class OpenStep
+    {
+        GoOn,
+        Refused,
+        RefusedQuietly,
+        Reopen
+    };
+    struct Opening;
+    OpenStep runOpeningSteps(Opening& o);
+    OpenStep checkDiaryFile(Opening& o);
+    OpenStep inspectExistingWorkingCopy(Opening& o);
+    OpenStep copyWorkingCopyForInspection(const Opening& o, QString& probed);
+    OpenStep detectDemo(Opening& o);
+    OpenStep prepareWorkingCopy(Opening& o);
+    OpenStep makeWorkingCopy(Opening& o);
+    OpenStep readVersionAndIntegrity(Opening& o);
+    OpenStep offerBackupIfDamaged(Opening& o);
+    OpenStep offerRestoringBackup(Opening& o, const QString& head, const QString& backup);
+    OpenStep askToOpenDamaged(const QString& head, int backups);
+    OpenStep refuseNewerVersion(Opening& o);
+    OpenStep ensureWritable(Opening& o);
+    OpenStep takeLock(Opening& o);
+    OpenStep requireCoreTables(Opening& o);
+    OpenStep upgradeAndWarn(Opening& o);
+    OpenStep importPendingDocuments(Opening& o);
+    OpenStep finishOpening(Opening& o);
+
     VDRSqlTableModel* createModel(VDRSqlTableModel::TABLE_NAMES table, const QString& filter);
     void releaseEntryModels();
     bool entryModelsDirty(int entryId) const;
@@ -401,6 +431,12 @@ private:
     void cleanUpInterruptedSave(const QString& diaryPath);
     bool compactWorkingCopy();
     int saveDocumentImpl(const QString& path, bool compacted);
+    bool compactIfManyDeletions();
+    bool diaryWritable(bool sameFile);
+    bool currentFormatConfirmed();
+    void closeForSaving();
+    bool writeOverDiary(bool compacted);
+    void finishSave();
     QString vacuumInto(const QString& target);
     int reopenAfterSave(int result);
     bool replaceDiaryKeepingBackups(const QString& temporary);

@@ -388,55 +388,85 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
     const QString target = path.isEmpty() ? m_filePath : QFileInfo(path).absoluteFilePath();
     const bool sameFile = path.isEmpty() || target == m_filePath;
 
-    // 2: many deletions fragment the file; offer to compact it on the way.
-    QSettings settings;
-    if ((m_deletedImages > 4 || m_deletedAudio > 2) &&
-        !settings.value(dontShowCompactDbMsgSettingsKey(), false).toBool()) {
-        const QString first = m_deletedImages > 4 ? tr("Es wurden mehrere Bilder gelöscht.\n")
-                                                  : tr("Es wurden mehrere Diktate gelöscht.\n");
-        const QString text =
-            first +
-            tr("\nDas Löschen von Daten führt zur Fragmentierung der Datenbank-Datei.\nDurch das Bereinigen "
-               "der "
-               "Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
-               "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann zu einer z.T. erheblichen "
-               "Reduzierung der Dateigröße führen.\n");
-        bool dontShow = false;
-        const int choice = VDRPrompt::instance()->choose(VDRPrompt::Question, tr("Speichern"), text,
-                                                         {tr("Datenbank bereinigen"), tr("Abbrechen")}, 0, 1,
-                                                         tr("Diese Meldung nicht mehr anzeigen"), &dontShow);
-        if (dontShow)
-            settings.setValue(dontShowCompactDbMsgSettingsKey(), true);
-        if (choice == 0 && !compactWorkingCopy())
-            return 2;
-    }
-
-    // 3
-    if (sameFile && !m_filePath.isEmpty() && QFileInfo::exists(m_filePath) &&
-        !VDRFileOps::isWritable(m_filePath)) {
-        VDRPrompt::critical(
-            tr("Speicher-Fehler"),
-            tr("Sie können die Datei %1 nicht speichern, da sie keine Schreibrechte besitzen.\nWählen "
-               "Sie im Menü 'Datei' den Menüpunkt 'Speichern unter',\num die Datei unter einem anderen "
-               "Namen oder in einen anderen Ordner zu speichern.\n")
-                .arg(nativePath(m_filePath)));
+    if (!compactIfManyDeletions())
+        return 2;
+    if (!diaryWritable(sameFile) || !currentFormatConfirmed())
         return 1;
-    }
-    // 4
-    if (m_structureExtended && !m_currentFormatAccepted) {
-        const VDRPrompt::StandardButton answer = VDRPrompt::instance()->question(
-            VDRPrompt::Warning, tr("Datei-Warnung"),
-            tr("Das Dokument wurde mit einer früheren Programmversion erstellt.\nWenn Sie das Dokument jetzt "
-               "speichern, wird es im aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht "
-               "mehr mit "
-               "früheren Programmversionen bearbeiten.\n\nVorgang fortsetzen?"),
-            VDRPrompt::Ok | VDRPrompt::Cancel, VDRPrompt::Ok, VDRPrompt::Cancel);
-        if (answer != VDRPrompt::Ok)
-            return 1;
-    }
     VDRBusyCursor busy;
 
-    // 5, 6
+    closeForSaving();
+    if (sameFile) {
+        if (!writeOverDiary(compacted))
+            return reopenAfterSave(2);
+    } else {
+        if (!saveAs(target))
+            return reopenAfterSave(2);
+        m_saved = false; // the new file's next save keeps this state as its backup
+    }
+    finishSave();
+    return reopenAfterSave(0);
+}
+
+// Many deletions fragment the file; saving offers to compact it on the way. False only when the
+// compaction the user chose failed.
+bool VDRDocument::compactIfManyDeletions()
+{
+    QSettings settings;
+    if ((m_deletedImages <= 4 && m_deletedAudio <= 2) ||
+        settings.value(dontShowCompactDbMsgSettingsKey(), false).toBool())
+        return true;
+    const QString first = m_deletedImages > 4 ? tr("Es wurden mehrere Bilder gelöscht.\n")
+                                              : tr("Es wurden mehrere Diktate gelöscht.\n");
+    const QString text =
+        first +
+        tr("\nDas Löschen von Daten führt zur Fragmentierung der Datenbank-Datei.\nDurch das Bereinigen "
+           "der "
+           "Datenbank werden die Tabellendaten zusammenhängend angeordnet und die "
+           "Datenbankdatei-Struktur wird neu organisiert.\nDieser Vorgang kann zu einer z.T. erheblichen "
+           "Reduzierung der Dateigröße führen.\n");
+    bool dontShow = false;
+    const int choice = VDRPrompt::instance()->choose(VDRPrompt::Question, tr("Speichern"), text,
+                                                     {tr("Datenbank bereinigen"), tr("Abbrechen")}, 0, 1,
+                                                     tr("Diese Meldung nicht mehr anzeigen"), &dontShow);
+    if (dontShow)
+        settings.setValue(dontShowCompactDbMsgSettingsKey(), true);
+    return choice != 0 || compactWorkingCopy();
+}
+
+// A diary without write permission is saved only under another name.
+bool VDRDocument::diaryWritable(bool sameFile)
+{
+    if (!sameFile || m_filePath.isEmpty() || !QFileInfo::exists(m_filePath) ||
+        VDRFileOps::isWritable(m_filePath))
+        return true;
+    VDRPrompt::critical(
+        tr("Speicher-Fehler"),
+        tr("Sie können die Datei %1 nicht speichern, da sie keine Schreibrechte besitzen.\nWählen "
+           "Sie im Menü 'Datei' den Menüpunkt 'Speichern unter',\num die Datei unter einem anderen "
+           "Namen oder in einen anderen Ordner zu speichern.\n")
+            .arg(nativePath(m_filePath)));
+    return false;
+}
+
+// An upgraded older diary, once saved, no longer opens in earlier versions: the user agrees first.
+bool VDRDocument::currentFormatConfirmed()
+{
+    if (!m_structureExtended || m_currentFormatAccepted)
+        return true;
+    const VDRPrompt::StandardButton answer = VDRPrompt::instance()->question(
+        VDRPrompt::Warning, tr("Datei-Warnung"),
+        tr("Das Dokument wurde mit einer früheren Programmversion erstellt.\nWenn Sie das Dokument jetzt "
+           "speichern, wird es im aktuellen Dateiformat gespeichert.\nSie können das Dokument dann nicht "
+           "mehr mit "
+           "früheren Programmversionen bearbeiten.\n\nVorgang fortsetzen?"),
+        VDRPrompt::Ok | VDRPrompt::Cancel, VDRPrompt::Ok, VDRPrompt::Cancel);
+    return answer == VDRPrompt::Ok;
+}
+
+// The working copy is copied closed: the models give up their statements and every transaction
+// ends first. reopenAfterSave() brings it all back.
+void VDRDocument::closeForSaving()
+{
     setMetaValue(QStringLiteral("fileversion"), VDRDatabaseSchema::currentVersion());
     emit documentClosed(this);
     m_valid = false;
@@ -444,43 +474,40 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
     while (m_transactionDepth > 0)
         endTransaction();
     closeConnection();
+}
 
-    // 7, 8
-    if (sameFile) {
-        if (m_filePath.isEmpty()) {
-            VDRPrompt::critical(tr("interner Fehler"), tr("Dateiname fehlt."));
-            return reopenAfterSave(2);
-        }
-        QString temporary;
-        if (compacted) {
-            temporary = vacuumInto(m_filePath);
-            if (temporary.isEmpty())
-                return reopenAfterSave(2);
-        } else {
-            temporary = copyCheckedWorkingCopy(
-                m_filePath, tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
-            if (temporary.isEmpty())
-                return reopenAfterSave(2);
-        }
-        if (!replaceDiaryKeepingBackups(temporary)) {
-            QFile::remove(temporary);
-            return reopenAfterSave(2);
-        }
-        // Edits go on from the compacted state. Should this copy fail, the old working copy stays:
-        // it holds the same data, only larger.
-        if (compacted) {
-            QFile::remove(m_workingCopyPath + QStringLiteral("-journal"));
-            if (!VDRFileOps::copyDurably(m_filePath, m_workingCopyPath))
-                qWarning().noquote() << "working copy not replaced by the compacted diary:"
-                                     << m_workingCopyPath;
-        }
-    } else {
-        if (!saveAs(target))
-            return reopenAfterSave(2);
-        m_saved = false; // the new file's next save keeps this state as its backup
+// Saves the closed working copy over the diary, the previous diary becoming the newest backup.
+// False after a failure, explained to the user.
+bool VDRDocument::writeOverDiary(bool compacted)
+{
+    if (m_filePath.isEmpty()) {
+        VDRPrompt::critical(tr("interner Fehler"), tr("Dateiname fehlt."));
+        return false;
     }
+    const QString temporary =
+        compacted
+            ? vacuumInto(m_filePath)
+            : copyCheckedWorkingCopy(
+                  m_filePath, tr("Kopieren der Datei\n%1\n fehlgeschlagen.").arg(nativePath(m_filePath)));
+    if (temporary.isEmpty())
+        return false;
+    if (!replaceDiaryKeepingBackups(temporary)) {
+        QFile::remove(temporary);
+        return false;
+    }
+    // Edits go on from the compacted state. Should this copy fail, the old working copy stays:
+    // it holds the same data, only larger.
+    if (compacted) {
+        QFile::remove(m_workingCopyPath + QStringLiteral("-journal"));
+        if (!VDRFileOps::copyDurably(m_filePath, m_workingCopyPath))
+            qWarning().noquote() << "working copy not replaced by the compacted diary:" << m_workingCopyPath;
+    }
+    return true;
+}
 
-    // 9
+// The diary is saved: its documents database follows, and the temporary files of the saved state go.
+void VDRDocument::finishSave()
+{
     VDRDocumentsDb::storeChangesOnDocumentsDb(m_filePath);
     QStringList stillInUse;
     for (const QString& file : qAsConst(m_filesToRemove)) {
@@ -492,7 +519,6 @@ int VDRDocument::saveDocumentImpl(const QString& path, bool compacted)
     m_filesToRemove = stillInUse;
     m_fileVersion = VDRDatabaseSchema::currentVersion();
     m_structureExtended = false;
-    return reopenAfterSave(0);
 }
 
 QString VDRDocument::getBackupFile4Restore(const QString& path, int& count)
