@@ -1,5 +1,6 @@
 #pragma once
 
+#include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 
 // Three rows in every list of one report, through the document's own operations, submitted.
@@ -23,4 +24,13 @@ inline void fillEveryList(VDRDocument& doc, int id)
     }
     for (VDRSqlTableModel* m : doc.entryModels(id))
         m->submitAll();
+}
+
+// The report's sub-tables the benchmarks copy and read row by row: all but time records and photos.
+inline QStringList benchSubTables()
+{
+    QStringList tables = VDRDatabaseSchema::reportTables();
+    tables.removeOne(QStringLiteral("entry_time_recording"));
+    tables.removeOne(QStringLiteral("entry_photo"));
+    return tables;
 }

@@ -50,16 +50,7 @@ bool exec(QSqlQuery& q, const QString& sql)
     return false;
 }
 
-const char* const kSubTables[] = {"entry_attendee",
-                                  "entry_workforce",
-                                  "entry_progress",
-                                  "entry_task",
-                                  "entry_constructionmeasure",
-                                  "entry_constructionmaterial",
-                                  "entry_scheduleddelivery",
-                                  "entry_telephone_notice",
-                                  "entry_concern",
-                                  "entry_equipment"};
+const QStringList kSubTables = benchSubTables();
 
 // One report filled through the document's own operations, then copied with SQL to 'reports'.
 bool generate(VDRDocument& doc, int reports)
@@ -94,14 +85,14 @@ bool generate(VDRDocument& doc, int reports)
     bool ok = exec(q, QStringLiteral("INSERT INTO entry (%1) SELECT %2 FROM entry, seq WHERE id = %3")
                           .arg(entryCols.join(','), select.join(','))
                           .arg(id));
-    for (const char* table : kSubTables) {
-        const QStringList cols = columns(QLatin1String(table));
+    for (const QString& table : kSubTables) {
+        const QStringList cols = columns(table);
         QStringList sel = cols;
         sel.replaceInStrings(QRegularExpression(QStringLiteral("^id$")), QStringLiteral("id + k * 1000"));
         sel.replaceInStrings(QRegularExpression(QStringLiteral("^entry_id$")),
                              QStringLiteral("entry_id + k"));
         ok &= exec(q, QStringLiteral("INSERT INTO %1 (%2) SELECT %3 FROM %1, seq WHERE entry_id = %4")
-                          .arg(QLatin1String(table), cols.join(','), sel.join(','))
+                          .arg(table, cols.join(','), sel.join(','))
                           .arg(id));
     }
     exec(q, QStringLiteral("DROP TABLE seq"));
@@ -120,10 +111,8 @@ double baselineShow(VDRDocument& doc, int id)
     q.exec(QStringLiteral("SELECT * FROM entry WHERE id = %1").arg(id));
     while (q.next()) {
     }
-    for (const char* table : kSubTables) {
-        q.exec(QStringLiteral("SELECT * FROM %1 WHERE entry_id = %2 ORDER BY pos")
-                   .arg(QLatin1String(table))
-                   .arg(id));
+    for (const QString& table : kSubTables) {
+        q.exec(QStringLiteral("SELECT * FROM %1 WHERE entry_id = %2 ORDER BY pos").arg(table).arg(id));
         while (q.next()) {
         }
     }

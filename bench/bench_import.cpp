@@ -6,6 +6,7 @@
 // --json prints one JSON object on stdout (progress goes to stderr): reports, seconds (the import),
 // baseline_seconds, ratio and peak_rss_mb.
 #include "VDRExchangeFileBuilder.h"
+#include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
 #include "sync/VDRReportSynchronisation.h"
@@ -108,6 +109,9 @@ bool writeExchangeFile(const QString& path, int reports)
 // offset, no checks, one transaction.
 double copyWithPlainSql(const QString& diary, const QString& exchange)
 {
+    const QStringList tables =
+        QStringList{QStringLiteral("image"), QStringLiteral("audio"), QStringLiteral("entry")} +
+        VDRDatabaseSchema::reportTables();
     QElapsedTimer timer;
     timer.start();
     {
@@ -122,14 +126,10 @@ double copyWithPlainSql(const QString& diary, const QString& exchange)
         QSqlQuery(target).exec(QStringLiteral("PRAGMA locking_mode = EXCLUSIVE"));
         QSqlQuery(target).exec(QStringLiteral("BEGIN EXCLUSIVE TRANSACTION"));
         const int offset = 100000;
-        for (const char* table :
-             {"image", "audio", "entry", "entry_attendee", "entry_workforce", "entry_time_recording",
-              "entry_progress", "entry_photo", "entry_task", "entry_constructionmeasure",
-              "entry_constructionmaterial", "entry_scheduleddelivery", "entry_telephone_notice",
-              "entry_concern", "entry_equipment"}) {
+        for (const QString& table : tables) {
             QSqlQuery select(source);
             select.setForwardOnly(true);
-            select.exec(QStringLiteral("SELECT * FROM %1").arg(QLatin1String(table)));
+            select.exec(QStringLiteral("SELECT * FROM %1").arg(table));
             const QSqlRecord record = select.record();
             QStringList columns, marks;
             for (int i = 0; i < record.count(); ++i) {
@@ -137,9 +137,8 @@ double copyWithPlainSql(const QString& diary, const QString& exchange)
                 marks << QStringLiteral("?");
             }
             QSqlQuery insert(target);
-            insert.prepare(
-                QStringLiteral("INSERT INTO %1 (%2) VALUES (%3)")
-                    .arg(QLatin1String(table), columns.join(QLatin1Char(',')), marks.join(QLatin1Char(','))));
+            insert.prepare(QStringLiteral("INSERT INTO %1 (%2) VALUES (%3)")
+                               .arg(table, columns.join(QLatin1Char(',')), marks.join(QLatin1Char(','))));
             while (select.next()) {
                 for (int i = 0; i < record.count(); ++i) {
                     const QString name = record.fieldName(i);

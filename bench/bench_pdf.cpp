@@ -42,16 +42,7 @@ FILE* out()
     return g_json ? stderr : stdout;
 }
 
-const char* const kSubTables[] = {"entry_attendee",
-                                  "entry_workforce",
-                                  "entry_progress",
-                                  "entry_task",
-                                  "entry_constructionmeasure",
-                                  "entry_constructionmaterial",
-                                  "entry_scheduleddelivery",
-                                  "entry_telephone_notice",
-                                  "entry_concern",
-                                  "entry_equipment"};
+const QStringList kSubTables = benchSubTables();
 
 // Peak resident memory since the last resetPeak(); the kernel's high-water mark, so that the
 // generation before the measured step does not count.
@@ -153,8 +144,8 @@ bool generate(VDRDocument& doc, int reports, const QString& folder)
                                      "street, plz, city, telephone, telefax, mobile, email, pos) VALUES "
                                      "(900001, 1, 'Rohbau', 'Erika', 'Muster', 'Muster Bau GmbH', "
                                      "'Hauptstraße 1', '12345', 'Musterstadt', ' ', ' ', ' ', ' ', 0)"));
-    for (const char* table : kSubTables)
-        ok &= fillRows(db, QLatin1String(table), id);
+    for (const QString& table : kSubTables)
+        ok &= fillRows(db, table, id);
     const QString paragraph =
         QStringLiteral("<p>Decke über EG betoniert, Schalung OG begonnen. Bewehrung der Stützen abgenommen, "
                        "<b>Gerüst</b> an der Nordseite ergänzt.</p>");
@@ -192,14 +183,14 @@ bool generate(VDRDocument& doc, int reports, const QString& folder)
     ok &= exec(q, QStringLiteral("INSERT INTO entry (%1) SELECT %2 FROM entry, seq WHERE id = %3")
                       .arg(entryCols.join(','), select.join(','))
                       .arg(id));
-    for (const char* table : kSubTables) {
-        const QStringList cols = columns(db, QLatin1String(table));
+    for (const QString& table : kSubTables) {
+        const QStringList cols = columns(db, table);
         QStringList sel = cols;
         sel.replaceInStrings(QRegularExpression(QStringLiteral("^id$")), QStringLiteral("id + k * 1000"));
         sel.replaceInStrings(QRegularExpression(QStringLiteral("^entry_id$")),
                              QStringLiteral("entry_id + k"));
         ok &= exec(q, QStringLiteral("INSERT INTO %1 (%2) SELECT %3 FROM %1, seq WHERE entry_id = %4")
-                          .arg(QLatin1String(table), cols.join(','), sel.join(','))
+                          .arg(table, cols.join(','), sel.join(','))
                           .arg(id));
     }
     ok &= exec(q, QStringLiteral("DROP TABLE seq"));
@@ -273,10 +264,8 @@ double baseline(QSqlDatabase db, const QList<int>& ids, const QString& path)
         if (q.next())
             for (int i = 0; i < q.record().count(); ++i)
                 draw(q.value(i).toString().remove(QRegularExpression(QStringLiteral("<[^>]*>"))));
-        for (const char* table : kSubTables) {
-            q.exec(QStringLiteral("SELECT * FROM %1 WHERE entry_id = %2 ORDER BY pos")
-                       .arg(QLatin1String(table))
-                       .arg(id));
+        for (const QString& table : kSubTables) {
+            q.exec(QStringLiteral("SELECT * FROM %1 WHERE entry_id = %2 ORDER BY pos").arg(table).arg(id));
             while (q.next()) {
                 QStringList values;
                 for (int i = 0; i < q.record().count(); ++i)

@@ -529,21 +529,33 @@ int VDRDatabaseSchema::compareVersions(const QString& a, const QString& b)
     return 0;
 }
 
+QStringList VDRDatabaseSchema::reportTables()
+{
+    return {QStringLiteral("entry_attendee"),
+            QStringLiteral("entry_workforce"),
+            QStringLiteral("entry_time_recording"),
+            QStringLiteral("entry_progress"),
+            QStringLiteral("entry_photo"),
+            QStringLiteral("entry_task"),
+            QStringLiteral("entry_constructionmeasure"),
+            QStringLiteral("entry_constructionmaterial"),
+            QStringLiteral("entry_scheduleddelivery"),
+            QStringLiteral("entry_telephone_notice"),
+            QStringLiteral("entry_concern"),
+            QStringLiteral("entry_equipment")};
+}
+
 bool VDRDatabaseSchema::createEntryIndexes(QSqlDatabase db)
 {
     // One commit for all, inside the caller's transaction or on its own.
     QSqlQuery savepoint(db);
     savepoint.exec(QStringLiteral("SAVEPOINT entry_indexes"));
     bool ok = true;
-    for (const char* table :
-         {"entry_attendee", "entry_workforce", "entry_time_recording", "entry_progress", "entry_photo",
-          "entry_task", "entry_constructionmeasure", "entry_constructionmaterial", "entry_scheduleddelivery",
-          "entry_telephone_notice", "entry_concern", "entry_equipment"}) {
-        if (!tableExists(db, QLatin1String(table)))
+    for (const QString& table : reportTables()) {
+        if (!tableExists(db, table))
             continue;
         QSqlQuery q(db);
-        if (!q.exec(QStringLiteral("CREATE INDEX IF NOT EXISTS %1_entry_id ON %1(entry_id)")
-                        .arg(QLatin1String(table)))) {
+        if (!q.exec(QStringLiteral("CREATE INDEX IF NOT EXISTS %1_entry_id ON %1(entry_id)").arg(table))) {
             qWarning().noquote() << "index on" << table << "not created:" << q.lastError().text();
             ok = false;
         }

@@ -34,6 +34,8 @@ public:
     // They change no table and no query result, and every SQLite reader and writer keeps them up to
     // date. Missing tables are left out; a failure only costs speed.
     static bool createEntryIndexes(QSqlDatabase db);
+    // The twelve tables of a report's rows, each with its entry_id, in a fixed order.
+    static QStringList reportTables();
 
     static bool tableExists(QSqlDatabase db, const QString& table);
     static QStringList columns(QSqlDatabase db, const QString& table);

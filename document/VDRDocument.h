@@ -1,5 +1,6 @@
 #pragma once
 
+#include "document/VDREntryNumber.h"
 #include "document/VDRSqlTableModel.h"
 
 #include <QDateTime>
@@ -247,6 +248,7 @@ public:
 
     // Report numbers (rows of modelEntryAll()).
     int appendEntry();
+    VDREntryNumber entryNumber(int row) const;
     static int entryNumberDigits(const QString& number);
     int entryNumberDigits(int row) const;
     QString entryNumberString(int row) const;
@@ -260,7 +262,6 @@ public:
     void entrySetNumberText(int row);
     void entryNumbersAddDigit(int digits);
     static QString cutNumber(const QString& number);
-    static QString numberWithUserId(const QString& number, const QString& userId);
 
     bool appendCompany1(const QString& type);
     bool appendCompany2();

@@ -2,6 +2,7 @@
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "document/VDRDocumentsDb.h"
+#include "document/VDREntryNumber.h"
 #include "document/VDRPrompt.h"
 
 #include <QDate>
@@ -16,87 +17,45 @@
 #include <algorithm>
 #include <climits>
 
-namespace {
-const QString kDraftSuffix = QStringLiteral(" (Entwurf)");
-
-QString padded(const QString& digits, int width)
-{
-    return digits.rightJustified(width, QLatin1Char('0'));
-}
-} // namespace
-
 int VDRDocument::entryNumberDigits(const QString& number)
 {
-    int digits = 0;
-    while (digits < number.size() && number.at(digits).isDigit())
-        ++digits;
-    return digits == 0 ? -1 : digits;
-}
-
-int VDRDocument::entryNumberDigits(int row) const
-{
-    return entryNumberDigits(m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString());
+    return VDREntryNumber(number).digits();
 }
 
 QString VDRDocument::cutNumber(const QString& number)
 {
-    int end = 0;
-    while (end < number.size() && number.at(end).isDigit())
-        ++end;
-    if (end == 0) {
-        // Not a number of ours (typed or imported): cutting after "digits and letter" would leave
-        // one character, so only the Entwurf suffix goes.
-        return number.endsWith(kDraftSuffix) ? number.left(number.size() - kDraftSuffix.size()) : number;
-    }
-    if (end < number.size() && !number.at(end).isSpace() && number.at(end) != QLatin1Char('('))
-        ++end; // the letter of an inserted report
-    return number.left(end);
+    return VDREntryNumber(number).withoutDraft();
 }
 
-QString VDRDocument::numberWithUserId(const QString& number, const QString& userId)
+VDREntryNumber VDRDocument::entryNumber(int row) const
 {
-    if (userId.isEmpty())
-        return number;
-    const int bracket = number.indexOf(QLatin1Char('('));
-    if (bracket < 0)
-        return number + QLatin1Char('-') + userId;
-    // "012 (Entwurf)" -> "012-AB (Entwurf)": the id goes before the blank that precedes "(".
-    int insertAt = bracket;
-    if (insertAt > 0 && number.at(insertAt - 1) == QLatin1Char(' '))
-        --insertAt;
-    return number.left(insertAt) + QLatin1Char('-') + userId + number.mid(insertAt);
+    return VDREntryNumber(m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString(),
+                          m_modelEntryAll->data(row, QStringLiteral("user_id"), Qt::EditRole).toString());
+}
+
+int VDRDocument::entryNumberDigits(int row) const
+{
+    return entryNumber(row).digits();
 }
 
 QString VDRDocument::entryNumberString(int row) const
 {
-    return cutNumber(m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString());
+    return entryNumber(row).withoutDraft();
 }
 
 QChar VDRDocument::entryNumberLetter(int row) const
 {
-    const QString number = m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString();
-    const int digits = entryNumberDigits(number);
-    if (digits < 0 || digits >= number.size())
-        return QChar(0);
-    const QChar c = number.at(digits);
-    return (c == QLatin1Char(' ') || c == QLatin1Char('(')) ? QChar(0) : c;
+    return entryNumber(row).letter();
 }
 
 int VDRDocument::entryNumberInt(int row) const
 {
-    const QString number = m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString();
-    const int digits = entryNumberDigits(number);
-    // digitValue also reads non-Latin decimal digits, which QString::toInt does not.
-    qint64 value = 0;
-    for (int i = 0; i < digits && value <= INT_MAX; ++i)
-        value = value * 10 + number.at(i).digitValue();
-    return static_cast<int>(std::min<qint64>(value, INT_MAX));
+    return entryNumber(row).number();
 }
 
 QString VDRDocument::entryNumberWithUserId(int row) const
 {
-    return numberWithUserId(m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString(),
-                            m_modelEntryAll->data(row, QStringLiteral("user_id"), Qt::EditRole).toString());
+    return entryNumber(row).withUserId();
 }
 
 QString VDRDocument::externalEntryNumberString(int row) const
@@ -122,15 +81,8 @@ int VDRDocument::maxEntryNumber() const
     if (q.exec(QStringLiteral("SELECT max(CAST(number AS INTEGER)) FROM entry WHERE number GLOB '[0-9]*'")) &&
         q.next())
         result = std::max<qint64>(0, q.value(0).toLongLong());
-    if (q.exec(QStringLiteral("SELECT number FROM entry WHERE unicode(number) > 127"))) {
-        while (q.next()) {
-            const QString number = q.value(0).toString();
-            qint64 value = 0;
-            for (int i = 0; i < number.size() && number.at(i).isDigit() && value <= INT_MAX; ++i)
-                value = value * 10 + number.at(i).digitValue();
-            result = std::max(result, value);
-        }
-    }
+    if (q.exec(QStringLiteral("SELECT number FROM entry WHERE unicode(number) > 127")))
+        result = std::max<qint64>(result, VDREntryNumber::highestNumber(q));
     return static_cast<int>(std::min<qint64>(result, INT_MAX));
 }
 
@@ -138,17 +90,16 @@ int VDRDocument::maxEntryNumber(int& number, QChar& letter) const
 {
     m_modelEntryAll->fetch_all();
     int bestRow = -1;
-    number = 0;
-    letter = QChar(0);
+    VDREntryNumber best;
     for (int row = 0; row < m_modelEntryAll->rowCount(); ++row) {
-        const int n = entryNumberInt(row);
-        const QChar l = entryNumberLetter(row);
-        if (bestRow < 0 || n > number || (n == number && l > letter)) {
+        const VDREntryNumber candidate = entryNumber(row);
+        if (bestRow < 0 || best < candidate) {
             bestRow = row;
-            number = n;
-            letter = l;
+            best = candidate;
         }
     }
+    number = best.number();
+    letter = best.letter();
     return bestRow;
 }
 
@@ -162,14 +113,16 @@ int VDRDocument::maxEntryID() const
 
 void VDRDocument::entrySetNumberText(int row)
 {
-    const QString number = m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString();
+    const VDREntryNumber number(
+        m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString());
     const bool locked = m_modelEntryAll->data(row, QStringLiteral("locked"), Qt::EditRole).toInt() != 0;
     if (locked) {
-        const QString cut = cutNumber(number);
-        if (cut != number)
+        const QString cut = number.withoutDraft();
+        if (cut != number.text())
             m_modelEntryAll->setData(row, QStringLiteral("number"), cut);
-    } else if (!number.endsWith(kDraftSuffix)) {
-        m_modelEntryAll->setData(row, QStringLiteral("number"), cutNumber(number) + kDraftSuffix);
+    } else if (!number.isDraft()) {
+        m_modelEntryAll->setData(row, QStringLiteral("number"),
+                                 VDREntryNumber::compose(number.withoutDraft(), {}, true));
     }
 }
 
@@ -213,7 +166,7 @@ int VDRDocument::appendEntry()
 
     m_modelEntryAll->fetch_all();
     const int digits = m_modelEntryAll->rowCount() > 0 ? std::max(3, entryNumberDigits(0)) : 3;
-    const QString number = padded(QString::number(n + 1), digits);
+    const QString number = VDREntryNumber::padded(n + 1, digits);
 
     m_modelExternalEntryNumber->fetch_all();
     for (int row = 0; row < m_modelExternalEntryNumber->rowCount(); ++row) {
@@ -221,8 +174,7 @@ int VDRDocument::appendEntry()
         const QString external = externalEntryNumberString(row);
         if (external.isEmpty())
             continue;
-        const int width = std::max(external.size(), number.size());
-        if (padded(external, width) == padded(number, width)) {
+        if (VDREntryNumber::sameNumber(external, number)) {
             const QString file =
                 m_modelExternalEntryNumber->data(row, QStringLiteral("filepath"), Qt::EditRole).toString();
             const VDRPrompt::StandardButton answer = VDRPrompt::instance()->question(
@@ -251,7 +203,7 @@ int VDRDocument::appendEntry()
         {"locked", 0},
         {"persistent_document", QVariant(QVariant::ByteArray)},
         {"persistent_document_ct", QVariant(QVariant::String)},
-        {"number", number + kDraftSuffix},
+        {"number", VDREntryNumber::compose(number, {}, true)},
         {"inspection_date", QDate::currentDate()},
         {"inspection_time_from", now},
         {"inspection_time_to", now},

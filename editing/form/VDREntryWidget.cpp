@@ -1,6 +1,7 @@
 #include "editing/form/VDREntryWidget.h"
 
 #include "document/VDRAllEntryTableModel.h"
+#include "document/VDREntryNumber.h"
 #include "editing/form/VDRDataWidgetMapper.h"
 #include "document/VDRPrompt.h"
 #include "editing/completion/VDRCompleter.h"
@@ -891,12 +892,9 @@ void VDREntryWidget::updateGui()
         return;
     }
     VDRAllEntryTableModel* all = m_document->modelEntryAll();
-    const QString userId = all->data(m_row, QStringLiteral("user_id"), Qt::EditRole).toString();
-    QString number = m_document->entryNumberString(m_row);
-    if (!userId.isEmpty())
-        number += QLatin1Char('-') + userId;
-    if (!isLocked())
-        number += tr(" (Entwurf)");
+    const VDREntryNumber stored = m_document->entryNumber(m_row);
+    const QString& userId = stored.userId();
+    const QString number = VDREntryNumber::compose(stored.withoutDraft(), userId, !isLocked());
     const QVariant rawDate = all->data(m_row, QStringLiteral("inspection_date"), Qt::EditRole);
     const QDate date = rawDate.toDate();
     const QString dateText = QLocale().toString(date, QLocale::ShortFormat);
@@ -999,7 +997,7 @@ void VDREntryWidget::actionNew()
     all->fetch_all();
     const int number = qMax(m_document->entryNumberInt(0), m_document->entryNumberInt(all->rowCount() - 1));
     const int digits = qMax(3, m_document->entryNumberDigits(0));
-    actionGotoNumber(QStringLiteral("%1").arg(number, digits, 10, QLatin1Char('0')));
+    actionGotoNumber(VDREntryNumber::padded(number, digits));
 }
 
 void VDREntryWidget::actionCopy()
@@ -1024,13 +1022,7 @@ bool VDREntryWidget::externalNumberAccepted(const QString& number) const
         return true;
     ext->fetch_all();
     for (int row = 0; row < ext->rowCount(); ++row) {
-        // "12" of the predecessor file is "012" here.
-        QString theirs = m_document->externalEntryNumberString(row);
-        QString ours = number;
-        const int width = qMax(theirs.size(), ours.size());
-        theirs = theirs.rightJustified(width, QLatin1Char('0'));
-        ours = ours.rightJustified(width, QLatin1Char('0'));
-        if (theirs.compare(ours, Qt::CaseInsensitive) != 0)
+        if (!VDREntryNumber::sameNumber(m_document->externalEntryNumberString(row), number))
             continue;
         const QString file = ext->data(row, QStringLiteral("filepath"), Qt::EditRole).toString();
         return VDRPrompt::instance()->question(VDRPrompt::Warning, tr("Warnung"),
@@ -1049,7 +1041,7 @@ void VDREntryWidget::storeNumber(int row, const QString& number)
     all->setData(row, QStringLiteral("number"), number, Qt::EditRole);
     m_document->entrySetNumberText(row);
     VDRSqlTableModel* vdr = m_document->modelVdr();
-    const int value = number.left(VDRDocument::entryNumberDigits(number)).toInt();
+    const int value = number.left(VDREntryNumber(number).digits()).toInt();
     const int vdrRow = vdr->rowById(1);
     if (vdrRow >= 0 && value > vdr->data(vdrRow, QStringLiteral("entrycounter"), Qt::EditRole).toInt())
         vdr->setData(vdrRow, QStringLiteral("entrycounter"), value, Qt::EditRole);
@@ -1108,11 +1100,8 @@ void VDREntryWidget::actionInsert()
     if (!m_document)
         return;
     VDREntryInsertDialog dialog(m_document, this);
-    if (m_row >= 0) {
-        dialog.setEntryNumber(m_document->entryNumberString(m_row));
-        const QChar letter = m_document->entryNumberLetter(m_row);
-        dialog.setEntryLetter(letter.unicode() > 255 ? 0 : char(letter.unicode()));
-    }
+    if (m_row >= 0)
+        dialog.setEntry(m_document->entryNumber(m_row));
     if (dialog.exec() != QDialog::Accepted)
         return;
     const char letter = dialog.getEntryLetter();
@@ -1125,9 +1114,7 @@ void VDREntryWidget::actionAlterNumber()
         return;
     actionAskForSubmit();
     VDREntryNumberDialog dialog(m_document, this);
-    dialog.setEntryNumber(m_document->entryNumberString(m_row));
-    const QChar letter = m_document->entryNumberLetter(m_row);
-    dialog.setEntryLetter(letter.unicode() > 255 ? 0 : char(letter.unicode()));
+    dialog.setEntry(m_document->entryNumber(m_row));
     if (dialog.exec() != QDialog::Accepted)
         return;
     const char chosen = dialog.getEntryLetter();

@@ -2,6 +2,7 @@
 
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "document/VDREntryNumber.h"
 #include "editing/reportlist/QSpinBoxLetter.h"
 
 #include <QFormLayout>
@@ -76,7 +77,7 @@ VDREntryNumberDialog::VDREntryNumberDialog(VDRDocument* document, const QString&
 
 QString VDREntryNumberDialog::getEntryNumber() const
 {
-    return QStringLiteral("%1").arg(m_number->value(), m_digits, 10, QLatin1Char('0'));
+    return VDREntryNumber::padded(m_number->value(), m_digits);
 }
 
 char VDREntryNumberDialog::getEntryLetter() const
@@ -87,13 +88,16 @@ char VDREntryNumberDialog::getEntryLetter() const
 
 void VDREntryNumberDialog::setEntryNumber(const QString& number)
 {
-    // digitValue also reads non-Latin decimal digits; the spin box bounds what is too large.
-    int value = 0;
-    int i = 0;
-    for (; i < number.size() && number.at(i).isDigit() && value < 1000000; ++i)
-        value = value * 10 + number.at(i).digitValue();
-    if (i > 0)
-        m_number->setValue(value);
+    // The spin box bounds what is too large.
+    const VDREntryNumber parsed(number);
+    if (parsed.digits() > 0)
+        m_number->setValue(parsed.number());
+}
+
+void VDREntryNumberDialog::setEntry(const VDREntryNumber& number)
+{
+    setEntryNumber(number.text());
+    m_letter->setValue(number.letterIndex());
 }
 
 void VDREntryNumberDialog::setEntryLetter(char letter)

@@ -6,6 +6,7 @@ class QLabel;
 class QSpinBox;
 class QSpinBoxLetter;
 class VDRDocument;
+class VDREntryNumber;
 
 // Asks for a report number and an optional letter index; the number has the diary's digit count.
 class VDREntryNumberDialog : public QDialog
@@ -22,6 +23,8 @@ public:
     char getEntryLetter() const;
     // Takes the leading digits of a number text ("012a (Entwurf)" presets 12).
     void setEntryNumber(const QString& number);
+    // Number and letter index of a report's number.
+    void setEntry(const VDREntryNumber& number);
     // 0 or a letter 'a' to 'z' (upper case counts the same); anything else clears the letter.
     void setEntryLetter(char letter);
     int digits() const { return m_digits; }

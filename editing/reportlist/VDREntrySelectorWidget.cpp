@@ -2,6 +2,7 @@
 
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "document/VDREntryNumber.h"
 #include "document/VDRPrompt.h"
 
 #include <QButtonGroup>
@@ -19,11 +20,8 @@ namespace {
 // The leading digits of a number field; 'fallback' when there are none.
 int fieldNumber(const QString& text, int fallback)
 {
-    int value = 0;
-    int i = 0;
-    for (; i < text.size() && text.at(i).isDigit() && value < 1000000; ++i)
-        value = value * 10 + text.at(i).digitValue();
-    return i > 0 ? value : fallback;
+    const VDREntryNumber number(text);
+    return number.digits() > 0 ? number.number() : fallback;
 }
 } // namespace
 
