@@ -249,7 +249,6 @@ public:
     // Report numbers (rows of modelEntryAll()).
     int appendEntry();
     VDREntryNumber entryNumber(int row) const;
-    static int entryNumberDigits(const QString& number);
     int entryNumberDigits(int row) const;
     QString entryNumberString(int row) const;
     QChar entryNumberLetter(int row) const;
@@ -257,11 +256,9 @@ public:
     QString entryNumberWithUserId(int row) const;
     QString externalEntryNumberString(int row) const;
     int maxEntryNumber() const;
-    int maxEntryNumber(int& number, QChar& letter) const;
     int maxEntryID() const;
     void entrySetNumberText(int row);
     void entryNumbersAddDigit(int digits);
-    static QString cutNumber(const QString& number);
 
     bool appendCompany1(const QString& type);
     bool appendCompany2();

@@ -17,16 +17,6 @@
 #include <algorithm>
 #include <climits>
 
-int VDRDocument::entryNumberDigits(const QString& number)
-{
-    return VDREntryNumber(number).digits();
-}
-
-QString VDRDocument::cutNumber(const QString& number)
-{
-    return VDREntryNumber(number).withoutDraft();
-}
-
 VDREntryNumber VDRDocument::entryNumber(int row) const
 {
     return VDREntryNumber(m_modelEntryAll->data(row, QStringLiteral("number"), Qt::EditRole).toString(),
@@ -60,8 +50,9 @@ QString VDRDocument::entryNumberWithUserId(int row) const
 
 QString VDRDocument::externalEntryNumberString(int row) const
 {
-    return cutNumber(
-        m_modelExternalEntryNumber->data(row, QStringLiteral("number"), Qt::EditRole).toString());
+    return VDREntryNumber(
+               m_modelExternalEntryNumber->data(row, QStringLiteral("number"), Qt::EditRole).toString())
+        .withoutDraft();
 }
 
 int VDRDocument::maxEntryNumber() const
@@ -84,23 +75,6 @@ int VDRDocument::maxEntryNumber() const
     if (q.exec(QStringLiteral("SELECT number FROM entry WHERE unicode(number) > 127")))
         result = std::max<qint64>(result, VDREntryNumber::highestNumber(q));
     return static_cast<int>(std::min<qint64>(result, INT_MAX));
-}
-
-int VDRDocument::maxEntryNumber(int& number, QChar& letter) const
-{
-    m_modelEntryAll->fetch_all();
-    int bestRow = -1;
-    VDREntryNumber best;
-    for (int row = 0; row < m_modelEntryAll->rowCount(); ++row) {
-        const VDREntryNumber candidate = entryNumber(row);
-        if (bestRow < 0 || best < candidate) {
-            bestRow = row;
-            best = candidate;
-        }
-    }
-    number = best.number();
-    letter = best.letter();
-    return bestRow;
 }
 
 int VDRDocument::maxEntryID() const

@@ -2,6 +2,7 @@
 
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
+#include "document/VDREntryNumber.h"
 #include "document/VDRFileOps.h"
 #include "document/VDRPrompt.h"
 #include "document/VDRScopedConnection.h"
@@ -17,8 +18,6 @@
 #include <QSqlRecord>
 #include <QTime>
 
-#include <algorithm>
-#include <climits>
 #include <sys/stat.h>
 
 namespace {
@@ -95,22 +94,6 @@ bool writeDatabaseFile(const QString& connection, const QString& path,
     if (!ok)
         VDRFileOps::removeDatabase(temporary);
     return ok;
-}
-
-int highestNumber(QSqlDatabase db)
-{
-    QSqlQuery q(db);
-    qint64 result = 0;
-    if (!q.exec(QStringLiteral("SELECT number FROM entry")))
-        return 0;
-    while (q.next()) {
-        const QString number = q.value(0).toString();
-        qint64 value = 0;
-        for (int i = 0; i < number.size() && number.at(i).isDigit() && value <= INT_MAX; ++i)
-            value = value * 10 + number.at(i).digitValue();
-        result = std::max(result, value);
-    }
-    return static_cast<int>(std::min<qint64>(result, INT_MAX));
 }
 
 } // namespace
@@ -355,8 +338,7 @@ bool takeFirstEntryId(QSqlDatabase newDiary, int& newId)
 bool addFirstReport(QSqlDatabase old, QSqlDatabase newDiary, int newId)
 {
     QString error;
-    const QString number = QString::number(highestNumber(old) + 1).rightJustified(3, QLatin1Char('0')) +
-                           QStringLiteral(" (Entwurf)");
+    const QString number = VDREntryNumber::newDraft(VDREntryNumber::highestNumber(old) + 1, 3);
     const QTime now = QTime::currentTime();
     QSqlQuery entry(newDiary);
     entry.prepare(QStringLiteral(

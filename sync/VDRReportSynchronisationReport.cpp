@@ -3,7 +3,9 @@
 #include "sync/VDRReportSynchronisation.h"
 
 #include "document/VDRAllEntryTableModel.h"
+#include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
+#include "document/VDREntryNumber.h"
 #include "document/VDRPrompt.h"
 
 #include <QDebug>
@@ -11,28 +13,11 @@
 #include <QSqlQuery>
 
 #include <algorithm>
-#include <climits>
 
 using namespace VDRExchangeValues;
 using namespace VDRExchangeTables;
 
 namespace {
-
-// Every sub-table of a report in the diary, for removing a replaced report's rows.
-const char* const kReportTables[] = {"entry_attendee",
-                                     "entry_workforce",
-                                     "entry_time_recording",
-                                     "entry_progress",
-                                     "entry_photo",
-                                     "entry_task",
-                                     "entry_constructionmeasure",
-                                     "entry_constructionmaterial",
-                                     "entry_scheduleddelivery",
-                                     "entry_telephone_notice",
-                                     "entry_concern",
-                                     "entry_equipment"};
-
-const QString kDraftSuffix = QStringLiteral(" (Entwurf)");
 
 // Runs a statement on the diary inside a savepoint; logs failures.
 bool execDiary(QSqlDatabase db, const QString& sql)
@@ -96,28 +81,6 @@ bool VDRReportSynchronisation::checkReportVersion(int id, const QDateTime& impor
     return !(stored.isValid() && stored > importVersion);
 }
 
-namespace {
-struct NumberParts
-{
-    int number = 0;
-    QChar letter;
-};
-
-NumberParts numberParts(const QString& text)
-{
-    NumberParts parts;
-    const QString cut = VDRDocument::cutNumber(text.trimmed());
-    const int digits = VDRDocument::entryNumberDigits(cut);
-    qint64 value = 0;
-    for (int i = 0; i < digits && value <= INT_MAX; ++i)
-        value = value * 10 + cut.at(i).digitValue();
-    parts.number = static_cast<int>(std::min<qint64>(value, INT_MAX));
-    if (digits > 0 && digits < cut.size())
-        parts.letter = cut.at(digits);
-    return parts;
-}
-} // namespace
-
 bool VDRReportSynchronisation::checkImportedReportNumber(const QString& number, const QDate& date,
                                                          const QTime& time, int& highestNumber,
                                                          int& highestId)
@@ -130,12 +93,12 @@ bool VDRReportSynchronisation::checkImportedReportNumber(const QString& number, 
                                "CAST(number AS INTEGER) = (SELECT max(CAST(number AS INTEGER)) FROM entry "
                                "WHERE number GLOB '[0-9]*') AND number GLOB '[0-9]*'")))
         return false;
-    NumberParts best;
+    VDREntryNumber best;
     QDate bestDate;
     QTime bestTime;
     while (q.next()) {
-        const NumberParts parts = numberParts(q.value(1).toString());
-        if (highestId < 0 || parts.letter > best.letter) {
+        const VDREntryNumber parts = VDREntryNumber::forComparing(q.value(1).toString());
+        if (highestId < 0 || parts.letter() > best.letter()) {
             best = parts;
             highestId = q.value(0).toInt();
             bestDate = QDate::fromString(q.value(2).toString().left(10), Qt::ISODate);
@@ -146,10 +109,8 @@ bool VDRReportSynchronisation::checkImportedReportNumber(const QString& number, 
     }
     if (highestId < 0)
         return false;
-    highestNumber = best.number;
-    const NumberParts incoming = numberParts(number);
-    const bool notAbove =
-        incoming.number < best.number || (incoming.number == best.number && incoming.letter <= best.letter);
+    highestNumber = best.number();
+    const bool notAbove = VDREntryNumber::forComparing(number).compare(best) <= 0;
     const bool later = date > bestDate || (date == bestDate && time > bestTime);
     return notAbove && later;
 }
@@ -232,7 +193,7 @@ int VDRReportSynchronisation::importReport(QSqlDatabase exchangeFile, const QStr
     m_touchedReports.insert(report.entryId);
     if (report.existingId > 0) {
         result->setReplaced(true);
-        result->setGivenNumber(VDRDocument::cutNumber(report.diaryNumber));
+        result->setGivenNumber(VDREntryNumber(report.diaryNumber).withoutDraft());
         if (!report.replacedDocuments.isEmpty())
             m_replacedDocuments.insert(report.entryId, report.replacedDocuments);
     }
@@ -319,7 +280,7 @@ int VDRReportSynchronisation::locateReport(const QDateTime& importVersion, Repor
     }
 
     const QString number = report.values.value(QStringLiteral("number")).toString();
-    if (numberParts(number).number > 99999) {
+    if (VDREntryNumber::forComparing(number).number() > 99999) {
         message(VDRPrompt::Warning, tr("Bauberichtnummer ungültig "),
                 tr("Sie können keinen Baubericht mit einer Bauberichtnummer größer 99999 anlegen.\n"
                    "Reduzieren Sie die höchste Bauberichtnummer oder legen Sie eine neue Datei an."));
@@ -390,9 +351,9 @@ bool VDRReportSynchronisation::removeReplacedRows(ReportImport& report)
                     {QLatin1String(table), q.value(0).toInt(), q.value(1).toString()});
         }
     }
-    for (const char* table : kReportTables) {
+    for (const QString& table : VDRDatabaseSchema::reportTables()) {
         QSqlQuery d(diary);
-        d.prepare(QStringLiteral("DELETE FROM %1 WHERE entry_id = :id").arg(QLatin1String(table)));
+        d.prepare(QStringLiteral("DELETE FROM %1 WHERE entry_id = :id").arg(table));
         d.bindValue(QStringLiteral(":id"), report.existingId);
         ok = ok && d.exec();
         if (!ok)
@@ -410,7 +371,7 @@ bool VDRReportSynchronisation::writeEntryRow(const QString& path, const QDateTim
     values.insert(QStringLiteral("import_version"), versionText(importVersion));
     QString number =
         report.existingId > 0 ? report.diaryNumber : values.value(QStringLiteral("number")).toString();
-    number = VDRDocument::cutNumber(number) + (report.locked ? QString() : kDraftSuffix);
+    number = VDREntryNumber::compose(VDREntryNumber(number).withoutDraft(), QString(), !report.locked);
     values.insert(QStringLiteral("number"), number);
     QStringList columns;
     for (const Column& c : entryColumns())
@@ -482,13 +443,13 @@ void VDRReportSynchronisation::renumber(int entryId, int highestNumber, int high
     QSqlQuery q(diary);
     int digits = 3;
     if (q.exec(QStringLiteral("SELECT number FROM entry ORDER BY id LIMIT 1")) && q.next())
-        digits = std::max(3, VDRDocument::entryNumberDigits(q.value(0).toString()));
-    const QString proposed = QString::number(highestNumber + 1).rightJustified(digits, QLatin1Char('0'));
+        digits = std::max(3, VDREntryNumber(q.value(0).toString()).digits());
+    const QString proposed = VDREntryNumber::padded(highestNumber + 1, digits);
     QString highestText;
     q.prepare(QStringLiteral("SELECT number FROM entry WHERE id = :id"));
     q.bindValue(QStringLiteral(":id"), highestId);
     if (q.exec() && q.next())
-        highestText = VDRDocument::cutNumber(q.value(0).toString());
+        highestText = VDREntryNumber(q.value(0).toString()).withoutDraft();
 
     bool rename = m_renameAnswer;
     if (!m_renameForAll) {
@@ -515,7 +476,7 @@ void VDRReportSynchronisation::renumber(int entryId, int highestNumber, int high
     const bool locked = q.exec() && q.next() && q.value(0).toInt() != 0;
     QSqlQuery update(diary);
     update.prepare(QStringLiteral("UPDATE entry SET number = :number WHERE id = :id"));
-    update.bindValue(QStringLiteral(":number"), proposed + (locked ? QString() : kDraftSuffix));
+    update.bindValue(QStringLiteral(":number"), VDREntryNumber::compose(proposed, QString(), !locked));
     update.bindValue(QStringLiteral(":id"), entryId);
     if (!update.exec()) {
         qDebug().noquote() << "SQL-Error:" << update.lastError().text();

@@ -2,6 +2,7 @@
 #include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
+#include "document/VDREntryNumber.h"
 
 #include <QPointer>
 #include <QSqlError>
@@ -195,7 +196,7 @@ private slots:
         QCOMPARE(rows("SELECT entrycounter FROM vdr").first().toInt(), counter + 1);
         // Every older number has the new report's digit count.
         for (const QString& number : stored)
-            QCOMPARE(VDRDocument::entryNumberDigits(number), VDRDocument::entryNumberDigits(expectedNew));
+            QCOMPARE(VDREntryNumber(number).digits(), VDREntryNumber(expectedNew).digits());
     }
 
     void numberTexts_data()
