@@ -1,6 +1,6 @@
 #include "VDRExchangeFileBuilder.h"
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "app/KeyPressEater.h"
 #include "app/VDRMainWindow.h"
 #include "app/VDRStartup.h"
@@ -28,7 +28,6 @@
 #include <QSettings>
 #include <QSqlQuery>
 #include <QStatusBar>
-#include <QTemporaryDir>
 #include <QToolBar>
 #include <QTranslator>
 #include <QtTest>
@@ -46,7 +45,7 @@ QString plain(const QString& text)
 } // namespace
 
 // Drives the real main window, headless; every question is answered through the test prompt.
-class TestVDRMainWindow : public QObject
+class TestVDRMainWindow : public VDRTestCase
 {
     Q_OBJECT
 
@@ -54,19 +53,11 @@ public slots:
     // Stands in for the system's browser.
     void openUrl(const QUrl& url) { m_openedUrls << url; }
 
-private slots:
+private:
+    void initRun() override { QDesktopServices::setUrlHandler(QStringLiteral("file"), this, "openUrl"); }
 
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
-        QDesktopServices::setUrlHandler(QStringLiteral("file"), this, "openUrl");
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_openedUrls.clear();
         QSettings().remove(VDRMainWindow::recentFileListSettingsKey());
         VDRDocument::setGlobalModified(false);
@@ -74,14 +65,14 @@ private slots:
         m_window->show();
     }
 
-    void cleanup()
+    void cleanupTest() override
     {
         if (m_window && m_window->document()->isStateValid())
             m_window->document()->closeDocument();
         m_window.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     void menusAndToolBarInOrder()
     {
         QStringList titles;
@@ -386,8 +377,8 @@ private slots:
 
     void recentFilesHoldOneEntryPerFile()
     {
-        const QString a = diary(QStringLiteral("a.vd2"));
-        const QString b = diary(QStringLiteral("b.vd2"));
+        const QString a = newDiary(QStringLiteral("a.vd2"));
+        const QString b = newDiary(QStringLiteral("b.vd2"));
         QCOMPARE(m_window->openDocument(a, false, true), 0);
         QCOMPARE(m_window->openDocument(b, false, true), 0);
         // The same file again, by a relative path.
@@ -424,7 +415,7 @@ private slots:
         QFETCH(int, answer);
         QFETCH(bool, closed);
         QFETCH(QString, savedName);
-        const QString path = diary(QStringLiteral("schliessen.vd2"));
+        const QString path = newDiary(QStringLiteral("schliessen.vd2"));
         QCOMPARE(m_window->openDocument(path, false, true), 0);
         VDRDocument* doc = m_window->document();
         QVERIFY(renameProject(QStringLiteral("Geändert")));
@@ -493,7 +484,7 @@ private slots:
     void exchangeAndFollowUpCommands()
     {
         QFETCH(bool, saveNow);
-        const QString path = diary(QStringLiteral("Haus.vd2"));
+        const QString path = newDiary(QStringLiteral("Haus.vd2"));
         QCOMPARE(m_window->openDocument(path, false, true), 0);
         const QString vdx = m_dir.filePath(QStringLiteral("Haus.2026-03-07T16-05-09.vdx"));
         QFile::remove(vdx);
@@ -562,7 +553,7 @@ private slots:
     {
         QFETCH(bool, modified);
         QFETCH(bool, windowDestroyed);
-        const QString path = diary(QStringLiteral("abmelden.vd2"));
+        const QString path = newDiary(QStringLiteral("abmelden.vd2"));
         QCOMPARE(m_window->openDocument(path, false, true), 0);
         if (modified)
             QVERIFY(renameProject(QStringLiteral("Nicht gespeichert")));
@@ -588,11 +579,11 @@ private slots:
     {
         // The real program in a process of its own: while it holds the diary, the command-line tool
         // sees it held; SIGTERM without changes closes it properly.
-        const QString path = diary(QStringLiteral("signal.vd2"));
+        const QString path = newDiary(QStringLiteral("signal.vd2"));
         QProcess app;
         QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
         env.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
-        env.insert(QStringLiteral("XDG_CONFIG_HOME"), m_dir.filePath(QStringLiteral("settings")));
+        env.insert(QStringLiteral("XDG_CONFIG_HOME"), settingsFolder());
         app.setProcessEnvironment(env);
         app.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna"), {path});
         QVERIFY(app.waitForStarted());
@@ -667,7 +658,7 @@ private slots:
         QString path = m_dir.filePath(QStringLiteral("nicht da.vd2"));
         QByteArray hash;
         if (kind == QLatin1String("diary")) {
-            path = diary(QStringLiteral("start.vd2"));
+            path = newDiary(QStringLiteral("start.vd2"));
         } else if (kind == QLatin1String("vdx")) {
             path = m_dir.filePath(QStringLiteral("vom Handy.vdx"));
             QFile::remove(path);
@@ -859,13 +850,6 @@ private slots:
     }
 
 private:
-    QString diary(const QString& name)
-    {
-        const QString path = m_dir.filePath(name);
-        QFile::remove(path);
-        return createDiary(path) ? path : QString();
-    }
-
     // An unsaved change to the open diary, as an edit in the window makes it.
     bool renameProject(const QString& name)
     {
@@ -891,8 +875,6 @@ private:
         return QTest::qWaitForWindowActive(m_window.get());
     }
     std::unique_ptr<VDRMainWindow> m_window;
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     QList<QUrl> m_openedUrls;
 };
 

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
@@ -9,7 +9,6 @@
 #include <QSettings>
 #include <QSqlDatabase>
 #include <QSqlQuery>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <cerrno>
@@ -41,30 +40,18 @@ QStringList diaryAndBackups(const QString& path)
 }
 } // namespace
 
-class TestVDRDocumentSave : public QObject
+class TestVDRDocumentSave : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         VDRFileOps::setFailurePredicate(nullptr);
         QSettings().setValue(VDRDocument::numberOfBackupsSettingsKey(), 4);
     }
+    void cleanupTest() override { VDRFileOps::setFailurePredicate(nullptr); }
 
-    void cleanup()
-    {
-        VDRFileOps::setFailurePredicate(nullptr);
-        VDR_VERIFY_PROMPT(m_prompt);
-    }
-
+private slots:
     void backupsRotateOncePerOpening_data()
     {
         QTest::addColumn<int>("backups");
@@ -571,9 +558,6 @@ private:
         const QString path = folder + QLatin1Char('/') + name;
         return createDiary(path) ? path : QString();
     }
-
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_GUILESS_MAIN(TestVDRDocumentSave)
