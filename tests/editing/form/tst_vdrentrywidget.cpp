@@ -82,7 +82,7 @@ private slots:
         QCOMPARE(titles, QStringList({"Bautenstand", "Anwesende", "Störungen", "Bauablauf", "Vermerke",
                                       "Baustoffe", "Pläne und Dokumente", "Geräte und Maschinen"}));
         QCOMPARE(m_form->views().size(), 14);
-        // Functions of later parts are there, disabled, and say why.
+        // Functions not available yet are there, disabled, and say why.
         for (const char* name :
              {"pushButtonPhotos1", "pushButtonSketch2", "pbAudio", "pbPrintDfcyList", "pbSynch"}) {
             auto* b = m_form->findChild<QPushButton*>(QLatin1String(name));
