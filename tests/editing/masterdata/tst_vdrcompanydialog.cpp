@@ -1,5 +1,4 @@
 #include "VDRTestCase.h"
-#include "VDRTestFixtures.h"
 #include "editing/masterdata/VDRCompanyDialog.h"
 
 #include <QComboBox>

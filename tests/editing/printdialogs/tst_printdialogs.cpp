@@ -1,5 +1,4 @@
 #include "VDRTestCase.h"
-#include "VDRTestFixtures.h"
 #include "editing/printdialogs/CVdPrintPreview.h"
 #include "editing/printdialogs/CVdPrintoutSettings.h"
 #include "editing/printdialogs/VDRPrintTextsEditor.h"
@@ -14,8 +13,6 @@
 #include <QSettings>
 #include <QSpinBox>
 #include <QtTest>
-
-using namespace VDRTestFixtures;
 
 class TestPrintDialogs : public VDRTestCase
 {

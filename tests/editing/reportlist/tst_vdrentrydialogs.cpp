@@ -1,5 +1,4 @@
 #include "VDRTestCase.h"
-#include "VDRTestFixtures.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "editing/reportlist/QSpinBoxLetter.h"
@@ -12,8 +11,6 @@
 #include <QtTest>
 
 #include <memory>
-
-using namespace VDRTestFixtures;
 
 class TestVDREntryDialogs : public VDRTestCase
 {
