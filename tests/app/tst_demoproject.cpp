@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
@@ -9,7 +9,6 @@
 #include <QFileInfo>
 #include <QProcess>
 #include <QScopeGuard>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
@@ -38,27 +37,20 @@ QString reportRows()
 }
 } // namespace
 
-class TestDemoProject : public QObject
+class TestDemoProject : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        QVERIFY(QDir().mkpath(m_dir.filePath(QStringLiteral("tmp"))));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.filePath(QStringLiteral("tmp"))));
         m_built = QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2");
         QVERIFY2(QFileInfo::exists(m_built), qPrintable(m_built));
         // Read from a copy: the window's tests may hold the built one while they run beside these.
         m_demo = m_dir.filePath(QStringLiteral("Ejemplo.vd2"));
         QVERIFY(QFile::copy(m_built, m_demo));
     }
-    void init() { m_prompt.reset(); }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
+private slots:
     void fileAsBuilt()
     {
         QCOMPARE(modeOf(m_built), kReadOnly);
@@ -219,10 +211,8 @@ private slots:
     }
 
 private:
-    QTemporaryDir m_dir;
     QString m_built;
     QString m_demo;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_MAIN(TestDemoProject)

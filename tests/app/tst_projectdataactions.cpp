@@ -1,10 +1,9 @@
-#include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
+#include "VDRTestCase.h"
 #include "app/VDRMainWindow.h"
 #include "document/VDRDocument.h"
-#include "editing/printdialogs/VDROutputSelectDialog.h"
 #include "editing/masterdata/VDRProjectDataWidget.h"
 #include "editing/masterdata/VDRProjectLogoWidget.h"
+#include "editing/printdialogs/VDROutputSelectDialog.h"
 
 #include <QAction>
 #include <QApplication>
@@ -12,25 +11,17 @@
 #include <QLineEdit>
 #include <QPushButton>
 #include <QTabWidget>
-#include <QTemporaryDir>
 #include <QTimer>
 #include <QtTest>
 
 #include <memory>
 
 // The main window's master-data actions open the dialog on their tab and show its result.
-class TestProjectDataActions : public QObject
+class TestProjectDataActions : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        VDRTestFixtures::isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
-    }
-
     void actionsOpenTheirTab_data()
     {
         QTest::addColumn<QString>("action");
@@ -47,7 +38,6 @@ private slots:
         QFETCH(QString, action);
         QFETCH(int, tab);
         QFETCH(QString, button);
-        VDRTestPrompt prompt;
         VDRMainWindow window;
         window.show();
         QAction* trigger = window.ui().action(action);
@@ -79,12 +69,10 @@ private slots:
         window.document()->closeDocument();
         window.updateGui();
         QVERIFY(!trigger->isEnabled());
-        VDR_VERIFY_PROMPT(prompt);
     }
 
     void logoActionOpensLogoDialog()
     {
-        VDRTestPrompt prompt;
         VDRMainWindow window;
         window.show();
         QAction* trigger = window.ui().action("actionSettingsProjectLogo");
@@ -101,18 +89,16 @@ private slots:
         trigger->trigger();
         QCOMPARE(title, QString("Projektlogo"));
         window.document()->closeDocument();
-        VDR_VERIFY_PROMPT(prompt);
     }
 
     // "Drucken" on the company tab asks for printer or PDF and writes the company list.
     void printButtonPrintsCompanyList()
     {
-        VDRTestPrompt prompt;
         VDRMainWindow window;
         window.show();
         QVERIFY(window.createDocument(true));
         const QString pdf = m_dir.filePath(QStringLiteral("Liste.pdf"));
-        prompt.expectFileName(pdf);
+        m_prompt.expectFileName(pdf);
         bool chosen = false;
         QTimer::singleShot(0, this, [&] {
             auto* dialog = qobject_cast<VDRProjectDataWidget*>(QApplication::activeModalWidget());
@@ -133,12 +119,8 @@ private slots:
         window.ui().action(QStringLiteral("actionSettingsCompanyList"))->trigger();
         QVERIFY(chosen);
         QVERIFY(QFileInfo(pdf).size() > 0);
-        VDR_VERIFY_PROMPT(prompt);
         window.document()->closeDocument();
     }
-
-private:
-    QTemporaryDir m_dir;
 };
 
 QTEST_MAIN(TestProjectDataActions)

@@ -1,38 +1,22 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
-#include <QProcess>
 #include <QScopeGuard>
 #include <QSettings>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
-namespace {
-struct Run
-{
-    int exitCode = -1;
-    QString out;
-    QString err;
-};
-
-} // namespace
-
 // Drives varduna-cli as a separate process, as people who automate use it.
-class TestCli : public QObject
+class TestCli : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase();
-    void init();
-    void cleanup();
-
     void helpListsCommandsAndExitCodes();
     void usageErrors_data();
     void usageErrors();
@@ -56,44 +40,9 @@ private slots:
     void previewWritesOnePicturePerPage();
 
 private:
-    Run cli(const QStringList& args);
     // A copy of the demo diary under 'name', made once per run.
     QString demoCopy(const QString& name);
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
-
-void TestCli::initTestCase()
-{
-    QVERIFY(m_dir.isValid());
-    isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-}
-
-void TestCli::init()
-{
-    m_prompt.reset();
-}
-
-void TestCli::cleanup()
-{
-    VDR_VERIFY_PROMPT(m_prompt);
-}
-
-Run TestCli::cli(const QStringList& args)
-{
-    QProcess p;
-    QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-    env.insert(QStringLiteral("XDG_CONFIG_HOME"), m_dir.filePath(QStringLiteral("settings")));
-    p.setProcessEnvironment(env);
-    p.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"), args);
-    Run r;
-    if (!p.waitForFinished(60000))
-        return r;
-    r.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
-    r.out = QString::fromUtf8(p.readAllStandardOutput());
-    r.err = QString::fromUtf8(p.readAllStandardError());
-    return r;
-}
 
 QString TestCli::demoCopy(const QString& name)
 {
@@ -107,7 +56,7 @@ QString TestCli::demoCopy(const QString& name)
 
 void TestCli::helpListsCommandsAndExitCodes()
 {
-    const Run r = cli({QStringLiteral("--help")});
+    const CliRun r = runCli({QStringLiteral("--help")});
     QCOMPARE(r.exitCode, 0);
     for (const char* word :
          {"new FILE", "info FILE", "check FILE", "preview FILE", "--yes", "held by a running instance"})
@@ -126,7 +75,7 @@ void TestCli::usageErrors_data()
 void TestCli::usageErrors()
 {
     QFETCH(QStringList, args);
-    const Run r = cli(args);
+    const CliRun r = runCli(args);
     QCOMPARE(r.exitCode, 1);
     QVERIFY(r.err.contains(QLatin1String("--help")));
 }
@@ -137,7 +86,7 @@ void TestCli::newWritesAFreshDiary()
     // Documents left by an earlier diary of the same name must not attach to the new one.
     const QString documents = VDRDocument::documentsDbPathFor(path);
     QVERIFY(execSql(documents, {"CREATE TABLE documents (id INTEGER)"}));
-    const Run r = cli({QStringLiteral("new"), path});
+    const CliRun r = runCli({QStringLiteral("new"), path});
     QCOMPARE(r.exitCode, 0);
     QVERIFY(QFile::exists(path));
     QVERIFY(!QFile::exists(documents));
@@ -159,7 +108,7 @@ void TestCli::newRefusesExistingFile()
 {
     const QString path = m_dir.filePath(QStringLiteral("vorhanden.vd2"));
     QVERIFY(writeFile(path, "wichtig"));
-    const Run r = cli({QStringLiteral("new"), path});
+    const CliRun r = runCli({QStringLiteral("new"), path});
     QCOMPARE(r.exitCode, 2);
     QVERIFY(r.err.startsWith(QLatin1String("Dateifehler: Die Datei\n")));
     QCOMPARE(fileHash(path), QCryptographicHash::hash("wichtig", QCryptographicHash::Sha256));
@@ -190,7 +139,7 @@ void TestCli::infoListsReports()
     QStringList args{QStringLiteral("info"), path};
     if (json)
         args << QStringLiteral("--json");
-    const Run r = cli(args);
+    const CliRun r = runCli(args);
     QCOMPARE(r.exitCode, 0);
     QVERIFY2(r.err.isEmpty(), qPrintable(r.err));
     if (json) {
@@ -215,7 +164,7 @@ void TestCli::infoUpgradesOnlyTheWorkingCopy()
     const QString path = m_dir.filePath(QStringLiteral("altbau.vd2"));
     QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
     const QByteArray before = fileHash(path);
-    const Run r = cli({QStringLiteral("info"), path});
+    const CliRun r = runCli({QStringLiteral("info"), path});
     QCOMPARE(r.exitCode, 0);
     QVERIFY(r.err.startsWith(QStringLiteral("Datei-Warnung: Sie öffnen ein Dokument, das mit einer früheren "
                                             "Programmversion erstellt wurde.")));
@@ -283,7 +232,7 @@ void TestCli::checkExitCodes()
     if (kind == QLatin1String("immutable") && !setImmutable(folder, true))
         QSKIP("the file system cannot make a folder immutable");
     const QStringList before = folderState(folder);
-    const Run r = cli({QStringLiteral("check"), path});
+    const CliRun r = runCli({QStringLiteral("check"), path});
     QCOMPARE(r.exitCode, exitCode);
     QVERIFY2(r.out.startsWith(QStringLiteral("Status: ") + status + QLatin1Char('\n')), qPrintable(r.out));
     QCOMPARE(folderState(folder), before);
@@ -300,7 +249,7 @@ void TestCli::checkExitCodes()
     if (kind == QLatin1String("intact"))
         QVERIFY(r.out.contains(QLatin1String("Working copy: none\nBackups: 1\n")));
 
-    const Run j = cli({QStringLiteral("check"), path, QStringLiteral("--json")});
+    const CliRun j = runCli({QStringLiteral("check"), path, QStringLiteral("--json")});
     QCOMPARE(j.exitCode, exitCode);
     QCOMPARE(QJsonDocument::fromJson(j.out.toUtf8()).object().value("status").toString(), status);
 }
@@ -315,7 +264,7 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
     const QString holder = QStringLiteral("User: %1\nComputer: %2\nseit dem %3 ")
                                .arg(VDRDocument::currentUserName(), VDRDocument::currentComputerName(),
                                     QDate::currentDate().toString(QStringLiteral("dd.MM.yyyy")));
-    const Run info = cli({QStringLiteral("info"), path, QStringLiteral("--yes")});
+    const CliRun info = runCli({QStringLiteral("info"), path, QStringLiteral("--yes")});
     QCOMPARE(info.exitCode, 2);
     QVERIFY2(info.err.startsWith(
                  QStringLiteral("Datenbank in Bearbeitung: Die Datei konnte nicht geöffnet werden, da "
@@ -324,17 +273,18 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
              qPrintable(info.err));
     QVERIFY(!info.err.contains(QLatin1String("Fehler:"))); // no second, general message
 
-    const Run pdf = cli({QStringLiteral("pdf"), path, QStringLiteral("-o"), m_dir.filePath("held.pdf")});
+    const CliRun pdf =
+        runCli({QStringLiteral("pdf"), path, QStringLiteral("-o"), m_dir.filePath("held.pdf")});
     QCOMPARE(pdf.exitCode, 2);
     QVERIFY2(pdf.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: ")), qPrintable(pdf.err + pdf.out));
     QVERIFY(!QFile::exists(m_dir.filePath("held.pdf")));
-    const Run preview =
-        cli({QStringLiteral("preview"), path, QStringLiteral("--out"), m_dir.filePath("held pages")});
+    const CliRun preview =
+        runCli({QStringLiteral("preview"), path, QStringLiteral("--out"), m_dir.filePath("held pages")});
     QCOMPARE(preview.exitCode, 2);
     QVERIFY(preview.err.startsWith(QStringLiteral("Datenbank in Bearbeitung: ")));
     QVERIFY(!QFileInfo::exists(m_dir.filePath("held pages")));
 
-    const Run check = cli({QStringLiteral("check"), path});
+    const CliRun check = runCli({QStringLiteral("check"), path});
     QCOMPARE(check.exitCode, 4);
     QVERIFY(check.out.contains(QStringLiteral("Working copy: held\n")));
     QVERIFY(check.out.contains(QStringLiteral("Lock: User: %1, Computer: %2")
@@ -343,7 +293,7 @@ void TestCli::heldDiaryIsReportedByInfoAndCheck()
     // The holder is undisturbed: it can still write and close cleanly.
     QVERIFY(setProjectName(doc, QStringLiteral("weiter bearbeitet")));
     QVERIFY(doc.closeDocument());
-    QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
+    QCOMPARE(runCli({QStringLiteral("check"), path}).exitCode, 0);
 }
 
 void TestCli::saveRunRepeatedlyRotatesBackups_data()
@@ -365,11 +315,11 @@ void TestCli::saveRunRepeatedlyRotatesBackups()
     const QString folder = m_dir.filePath(QStringLiteral("rotation-%1").arg(backups));
     QDir().mkpath(folder);
     const QString path = folder + QStringLiteral("/d.vd2");
-    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
+    QCOMPARE(runCli({QStringLiteral("new"), path}).exitCode, 0);
     // Each run is one opening with one save; the diary is changed in between as by another session.
     for (int i = 1; i <= 5; ++i) {
         QVERIFY(execSql(path, {QStringLiteral("UPDATE vdr SET name = 'Stand %1'").arg(i)}));
-        const Run r = cli({QStringLiteral("save"), path});
+        const CliRun r = runCli({QStringLiteral("save"), path});
         QCOMPARE(r.exitCode, 0);
         QVERIFY2(r.err.isEmpty(), qPrintable(r.err));
     }
@@ -385,21 +335,21 @@ void TestCli::saveOfOlderStructureNeedsYes()
     const QString path = m_dir.filePath(QStringLiteral("alt-speichern.vd2"));
     QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
     const QByteArray before = fileHash(path);
-    const Run cancelled = cli({QStringLiteral("save"), path});
+    const CliRun cancelled = runCli({QStringLiteral("save"), path});
     QCOMPARE(cancelled.exitCode, 3);
     QVERIFY(cancelled.err.contains(
         QStringLiteral("Datei-Warnung: Das Dokument wurde mit einer früheren Programmversion "
                        "erstellt.")));
     QCOMPARE(fileHash(path), before);
 
-    const Run saved = cli({QStringLiteral("save"), path, QStringLiteral("--yes")});
+    const CliRun saved = runCli({QStringLiteral("save"), path, QStringLiteral("--yes")});
     QCOMPARE(saved.exitCode, 0);
     QCOMPARE(queryValue(path, "SELECT value FROM meta WHERE key = 'fileversion'").toString(),
              QStringLiteral("0.4"));
     QCOMPARE(queryValue(path + QStringLiteral(".bak"), "SELECT value FROM meta WHERE key = 'fileversion'")
                  .toString(),
              QStringLiteral("0.3"));
-    QCOMPARE(cli({QStringLiteral("info"), path}).err, QString()); // nothing left to upgrade
+    QCOMPARE(runCli({QStringLiteral("info"), path}).err, QString()); // nothing left to upgrade
 }
 
 void TestCli::restore_data()
@@ -418,20 +368,20 @@ void TestCli::restore()
     const QString folder = m_dir.filePath(QStringLiteral("restore-%1").arg(exitCode));
     QDir().mkpath(folder);
     const QString path = folder + QStringLiteral("/r.vd2");
-    QCOMPARE(cli({QStringLiteral("new"), path}).exitCode, 0);
+    QCOMPARE(runCli({QStringLiteral("new"), path}).exitCode, 0);
     for (int i = 1; i <= 2; ++i) {
         QVERIFY(execSql(path, {QStringLiteral("UPDATE vdr SET name = 'Stand %1'").arg(i)}));
-        QCOMPARE(cli({QStringLiteral("save"), path}).exitCode, 0);
+        QCOMPARE(runCli({QStringLiteral("save"), path}).exitCode, 0);
     }
     // r.vd2 and r.vd2.bak: Stand 2, r.vd2.01.bak: Stand 1.
     for (const QString& name : damaged)
         QVERIFY(damageFile(folder + QLatin1Char('/') + name));
-    const Run r = cli({QStringLiteral("restore"), path});
+    const CliRun r = runCli({QStringLiteral("restore"), path});
     QCOMPARE(r.exitCode, exitCode);
     if (exitCode == 0) {
         QCOMPARE(r.out, folder + QStringLiteral("/rERROR.01.vd2\n"));
         QCOMPARE(projectNameIn(path), QStringLiteral("Stand 1"));
-        QCOMPARE(cli({QStringLiteral("check"), path}).exitCode, 0);
+        QCOMPARE(runCli({QStringLiteral("check"), path}).exitCode, 0);
     } else if (exitCode == 3) {
         QVERIFY(r.err.contains(QStringLiteral("Die Backup-Dateien sind ebenfalls beschädigt.")));
     }
@@ -442,7 +392,7 @@ void TestCli::compactReportsSizes()
     const QString path = m_dir.filePath(QStringLiteral("kompakt.vd2"));
     QVERIFY(createDiary(path));
     QVERIFY(execSql(path, {imageInsertSql(2000000)}));
-    const Run r = cli({QStringLiteral("compact"), path});
+    const CliRun r = runCli({QStringLiteral("compact"), path});
     QCOMPARE(r.exitCode, 0);
     const QStringList lines = r.out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
     QCOMPARE(lines.size(), 2);
@@ -482,7 +432,7 @@ void TestCli::pdfOfDemoReports()
     QStringList args{QStringLiteral("pdf"), path, QStringLiteral("-o"), pdf};
     if (!reports.isEmpty())
         args << QStringLiteral("--reports") << reports;
-    const Run r = cli(args);
+    const CliRun r = runCli(args);
     QCOMPARE(r.exitCode, exitCode);
     QCOMPARE(fileHash(path), before);
     QVERIFY(!QFile::exists(path + QStringLiteral(".workingcopy")));
@@ -494,7 +444,7 @@ void TestCli::pdfOfDemoReports()
 
     const QString printed = pdfText(pdf);
     const QStringList lines =
-        cli({QStringLiteral("info"), path}).out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+        runCli({QStringLiteral("info"), path}).out.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
     int expected = 0;
     for (const QString& line : lines.mid(3)) {
         const QStringList cols = line.split(QLatin1Char('\t'));
@@ -526,14 +476,14 @@ void TestCli::previewWritesOnePicturePerPage()
     const QByteArray before = fileHash(path);
     const QString pdf = m_dir.filePath(QStringLiteral("Vorschau.pdf"));
     QCOMPARE(
-        cli({QStringLiteral("pdf"), path, QStringLiteral("--reports"), reports, QStringLiteral("-o"), pdf})
+        runCli({QStringLiteral("pdf"), path, QStringLiteral("--reports"), reports, QStringLiteral("-o"), pdf})
             .exitCode,
         0);
     const int pages = pdfPages(pdf);
     QVERIFY(pages > 0);
     const QString out = m_dir.filePath(QStringLiteral("Seiten ") + reports);
-    const Run r = cli({QStringLiteral("preview"), path, QStringLiteral("--reports"), reports,
-                       QStringLiteral("--out"), out});
+    const CliRun r = runCli({QStringLiteral("preview"), path, QStringLiteral("--reports"), reports,
+                             QStringLiteral("--out"), out});
     QCOMPARE(r.exitCode, 0);
     QCOMPARE(fileHash(path), before);
     QStringList expected;

@@ -1,25 +1,21 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
-#include <QProcess>
 #include <QSettings>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
 // varduna-cli companies: the lists as scripts and support read them.
-class TestCliCompanies : public QObject
+class TestCliCompanies : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
         m_diary = m_dir.filePath(QStringLiteral("Baustelle.vd2"));
         QVERIFY(createDiary(m_diary));
         const QString insert =
@@ -34,6 +30,7 @@ private slots:
                          insert + "(104, 2, ' ', ' ', ' ', ' ', '', '', '', '', '', '', '', 9)"}));
     }
 
+private slots:
     void listsInOrderWithBothFormats_data()
     {
         QTest::addColumn<bool>("bothBrackets");
@@ -90,18 +87,11 @@ private slots:
 private:
     int cli(const QStringList& args, QString* out)
     {
-        QProcess p;
-        QProcessEnvironment env = QProcessEnvironment::systemEnvironment();
-        env.insert(QStringLiteral("XDG_CONFIG_HOME"), m_dir.filePath(QStringLiteral("settings")));
-        p.setProcessEnvironment(env);
-        p.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"), args);
-        if (!p.waitForFinished(60000))
-            return -1;
-        *out = QString::fromUtf8(p.readAllStandardOutput());
-        return p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
+        const CliRun run = runCli(args);
+        *out = run.out;
+        return run.exitCode;
     }
 
-    QTemporaryDir m_dir;
     QString m_diary;
 };
 

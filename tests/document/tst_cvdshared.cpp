@@ -1,35 +1,20 @@
-#include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
+#include "VDRTestCase.h"
 #include "document/CVdShared.h"
 #include "document/VDRDocument.h"
 
 #include <QSettings>
-#include <QTemporaryDir>
 #include <QtTest>
 
-using namespace VDRTestFixtures;
-
-class TestCVdShared : public QObject
+class TestCVdShared : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase();
     void formats_data();
     void formats();
     void modelRowsAndFieldNames();
     void settingsAndReset();
-
-private:
-    QTemporaryDir m_tmp;
 };
-
-void TestCVdShared::initTestCase()
-{
-    QVERIFY(m_tmp.isValid());
-    isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-    qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-}
 
 void TestCVdShared::formats_data()
 {
@@ -112,7 +97,6 @@ void TestCVdShared::formats()
 
 void TestCVdShared::modelRowsAndFieldNames()
 {
-    VDRTestPrompt prompt;
     VDRDocument doc;
     QVERIFY(doc.createDocument(true));
     CVdShared::resetCompanyOutputFormat1();

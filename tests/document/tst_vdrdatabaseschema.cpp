@@ -1,11 +1,10 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDatabaseSchema.h"
 #include "document/VDRDocument.h"
 
 #include <QFile>
 #include <QRegularExpression>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
@@ -22,22 +21,11 @@ QStringList columnNames(const QString& path, const QString& table)
 }
 } // namespace
 
-class TestVDRDatabaseSchema : public QObject
+class TestVDRDatabaseSchema : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-    }
-
-    void init() { m_prompt.reset(); }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
-
     void versionComparison_data()
     {
         QTest::addColumn<QString>("a");
@@ -67,7 +55,7 @@ private slots:
 
     void newDiaryContents()
     {
-        const QString path = newDiary();
+        const QString path = newDiary(QStringLiteral("neu.vd2"));
         QVERIFY(!path.isEmpty());
         QCOMPARE(tableNames(path).size(), 22);
         // Columns whose type, NOT NULL and default the mobile app and older versions rely on:
@@ -136,7 +124,7 @@ private slots:
     // on save.
     void upgradeOfOldestLayout()
     {
-        const QString current = newDiary();
+        const QString current = newDiary(QStringLiteral("aktuell.vd2"));
         const QString old = m_dir.filePath(QStringLiteral("alt.vd2"));
         QVERIFY(createOldestLayoutDiary(old));
         const QByteArray before = fileHash(old);
@@ -271,14 +259,6 @@ private slots:
     }
 
 private:
-    QString newDiary()
-    {
-        const QString path = m_dir.filePath(QStringLiteral("neu%1.vd2").arg(++m_counter));
-        if (!createDiary(path))
-            return QString();
-        return path;
-    }
-
     // Opens an old diary, lets the upgrades run on its working copy and hands back a copy of that
     // working copy taken while the document is open.
     QString openUpgradedWorkingCopy(const QString& path)
@@ -295,10 +275,6 @@ private:
         doc.closeDocument();
         return copy;
     }
-
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
-    int m_counter = 0;
 };
 
 QTEST_GUILESS_MAIN(TestVDRDatabaseSchema)

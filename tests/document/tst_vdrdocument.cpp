@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
 
@@ -7,7 +7,6 @@
 #include <QProcess>
 #include <QScopeGuard>
 #include <QSignalSpy>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <signal.h>
@@ -69,29 +68,14 @@ private:
 };
 } // namespace
 
-class TestVDRDocument : public QObject
+class TestVDRDocument : public VDRTestCase
 {
     Q_OBJECT
 
+    void initTest() override { VDRFileOps::setFailurePredicate(nullptr); }
+    void cleanupTest() override { VDRFileOps::setFailurePredicate(nullptr); }
+
 private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
-        VDRFileOps::setFailurePredicate(nullptr);
-    }
-
-    void cleanup()
-    {
-        VDRFileOps::setFailurePredicate(nullptr);
-        VDR_VERIFY_PROMPT(m_prompt);
-    }
-
     void createDocument()
     {
         VDRDocument doc;
@@ -510,14 +494,6 @@ private slots:
     }
 
 private:
-    QString newDiary(const QString& name)
-    {
-        const QString path = m_dir.filePath(name);
-        QDir().mkpath(QFileInfo(path).path());
-        QFile::remove(path);
-        return createDiary(path) ? path : QString();
-    }
-
     // What a crash leaves: a working copy with unsaved work, and the lock information when 'user' is set.
     static QString leaveWorkingCopy(const QString& path, const QString& user, const QString& computer)
     {
@@ -531,9 +507,6 @@ private:
         const QString info = QStringLiteral("%1\n%2\nSo. Dez. 6 2026\n09:15\n").arg(user, computer);
         return user.isEmpty() || writeFile(lockInfo, info.toUtf8()) ? workingCopy : QString();
     }
-
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_GUILESS_MAIN(TestVDRDocument)

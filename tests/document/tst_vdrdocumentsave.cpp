@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDiaryCheck.h"
 #include "document/VDRDocument.h"
 #include "document/VDRFileOps.h"
@@ -9,7 +9,6 @@
 #include <QSettings>
 #include <QSqlDatabase>
 #include <QSqlQuery>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <cerrno>
@@ -41,30 +40,18 @@ QStringList diaryAndBackups(const QString& path)
 }
 } // namespace
 
-class TestVDRDocumentSave : public QObject
+class TestVDRDocumentSave : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         VDRFileOps::setFailurePredicate(nullptr);
         QSettings().setValue(VDRDocument::numberOfBackupsSettingsKey(), 4);
     }
+    void cleanupTest() override { VDRFileOps::setFailurePredicate(nullptr); }
 
-    void cleanup()
-    {
-        VDRFileOps::setFailurePredicate(nullptr);
-        VDR_VERIFY_PROMPT(m_prompt);
-    }
-
+private slots:
     void backupsRotateOncePerOpening_data()
     {
         QTest::addColumn<int>("backups");
@@ -132,9 +119,10 @@ private slots:
     {
         QFETCH(int, failAt);
         QFETCH(bool, firstSave);
-        const QString path = diary(QStringLiteral("d.vd2"));
         // Four generations of backups to rotate, each with its own state.
-        QVERIFY(saveGenerations(path, {"Generation 1", "Generation 2", "Generation 3", "Generation 4"}));
+        const QString path = diaryWithGenerations(
+            QStringLiteral("d.vd2"), {"Generation 1", "Generation 2", "Generation 3", "Generation 4"});
+        QVERIFY(!path.isEmpty());
         VDRDocument doc;
         QVERIFY(openDiary(doc, path));
         if (!firstSave) {
@@ -371,8 +359,9 @@ private slots:
         QFETCH(QStringList, damaged);
         QFETCH(QString, text);
         QFETCH(QString, restoredFrom);
-        const QString path = diary(QStringLiteral("d.vd2"));
-        QVERIFY(saveGenerations(path, {"Stand 1", "Stand 2", "Stand 3", "Stand 4"}));
+        const QString path =
+            diaryWithGenerations(QStringLiteral("d.vd2"), {"Stand 1", "Stand 2", "Stand 3", "Stand 4"});
+        QVERIFY(!path.isEmpty());
         // Now: d.vd2 = Stand 4, .bak = Stand 3, .01 = Stand 2, .02 = Stand 1, .03 = the new diary.
         for (const QString& name : damaged)
             QVERIFY(damageFile(QFileInfo(path).dir().filePath(name)));
@@ -561,19 +550,45 @@ private slots:
     }
 
 private:
-    QString diary(const QString& name)
+    // A new, empty folder of the running test function and data row.
+    QString rowFolder()
     {
         const QString folder =
             m_dir.filePath(QString::fromLatin1(QTest::currentTestFunction()) + QLatin1Char('-') +
                            QString::fromLatin1(QTest::currentDataTag()).replace(QLatin1Char(' '), '_'));
         QDir(folder).removeRecursively();
         QDir().mkpath(folder);
-        const QString path = folder + QLatin1Char('/') + name;
+        return folder;
+    }
+
+    QString diary(const QString& name)
+    {
+        const QString path = rowFolder() + QLatin1Char('/') + name;
         return createDiary(path) ? path : QString();
     }
 
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
+    // As diary(), then saved once per name in 'generations', each a backup generation of its own.
+    // Saving is slow (every save flushes to disk): the generations are built once per test function
+    // and their folder is copied for each data row.
+    QString diaryWithGenerations(const QString& name, const QStringList& generations)
+    {
+        const QString built = m_dir.filePath(QStringLiteral("generations-") +
+                                             QString::fromLatin1(QTest::currentTestFunction()));
+        if (!QFileInfo::exists(built)) {
+            const QString path = built + QLatin1Char('/') + name;
+            if (!QDir().mkpath(built) || !createDiary(path) || !saveGenerations(path, generations)) {
+                QDir(built).removeRecursively();
+                return QString();
+            }
+            VDRFileOps::waitForBackgroundRemovals();
+        }
+        const QString folder = rowFolder();
+        for (const QString& file : QDir(built).entryList(QDir::Files | QDir::Hidden)) {
+            if (!QFile::copy(built + QLatin1Char('/') + file, folder + QLatin1Char('/') + file))
+                return QString();
+        }
+        return folder + QLatin1Char('/') + name;
+    }
 };
 
 QTEST_GUILESS_MAIN(TestVDRDocumentSave)

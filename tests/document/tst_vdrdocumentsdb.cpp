@@ -1,12 +1,11 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "document/VDRDocumentsDb.h"
 
 #include <QDir>
 #include <QRegularExpression>
 #include <QSqlQuery>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <functional>
@@ -86,28 +85,13 @@ void withDocumentsDb(const QString& diary, const std::function<void(QSqlDatabase
 }
 } // namespace
 
-class TestVDRDocumentsDb : public QObject
+class TestVDRDocumentsDb : public VDRTestCase
 {
     Q_OBJECT
 
+    void initTest() override { VDRDocument::setGlobalModified(false); }
+
 private slots:
-
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        QDir().mkpath(m_dir.filePath(QStringLiteral("tmp")));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.filePath(QStringLiteral("tmp"))));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
-        VDRDocument::setGlobalModified(false);
-    }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
-
     void statusRules_data()
     {
         QTest::addColumn<int>("status");
@@ -395,9 +379,6 @@ private:
             return QString();
         return path;
     }
-
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_GUILESS_MAIN(TestVDRDocumentsDb)

@@ -1,12 +1,11 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 
 #include <QBuffer>
 #include <QDir>
 #include <QSettings>
 #include <QSqlQuery>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <libexif/exif-data.h>
@@ -98,11 +97,9 @@ void verifyStored(VDRDocument& doc, int id, const QSize& stored, const QSize& th
 }
 } // namespace
 
-class TestVDRImageStore : public QObject
+class TestVDRImageStore : public VDRTestCase
 {
     Q_OBJECT
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
 
     QString fixture(const QString& name, const QByteArray& bytes)
@@ -111,29 +108,21 @@ class TestVDRImageStore : public QObject
         return VDRTestFixtures::writeFile(path, bytes) ? path : QString();
     }
 
-private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        VDRTestFixtures::isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
-    }
     // Every test works on a new diary of its own.
-    void init()
+    void initTest() override
     {
-        m_prompt.reset();
         QSettings().remove(VDRDocument::imageSizeSettingsKey());
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
     }
-    void cleanup()
+    void cleanupTest() override
     {
         if (m_doc->isStateValid())
             QVERIFY(m_doc->closeDocument());
         m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     void photoIsFittedAndTurnedUpright_data()
     {
         QTest::addColumn<QSize>("uprightSize");

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "document/VDREntryNumber.h"
@@ -91,31 +91,18 @@ QList<NewRowCase> newRowCases()
 }
 } // namespace
 
-class TestVDRReports : public QObject
+class TestVDRReports : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_tmp.isValid());
-        isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
     }
+    void cleanupTest() override { m_doc.reset(); }
 
-    void cleanup()
-    {
-        m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
-    }
-
+private slots:
     void numbering_data()
     {
         QTest::addColumn<int>("count");
@@ -394,7 +381,7 @@ private slots:
 
     void fullDiskFailsAReportOperationAndSaysSo()
     {
-        const QString folder = m_tmp.filePath(QStringLiteral("voll"));
+        const QString folder = m_dir.filePath(QStringLiteral("voll"));
         SmallDisk disk(folder, 1024 * 1024);
         if (!disk.isMounted())
             QSKIP("needs a small disk of its own (mounting needs root)");
@@ -565,7 +552,7 @@ private slots:
         QFETCH(bool, repaired);
 
         m_doc->closeDocument(); // the fixture opens a document of its own
-        const QString path = m_tmp.filePath(QStringLiteral("alt %1.vd2").arg(version));
+        const QString path = m_dir.filePath(QStringLiteral("alt %1.vd2").arg(version));
         QVERIFY(createDiary(path));
         const QStringList sql = {
             QStringLiteral("UPDATE meta SET value = '%1' WHERE key = 'fileversion'").arg(version),
@@ -620,7 +607,7 @@ private slots:
         QFETCH(QStringList, reportTexts);
 
         // The repair's trigger: entry_photo had no relation_id until this opening added it.
-        const QString path = m_tmp.filePath(QStringLiteral("fotos%1.vd2").arg(hadRelations));
+        const QString path = m_dir.filePath(QStringLiteral("fotos%1.vd2").arg(hadRelations));
         QVERIFY(createOldestLayoutDiary(path, QStringLiteral("0.3")));
         QStringList sql = {"ALTER TABLE entry_photo ADD company_id INTEGER"};
         if (hadRelations)
@@ -677,8 +664,6 @@ private:
         m_doc->modelEntryAll()->select();
     }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
 };
 

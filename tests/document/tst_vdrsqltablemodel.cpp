@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 
@@ -48,35 +48,24 @@ static QHash<QString, QVariant> newRow(VDRSqlTableModel* m, int entryId)
     return values;
 }
 
-class TestVDRSqlTableModel : public QObject
+class TestVDRSqlTableModel : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override { qRegisterMetaType<QList<QDate>>(); }
+    void initTest() override
     {
-        QVERIFY(m_tmp.isValid());
-        VDRTestFixtures::isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        // The document puts its working copy into the temporary folder; keep it inside ours.
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-        qRegisterMetaType<QList<QDate>>();
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
     }
-
-    void cleanup()
+    void cleanupTest() override
     {
         if (m_doc)
             m_doc->closeDocument();
         m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     void idsCountPerTable_data()
     {
         QTest::addColumn<Accessor>("accessor");
@@ -143,7 +132,7 @@ private slots:
             QCOMPARE(m->last_id(), 2);
         }
         if (action == QLatin1String("reopen")) {
-            const QString path = m_tmp.filePath(QStringLiteral("reopen.vd2"));
+            const QString path = m_dir.filePath(QStringLiteral("reopen.vd2"));
             QVERIFY(m_doc->writeWorkingCopyTo(path));
             QVERIFY(m_doc->closeDocument());
             bool showError = false;
@@ -345,7 +334,7 @@ private slots:
         QCOMPARE(m_doc->transactionDepth(), std::max(0, begins - ends));
 
         // Writing the copy closes the connection, which drops whatever was not committed.
-        const QString path = m_tmp.filePath(QStringLiteral("transactions.vd2"));
+        const QString path = m_dir.filePath(QStringLiteral("transactions.vd2"));
         QFile::remove(path);
         QVERIFY(m_doc->writeWorkingCopyTo(path));
         QCOMPARE(m_doc->transactionDepth(), 0);
@@ -470,7 +459,7 @@ private slots:
         QVERIFY(m_doc->modelEntryAll()->setData(0, field, value));
         QVERIFY(m_doc->modelEntryAll()->submitAll());
 
-        const QString path = m_tmp.filePath(QStringLiteral("iso.vd2"));
+        const QString path = m_dir.filePath(QStringLiteral("iso.vd2"));
         QFile::remove(path);
         QVERIFY(m_doc->writeWorkingCopyTo(path));
         const QString stored =
@@ -497,8 +486,6 @@ private:
         return query(QStringLiteral("SELECT id_counter FROM id_generator WHERE id_table = '%1'").arg(table));
     }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
 };
 

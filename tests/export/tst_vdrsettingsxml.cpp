@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "export/VDRCompleterExchange.h"
 #include "export/VDRSettingsXml.h"
 
@@ -11,25 +11,13 @@
 #include <QTemporaryDir>
 #include <QtTest>
 
-class TestVDRSettingsXml : public QObject
+class TestVDRSettingsXml : public VDRTestCase
 {
     Q_OBJECT
 
+    void initTest() override { clearSettings(); }
+
 private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_settingsDir.isValid());
-        VDRTestFixtures::isolateSettings(m_settingsDir.path());
-    }
-
-    void init()
-    {
-        m_prompt.reset();
-        clearSettings();
-    }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
-
     void segmentElementNames_data()
     {
         QTest::addColumn<QString>("segment");
@@ -319,9 +307,6 @@ private:
         writeList(QLocale::Spanish, "Equipo, máquina", 14, "Nº índice", 7, {"Grúa", "Excavadora  doble"});
         QSettings().setValue(QStringLiteral("language"), int(QLocale::German));
     }
-
-    QTemporaryDir m_settingsDir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_GUILESS_MAIN(TestVDRSettingsXml)

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "printing/CVdConfig.h"
 #include "printing/CVdPrintFirmList.h"
@@ -14,7 +14,6 @@
 #include <QProcess>
 #include <QRegularExpression>
 #include <QSettings>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <sys/stat.h>
@@ -90,15 +89,12 @@ bool isRed(QRgb c)
 }
 } // namespace
 
-class TestCVdPrintout : public QObject
+class TestCVdPrintout : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        QVERIFY(!isolateRun(m_dir.path()).isEmpty());
         CVdConfig::self()->reload();
         const QString demo =
             QCoreApplication::applicationDirPath() + QStringLiteral("/../Projects/Ejemplo.vd2");
@@ -112,18 +108,14 @@ private slots:
                 m_pages << QImage(f);
         });
     }
-    void cleanupTestCase()
+    void cleanupRun() override
     {
         VDRPrintHooks::setPreview(nullptr);
         m_doc.closeDocument();
     }
-    void init()
-    {
-        m_prompt.reset();
-        setPage({}, {}, 0, 0, 0, 0);
-    }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
+    void initTest() override { setPage({}, {}, 0, 0, 0, 0); }
 
+private slots:
     // Header, title, footer and bottom line where they belong, on a PDF/A with embedded fonts.
     void frameOnPdf()
     {
@@ -497,8 +489,6 @@ private:
                         .arg(align2)}));
     }
 
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     VDRDocument m_doc;
     QString m_path;
     QList<QImage> m_pages;

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "printing/CVdConfig.h"
 #include "printing/CVdPrintoutReport.h"
@@ -7,21 +7,17 @@
 #include <QDir>
 #include <QImage>
 #include <QRegularExpression>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
 // The photo albums at the end of a report: page grouping, geometry and what the PDF shows.
-class TestCVdPrintoutAlbums : public QObject
+class TestCVdPrintoutAlbums : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        QVERIFY(!isolateRun(m_dir.path()).isEmpty());
         CVdConfig::self()->reload();
         m_path = m_dir.filePath(QStringLiteral("Fotos.vd2"));
         QVERIFY(createDiary(m_path));
@@ -43,21 +39,14 @@ private slots:
         m_brokenId = textsOn(m_doc.database(), QStringLiteral("SELECT max(id) FROM image")).value(0).toInt();
         QVERIFY(m_brokenId > m_cameraId);
     }
-    void cleanupTestCase() { m_doc.closeDocument(); }
-    void init()
+    void cleanupRun() override { m_doc.closeDocument(); }
+    void initTest() override
     {
-        m_prompt.reset();
-        QVERIFY(execOn(
-            m_doc.database(),
-            {"DELETE FROM entry", "DELETE FROM entry_photo",
-             "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
-             "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, "
-             "env_temperature, env_humidity, progress, deficiencies, construction_material_sample, "
-             "print_notice, print_telephone_notice, user_id) VALUES (1, 0, '012', '2024-03-05', "
-             "'07:00:00', '16:30:00', '00:00:00', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0, 0, 0, 'AB')"}));
+        QVERIFY(execOn(m_doc.database(), {"DELETE FROM entry", "DELETE FROM entry_photo",
+                                          reportInsertSql(1, QStringLiteral("012"))}));
     }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
+private slots:
     // Photos in list order, L landscape and P portrait, and the layout code of each page.
     void grouping_data()
     {
@@ -210,8 +199,6 @@ private slots:
     }
 
 private:
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     VDRDocument m_doc;
     QString m_path;
     int m_landscapeId = 0, m_portraitId = 0, m_cameraId = 0, m_brokenId = 0;

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "printing/CVdConfig.h"
 #include "printing/CVdPrintoutReport.h"
@@ -8,20 +8,11 @@
 #include <QDir>
 #include <QProcess>
 #include <QRegularExpression>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
 namespace {
-const char* const kReport =
-    "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, inspection_time_to, "
-    "env_time, env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, "
-    "deficiencies, construction_material_sample, print_notice, print_telephone_notice, user_id) VALUES "
-    "(%1, 0, '%2', '2024-03-05', '07:00:00', '16:30:00', '00:00:00', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0, "
-    "0, 0, "
-    "'AB')";
-
 // The captions of every section, in their printed order.
 const QStringList kCaptions{"Wetter:",
                             "Anwesende:",
@@ -46,33 +37,29 @@ const QStringList kCaptions{"Wetter:",
                             "Geräte und Maschinen:"};
 } // namespace
 
-class TestCVdPrintoutReport : public QObject
+class TestCVdPrintoutReport : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        QVERIFY(!isolateRun(m_dir.path()).isEmpty());
         CVdConfig::self()->reload();
         m_path = m_dir.filePath(QStringLiteral("Bericht.vd2"));
         QVERIFY(createDiary(m_path));
         QVERIFY(openDiary(m_doc, m_path));
     }
-    void cleanupTestCase() { m_doc.closeDocument(); }
-    void init()
+    void cleanupRun() override { m_doc.closeDocument(); }
+    void initTest() override
     {
-        m_prompt.reset();
         QVERIFY(execOn(m_doc.database(),
                        {"DELETE FROM entry", "DELETE FROM entry_workforce", "DELETE FROM entry_progress",
                         "DELETE FROM entry_photo", "DELETE FROM entry_telephone_notice",
                         "DELETE FROM entry_task", "DELETE FROM entry_attendee", "DELETE FROM entry_equipment",
                         "DELETE FROM company", "UPDATE vdr SET display_empty_categories=0",
-                        QString::fromLatin1(kReport).arg(1).arg(QStringLiteral("012 (Entwurf)"))}));
+                        reportInsertSql(1, QStringLiteral("012 (Entwurf)"))}));
     }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
+private slots:
     // What one report shows, from the data given: texts that must appear and texts that must not.
     void content_data()
     {
@@ -224,7 +211,7 @@ private slots:
     // the signature line is on every page.
     void pagesPerReport()
     {
-        QStringList sql{QString::fromLatin1(kReport).arg(2).arg(QStringLiteral("013"))};
+        QStringList sql{reportInsertSql(2, QStringLiteral("013"))};
         QStringList companies, rows{QStringLiteral("(1, -1, NULL, 'ohne Firma', 1, ' ')")};
         for (int i = 0; i < 500; ++i) {
             companies << QStringLiteral(
@@ -476,8 +463,6 @@ private:
         return pdfText(pdf);
     }
 
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     VDRDocument m_doc;
     QString m_path;
 };

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "editing/printdialogs/CVdPrintPreview.h"
 #include "editing/printdialogs/VDRPrintPreviewWidget.h"
@@ -16,19 +16,11 @@
 #include <QPicture>
 #include <QPointer>
 #include <QPushButton>
-#include <QTemporaryDir>
 #include <QtTest>
 
 using namespace VDRTestFixtures;
 
 namespace {
-const char* const kReport =
-    "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, inspection_time_to, "
-    "env_time, env_weather1, env_weather2, env_weather3, env_temperature, env_humidity, progress, "
-    "deficiencies, construction_material_sample, print_notice, print_telephone_notice, user_id) VALUES "
-    "(%1, 0, '%2', '2024-03-05', '07:00:00', '16:30:00', '00:00:00', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0, "
-    "0, 0, 'AB')";
-
 QStringList filesIn(const QString& folder, const QString& pattern)
 {
     return QDir(folder).entryList({pattern}, QDir::Files);
@@ -36,7 +28,7 @@ QStringList filesIn(const QString& folder, const QString& pattern)
 } // namespace
 
 // The way a printed report takes: to the viewer, into the preview, and the preview's widgets.
-class TestPrintPipeline : public QObject
+class TestPrintPipeline : public VDRTestCase
 {
     Q_OBJECT
 
@@ -44,20 +36,17 @@ public slots:
     // Stands in for the desktop's file opener.
     void openUrl(const QUrl& url) { m_urls << url; }
 
-private slots:
-    void initTestCase()
+private:
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        m_sharedTemp = isolateRun(m_dir.path());
-        QVERIFY(!m_sharedTemp.isEmpty());
         CVdConfig::self()->reload();
         const QString path = m_dir.filePath(QStringLiteral("Bericht.vd2"));
         QVERIFY(createDiary(path));
         QVERIFY(openDiary(m_doc, path));
-        QVERIFY(execOn(m_doc.database(), {"DELETE FROM entry", QString::fromLatin1(kReport).arg(1).arg("012"),
-                                          QString::fromLatin1(kReport).arg(2).arg("013")}));
+        QVERIFY(execOn(m_doc.database(),
+                       {"DELETE FROM entry", reportInsertSql(1, "012"), reportInsertSql(2, "013")}));
     }
-    void cleanupTestCase()
+    void cleanupRun() override
     {
         VDRPrintHooks::setOpenFile(nullptr);
         VDRPrintHooks::setPreview(nullptr);
@@ -65,16 +54,15 @@ private slots:
         QDesktopServices::unsetUrlHandler(QStringLiteral("file"));
         m_doc.closeDocument();
     }
-    void init()
+    void initTest() override
     {
-        m_prompt.reset();
         m_urls.clear();
         m_opened.clear();
         VDRPrintHooks::setOpenFile([this](const QString& path) { m_opened << path; });
         VDRPrintHooks::setPreview(nullptr);
     }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
+private slots:
     void printerWritesIntoAFolderOfItsOwn_data()
     {
         QTest::addColumn<QString>("folder"); // "document", "none" or "open to all"
@@ -103,10 +91,10 @@ private slots:
         const QString expectedFolder =
             folder == QLatin1String("document") ? given : CVdPrintout::privateTemporaryFolder();
         QCOMPARE(pdf, QDir(expectedFolder).filePath(QStringLiteral("Varduna.pdf")));
-        QVERIFY(expectedFolder != m_sharedTemp && !expectedFolder.isEmpty());
+        QVERIFY(expectedFolder != temporaryFolder() && !expectedFolder.isEmpty());
         // Only its owner may look in: it holds the diary's pictures and printouts.
         QCOMPARE(QFileInfo(expectedFolder).permissions() & QFileDevice::Permissions(0x0077), 0);
-        QVERIFY(filesIn(m_sharedTemp, QStringLiteral("*.pdf")).isEmpty());
+        QVERIFY(filesIn(temporaryFolder(), QStringLiteral("*.pdf")).isEmpty());
         QVERIFY(pdfText(pdf).contains(QStringLiteral("012-AB")));
         QTRY_COMPARE(m_opened, QStringList{pdf});
     }
@@ -155,7 +143,7 @@ private slots:
             QVERIFY(goneWithDialog);
         }
         QVERIFY(filesIn(m_doc.temporaryFolder(), QStringLiteral("picture_*")).isEmpty());
-        QVERIFY(filesIn(m_sharedTemp, QStringLiteral("picture_*")).isEmpty());
+        QVERIFY(filesIn(temporaryFolder(), QStringLiteral("picture_*")).isEmpty());
     }
 
     // The window's opener hands a file to the desktop as a file URL: a quote in the name is just a character.
@@ -208,10 +196,7 @@ private slots:
     }
 
 private:
-    QTemporaryDir m_dir;
-    QString m_sharedTemp;
     VDRDocument m_doc;
-    VDRTestPrompt m_prompt;
     QList<QUrl> m_urls;
     QStringList m_opened;
 };

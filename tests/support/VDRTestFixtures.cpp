@@ -104,6 +104,18 @@ bool writeFile(const QString& path, const QByteArray& bytes)
     return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size() && file.flush();
 }
 
+QString reportInsertSql(int id, const QString& number)
+{
+    return QStringLiteral(
+               "INSERT INTO entry (id, locked, number, inspection_date, inspection_time_from, "
+               "inspection_time_to, env_time, env_weather1, env_weather2, env_weather3, env_temperature, "
+               "env_humidity, progress, deficiencies, construction_material_sample, print_notice, "
+               "print_telephone_notice, user_id) VALUES (%1, 0, '%2', '2024-03-05', '07:00:00', '16:30:00', "
+               "'00:00:00', ' ', ' ', ' ', ' ', ' ', ' ', ' ', 0, 0, 0, 'AB')")
+        .arg(id)
+        .arg(number);
+}
+
 QString imageInsertSql(qint64 bytes)
 {
     return QStringLiteral("INSERT INTO image (image, image_ct, image_width, image_height, thumbnail, "
@@ -397,6 +409,20 @@ QString tool(const QString& program, const QStringList& args)
     if (!p.waitForFinished(60000))
         return QString();
     return QString::fromUtf8(p.readAllStandardOutput());
+}
+
+CliRun runCli(const QStringList& args)
+{
+    QProcess p;
+    p.start(QCoreApplication::applicationDirPath() + QStringLiteral("/varduna-cli"), args);
+    CliRun run;
+    if (!p.waitForFinished(120000))
+        return run;
+    run.exitCode = p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
+    run.out = QString::fromUtf8(p.readAllStandardOutput());
+    // The tool writes its messages in the locale's encoding.
+    run.err = QString::fromLocal8Bit(p.readAllStandardError());
+    return run;
 }
 
 QString pdfText(const QString& pdf, int page)

@@ -39,6 +39,9 @@ bool execOn(QSqlDatabase db, const QStringList& statements);
 // As queryTexts; a failed query shows as its error.
 QStringList textsOn(QSqlDatabase db, const QString& sql);
 
+// SQL for one open report row 'number', 5 March 2024 from 07:00 to 16:30 by author AB, texts blank.
+QString reportInsertSql(int id, const QString& number);
+
 // SQL for one JPEG picture row of 'bytes' zero bytes (a 1x1 picture as far as the row says).
 QString imageInsertSql(qint64 bytes);
 
@@ -88,6 +91,15 @@ private:
 
 // Standard output of a program run with an argument list (empty when it does not finish).
 QString tool(const QString& program, const QStringList& args);
+
+// A run of the command-line tool beside the test; it reads the run's isolated settings.
+struct CliRun
+{
+    int exitCode = -1; // -1: it crashed or did not finish
+    QString out;
+    QString err;
+};
+CliRun runCli(const QStringList& args);
 // The text of a PDF, or of one of its pages (from 1), as pdftotext -layout reads it.
 QString pdfText(const QString& pdf, int page = 0);
 int pdfPages(const QString& pdf);

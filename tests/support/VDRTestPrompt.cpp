@@ -7,7 +7,7 @@ VDRTestPrompt::VDRTestPrompt() : m_previous(VDRPrompt::instance())
 
 VDRTestPrompt::~VDRTestPrompt()
 {
-    VDRPrompt::setInstance(nullptr);
+    VDRPrompt::setInstance(m_previous);
 }
 
 void VDRTestPrompt::expect(const QString& title, const QString& textPart, int answer)

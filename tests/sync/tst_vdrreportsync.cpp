@@ -1,6 +1,6 @@
 #include "VDRExchangeFileBuilder.h"
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "document/VDRDocumentsDb.h"
@@ -9,10 +9,8 @@
 
 #include <QColor>
 #include <QImage>
-#include <QProcess>
 #include <QSqlError>
 #include <QSqlQuery>
-#include <QSqlRecord>
 #include <QtTest>
 
 #include <memory>
@@ -28,15 +26,14 @@ const QString kDbError = QStringLiteral("Datenbankfehler");
 const QString kNotice = QStringLiteral("Cloud Synchronisation");
 } // namespace
 
-class TestVDRReportSync : public QObject
+class TestVDRReportSync : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase();
-    void init();
-    void cleanup();
+    void initTest() override;
+    void cleanupTest() override;
 
+private slots:
     void newReportWithAllLists();
     void replacing_data();
     void replacing();
@@ -66,36 +63,26 @@ private:
                        const QString& progress = QStringLiteral("Rohbau"));
     // Imports files as a cloud run would (summary not shown) and returns the summary.
     QString import(const QStringList& paths, const std::function<void()>& expectations = nullptr);
-    QStringList rows(const QString& sql);
+    QStringList rows(const QString& sql) { return textsOn(m_doc->database(), sql); }
     QVariant value(const QString& sql);
     // Every row of every table of the working copy, with the structure: equal dumps, equal diaries.
     QStringList dump();
     // Reports 001 to 'count' (locked, the last 'open' ones not), a frozen company, a logo.
     void fillDiary(int count, int open);
     // Runs varduna-cli; returns the exit code.
-    int cli(const QStringList& arguments, QString* out = nullptr, QString* err = nullptr);
+    int cli(const QStringList& arguments, QString* out, QString* err);
 
-    QTemporaryDir m_tmp;
-    QString m_dir;
+    QString m_case;
     QString m_diary;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
-    int m_case = 0;
+    int m_cases = 0;
 };
 
-void TestVDRReportSync::initTestCase()
+void TestVDRReportSync::initTest()
 {
-    QVERIFY(m_tmp.isValid());
-    isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-    qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-}
-
-void TestVDRReportSync::init()
-{
-    m_prompt.reset();
-    m_dir = m_tmp.filePath(QStringLiteral("case%1").arg(++m_case));
-    QVERIFY(QDir().mkpath(m_dir));
-    m_diary = m_dir + QStringLiteral("/Baustelle.vd2");
+    m_case = m_dir.filePath(QStringLiteral("case%1").arg(++m_cases));
+    QVERIFY(QDir().mkpath(m_case));
+    m_diary = m_case + QStringLiteral("/Baustelle.vd2");
     QVERIFY(createDiary(m_diary));
     m_doc = std::make_unique<VDRDocument>();
     bool showError = true;
@@ -105,15 +92,14 @@ void TestVDRReportSync::init()
     m_doc->modelEntryAll()->select();
 }
 
-void TestVDRReportSync::cleanup()
+void TestVDRReportSync::cleanupTest()
 {
     m_doc.reset();
-    VDR_VERIFY_PROMPT(m_prompt);
 }
 
 QString TestVDRReportSync::exchangePath(const QDateTime& stamp) const
 {
-    return m_dir + QStringLiteral("/Baustelle.") + stamp.toString(QStringLiteral("yyyy-MM-ddThh-mm-ss")) +
+    return m_case + QStringLiteral("/Baustelle.") + stamp.toString(QStringLiteral("yyyy-MM-ddThh-mm-ss")) +
            QStringLiteral(".vdx");
 }
 
@@ -137,21 +123,6 @@ QString TestVDRReportSync::import(const QStringList& paths, const std::function<
         expectations();
     sync.importReportExchangeFiles(paths, false, projectChanged);
     return sync.lastSummary();
-}
-
-QStringList TestVDRReportSync::rows(const QString& sql)
-{
-    QStringList result;
-    QSqlQuery q(m_doc->database());
-    if (!q.exec(sql))
-        return {QStringLiteral("ERROR ") + q.lastError().text()};
-    while (q.next()) {
-        QStringList values;
-        for (int i = 0; i < q.record().count(); ++i)
-            values << (q.value(i).isNull() ? QStringLiteral("NULL") : q.value(i).toString());
-        result << values.join(QLatin1Char('|'));
-    }
-    return result;
 }
 
 QVariant TestVDRReportSync::value(const QString& sql)
@@ -595,9 +566,9 @@ void TestVDRReportSync::documentsFollowReplacedRows()
 // folder are not the app's.
 void TestVDRReportSync::cloudFolder()
 {
-    const QString cloud = m_dir + QStringLiteral("/cloud");
+    const QString cloud = m_case + QStringLiteral("/cloud");
     QVERIFY(QDir().mkpath(cloud));
-    const QString outside = m_dir + QStringLiteral("/outside.vdx");
+    const QString outside = m_case + QStringLiteral("/outside.vdx");
     writeFullFile(outside, kT1);
     QVERIFY(QFile::link(outside, cloud + QStringLiteral("/Baustelle.2026-03-07T16-05-08.vdx")));
     writeFullFile(cloud + QStringLiteral("/Baustelle.2026-03-07T16-05-10.vdx"), kT2,
@@ -775,22 +746,17 @@ void TestVDRReportSync::fillDiary(int count, int open)
 
 int TestVDRReportSync::cli(const QStringList& arguments, QString* out, QString* err)
 {
-    QProcess p;
-    p.start(QString::fromLocal8Bit(qgetenv("VARDUNA_CLI")), arguments);
-    if (!p.waitForFinished(120000))
-        return -1;
-    if (out)
-        *out = QString::fromUtf8(p.readAllStandardOutput());
-    if (err)
-        *err = QString::fromLocal8Bit(p.readAllStandardError());
-    return p.exitStatus() == QProcess::NormalExit ? p.exitCode() : -1;
+    const CliRun run = runCli(arguments);
+    *out = run.out;
+    *err = run.err;
+    return run.exitCode;
 }
 
 // The master-data file the app reads: typed values, apostrophes, the locked reports.
 void TestVDRReportSync::masterDataForTheApp()
 {
     fillDiary(3, 1);
-    const QString mdd = m_dir + QStringLiteral("/Baustelle.mdd");
+    const QString mdd = m_case + QStringLiteral("/Baustelle.mdd");
     QVERIFY(VDRMasterDataExport::writeMasterDataFile(m_doc.get(), mdd));
     QCOMPARE(queryTexts(mdd, QStringLiteral("SELECT key, value FROM meta ORDER BY key")),
              (QStringList{"database|Baustelle.vd2", "fileversion|0.1"}));
@@ -819,7 +785,7 @@ void TestVDRReportSync::followUpDiary()
 {
     QFETCH(bool, commandLine);
     fillDiary(37, 0);
-    const QString next = m_dir + QStringLiteral("/Baustelle 2.vd2");
+    const QString next = m_case + QStringLiteral("/Baustelle 2.vd2");
     QByteArray logo;
     {
         QSqlQuery q(m_doc->database());

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "editing/completion/CompleterEditor.h"
 #include "editing/completion/CompleterModel.h"
 #include "editing/completion/CompleterStringListModel.h"
@@ -69,25 +69,25 @@ int rowOf(CompleterModel* model, const QString& field)
 }
 } // namespace
 
-class TestVDRCompleter : public QObject
+class TestVDRCompleter : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-
-    void initTestCase()
+    void initRun() override { QSettings().setValue(QStringLiteral("language"), int(QLocale::German)); }
+    void initTest() override
     {
-        QVERIFY(m_settings.isValid());
-        VDRTestFixtures::isolateSettings(m_settings.path());
-        QSettings().setValue(QStringLiteral("language"), int(QLocale::German));
+        QSettings settings;
+        settings.remove(Group);
+        settings.remove(VDRCompleter::DontShowMessageSettingsKey);
     }
 
+private slots:
     // A stored text that names a picture on this computer shows a gap, and keeps the name.
     void storedTextReadsNoPictureFromDisk()
     {
         QImage picture(200, 100, QImage::Format_RGB32);
         picture.fill(Qt::red);
-        const QString local = m_settings.filePath(QStringLiteral("geheim.png"));
+        const QString local = m_dir.filePath(QStringLiteral("geheim.png"));
         QVERIFY(picture.save(local));
         VDRCompleterTextEdit edit;
         edit.resize(400, 300);
@@ -100,16 +100,6 @@ private slots:
         QVERIFY(!shown.isNull() && shown.size() != picture.size());
         QVERIFY(edit.toHtml().contains(local));
     }
-
-    void init()
-    {
-        m_prompt.reset();
-        QSettings settings;
-        settings.remove(Group);
-        settings.remove(VDRCompleter::DontShowMessageSettingsKey);
-    }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
     void displayRules_data()
     {
@@ -546,10 +536,6 @@ private slots:
         edit->listButton()->click();
         QCOMPARE(popupRows(edit->ownCompleter()), (QStringList{"Zwei", "Eins"}));
     }
-
-private:
-    QTemporaryDir m_settings;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_MAIN(TestVDRCompleter)

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "editing/completion/VDRSpellChecker.h"
 
 #include <QDir>
@@ -9,27 +9,13 @@
 #include <QTextCodec>
 #include <QtTest>
 
-class TestVDRSpellChecker : public QObject
+class TestVDRSpellChecker : public VDRTestCase
 {
     Q_OBJECT
 
+    void initTest() override { QSettings().remove(QStringLiteral("spellCheckerActive")); }
+
 private slots:
-
-    void initTestCase()
-    {
-        QVERIFY(m_settings.isValid());
-        QVERIFY(m_dir.isValid());
-        VDRTestFixtures::isolateSettings(m_settings.path());
-    }
-
-    void init()
-    {
-        m_prompt.reset();
-        QSettings().remove(QStringLiteral("spellCheckerActive"));
-    }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
-
     void checksWords_data()
     {
         QTest::addColumn<QByteArray>("encoding");
@@ -247,10 +233,6 @@ private:
               QStringLiteral("5\nBaustelle/N\nBaustraße\nPrüfung/E\nGerüst\nBagger\n"));
         return base;
     }
-
-    QTemporaryDir m_settings;
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_GUILESS_MAIN(TestVDRSpellChecker)

@@ -1,8 +1,8 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
-#include "editing/form/VDRDataWidgetMapper.h"
 #include "document/VDRDocument.h"
+#include "editing/form/VDRDataWidgetMapper.h"
 
 #include <QCheckBox>
 #include <QLineEdit>
@@ -54,35 +54,26 @@ static QString plain(const QVariant& html)
     return doc.toPlainText();
 }
 
-class TestVDRDataWidgetMapper : public QObject
+class TestVDRDataWidgetMapper : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_tmp.isValid());
-        VDRTestFixtures::isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
         exec(QStringLiteral("UPDATE company SET company = 'Firma ' || id"));
         QVERIFY(m_doc->modelCompany1()->select());
     }
 
-    void cleanup()
+    void cleanupTest() override
     {
         if (m_doc)
             m_doc->closeDocument();
         m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     void navigation_data()
     {
         QTest::addColumn<QStringList>("steps");
@@ -328,8 +319,6 @@ private:
         return std::make_unique<Form>(m_doc->modelCompany1(), QStringList{"type", "pos", "company"});
     }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
 };
 

@@ -1,17 +1,17 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "app/VDRMainWindow.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
-#include "editing/reportlist/QSpinBoxLetter.h"
 #include "editing/completion/VDRCompleterLineEdit.h"
 #include "editing/completion/VDRCompleterTextEdit.h"
 #include "editing/form/VDREntryWidget.h"
 #include "editing/form/VDRRichTextEdit.h"
 #include "editing/form/VDRRichTextEditDialog.h"
-#include "editing/tables/VDRTableView.h"
 #include "editing/form/VdEvent.h"
 #include "editing/form/VdEventsController.h"
+#include "editing/reportlist/QSpinBoxLetter.h"
+#include "editing/tables/VDRTableView.h"
 
 #include <QAction>
 #include <QApplication>
@@ -29,7 +29,6 @@
 #include <QSqlQuery>
 #include <QSqlRecord>
 #include <QTabWidget>
-#include <QTemporaryDir>
 #include <QTimer>
 #include <QToolButton>
 #include <QtTest>
@@ -40,25 +39,20 @@
 using namespace VDRTestFixtures;
 
 // Drives the report form inside the real main window, headless.
-class TestVDREntryWidget : public QObject
+class TestVDREntryWidget : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_dir.path()));
         // A screenshot shows the window as a German user sees it: the calendar and the clock take
         // their names from the locale the window is built with.
         if (!qgetenv("VARDUNA_SCREENSHOT").isEmpty())
             QLocale::setDefault(QLocale(QLocale::German, QLocale::Germany));
     }
 
-    void init()
+    void initTest() override
     {
-        m_prompt.reset();
         VDRDocument::setGlobalModified(false);
         QSettings().remove(QStringLiteral("entry/UID"));
         m_window = std::make_unique<VDRMainWindow>();
@@ -66,14 +60,14 @@ private slots:
         m_form = m_window->entryWidget();
     }
 
-    void cleanup()
+    void cleanupTest() override
     {
         if (m_window && m_window->document()->isStateValid())
             m_window->document()->closeDocument();
         m_window.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     void newDiaryShowsFirstReport()
     {
         QVERIFY(m_window->createDocument(true));
@@ -88,7 +82,7 @@ private slots:
         QCOMPARE(titles, QStringList({"Bautenstand", "Anwesende", "Störungen", "Bauablauf", "Vermerke",
                                       "Baustoffe", "Pläne und Dokumente", "Geräte und Maschinen"}));
         QCOMPARE(m_form->views().size(), 14);
-        // Functions of later parts are there, disabled, and say why.
+        // Functions not available yet are there, disabled, and say why.
         for (const char* name :
              {"pushButtonPhotos1", "pushButtonSketch2", "pbAudio", "pbPrintDfcyList", "pbSynch"}) {
             auto* b = m_form->findChild<QPushButton*>(QLatin1String(name));
@@ -494,8 +488,6 @@ private:
         timer->start();
     }
 
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRMainWindow> m_window;
     VDREntryWidget* m_form = nullptr;
     int m_files = 0;

@@ -1,5 +1,4 @@
-#include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
+#include "VDRTestCase.h"
 #include "editing/masterdata/VDRCompanyDialog.h"
 
 #include <QComboBox>
@@ -8,29 +7,18 @@
 #include <QPushButton>
 #include <QRadioButton>
 #include <QSettings>
-#include <QTemporaryDir>
 #include <QtTest>
 
-class TestVDRCompanyDialog : public QObject
+class TestVDRCompanyDialog : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase();
     void modes_data();
     void modes();
     void okAndNotice_data();
     void okAndNotice();
-
-private:
-    QTemporaryDir m_tmp;
 };
-
-void TestVDRCompanyDialog::initTestCase()
-{
-    QVERIFY(m_tmp.isValid());
-    VDRTestFixtures::isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-}
 
 void TestVDRCompanyDialog::modes_data()
 {
@@ -109,13 +97,12 @@ void TestVDRCompanyDialog::okAndNotice()
     QFETCH(bool, notice);
     const QString key = QStringLiteral("Messages/dontShowDataProtectionMsg");
     QSettings().setValue(key, dontShowBefore);
-    VDRTestPrompt prompt;
     if (notice) {
         const QString opening = "Wenn Sie hier personenbezogene Daten (gem. Art. 4 DSGVO) erfassen";
         if (tick)
-            prompt.expectTicked("Erfassung personenbezogener Daten", opening, 0);
+            m_prompt.expectTicked("Erfassung personenbezogener Daten", opening, 0);
         else
-            prompt.expect("Erfassung personenbezogener Daten", opening, 0);
+            m_prompt.expect("Erfassung personenbezogener Daten", opening, 0);
     }
 
     VDRCompanyDialog dialog(3, nullptr);
@@ -126,7 +113,7 @@ void TestVDRCompanyDialog::okAndNotice()
     dialog.findChild<QPushButton*>("pushButtonOk")->click();
 
     QCOMPARE(dialog.result(), accepted ? int(QDialog::Accepted) : int(QDialog::Rejected));
-    VDR_VERIFY_PROMPT(prompt);
+    VDR_VERIFY_PROMPT(m_prompt);
     QCOMPARE(QSettings().value(key).toBool(), dontShowBefore || tick);
     if (accepted) {
         QCOMPARE(dialog.company(), company.trimmed().left(128));

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/CVdShared.h"
 #include "document/VDRDocument.h"
 #include "editing/masterdata/VDRProjectDataWidget.h"
@@ -11,12 +11,8 @@
 #include <QMimeData>
 #include <QPushButton>
 #include <QSettings>
-#include <QSqlError>
-#include <QSqlQuery>
-#include <QSqlRecord>
 #include <QTabWidget>
 #include <QTableView>
-#include <QTemporaryDir>
 #include <QTextEdit>
 #include <QToolButton>
 #include <QtTest>
@@ -25,14 +21,14 @@
 
 using namespace VDRTestFixtures;
 
-class TestVDRProjectDataWidget : public QObject
+class TestVDRProjectDataWidget : public VDRTestCase
 {
     Q_OBJECT
 
+    void initTest() override;
+    void cleanupTest() override;
+
 private slots:
-    void initTestCase();
-    void init();
-    void cleanup();
     void okWritesAbbrechenReverts_data();
     void okWritesAbbrechenReverts();
     void partyChooserOfRemovedCompany();
@@ -41,59 +37,27 @@ private slots:
     void formatTab();
 
 private:
-    QStringList rows(const QString& sql);
-    void exec(const QString& sql);
+    QStringList rows(const QString& sql) { return textsOn(m_doc->database(), sql); }
+    void exec(const QString& sql) { QVERIFY(execOn(m_doc->database(), {sql})); }
     std::unique_ptr<VDRProjectDataWidget> openWidget(int tab);
     template <class T> T* child(const char* name) { return m_widget->findChild<T*>(QLatin1String(name)); }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
     std::unique_ptr<VDRProjectDataWidget> m_widget;
 };
 
-void TestVDRProjectDataWidget::initTestCase()
+void TestVDRProjectDataWidget::initTest()
 {
-    QVERIFY(m_tmp.isValid());
-    isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-    qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-}
-
-void TestVDRProjectDataWidget::init()
-{
-    m_prompt.reset();
     QSettings().clear();
     CVdShared::restoreCompanyOutputFormats();
     m_doc = std::make_unique<VDRDocument>();
     QVERIFY(m_doc->createDocument(true));
 }
 
-void TestVDRProjectDataWidget::cleanup()
+void TestVDRProjectDataWidget::cleanupTest()
 {
     m_widget.reset();
     m_doc.reset();
-    VDR_VERIFY_PROMPT(m_prompt);
-}
-
-QStringList TestVDRProjectDataWidget::rows(const QString& sql)
-{
-    QSqlQuery q(m_doc->database());
-    if (!q.exec(sql))
-        return {q.lastError().text()};
-    QStringList result;
-    while (q.next()) {
-        QStringList values;
-        for (int i = 0; i < q.record().count(); ++i)
-            values << (q.value(i).isNull() ? QStringLiteral("NULL") : q.value(i).toString());
-        result << values.join(QLatin1Char('|'));
-    }
-    return result;
-}
-
-void TestVDRProjectDataWidget::exec(const QString& sql)
-{
-    QSqlQuery q(m_doc->database());
-    QVERIFY2(q.exec(sql), qPrintable(q.lastError().text()));
 }
 
 std::unique_ptr<VDRProjectDataWidget> TestVDRProjectDataWidget::openWidget(int tab)

@@ -1,5 +1,5 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRDocument.h"
 #include "editing/masterdata/VDRProjectLogoWidget.h"
 
@@ -8,54 +8,45 @@
 #include <QImage>
 #include <QLabel>
 #include <QPushButton>
-#include <QSqlError>
-#include <QSqlQuery>
-#include <QSqlRecord>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <memory>
 
 using namespace VDRTestFixtures;
 
-class TestVDRProjectLogoWidget : public QObject
+class TestVDRProjectLogoWidget : public VDRTestCase
 {
     Q_OBJECT
 
+    void initRun() override;
+    void initTest() override;
+    void cleanupTest() override;
+
 private slots:
-    void initTestCase();
-    void init();
-    void cleanup();
     void insertAndRemove_data();
     void insertAndRemove();
     void badFiles_data();
     void badFiles();
 
 private:
-    QString row(const QString& sql);
+    QString row(const QString& sql) { return textsOn(m_doc->database(), sql).value(0); }
     void click(const QString& name) { m_widget->findChild<QPushButton*>(name)->click(); }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
     std::unique_ptr<VDRProjectLogoWidget> m_widget;
     QString m_logo;
 };
 
-void TestVDRProjectLogoWidget::initTestCase()
+void TestVDRProjectLogoWidget::initRun()
 {
-    QVERIFY(m_tmp.isValid());
-    isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-    qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
     QImage logo(300, 100, QImage::Format_RGB32);
     logo.fill(Qt::darkBlue);
-    m_logo = m_tmp.filePath("logo.png");
+    m_logo = m_dir.filePath("logo.png");
     QVERIFY(logo.save(m_logo));
 }
 
-void TestVDRProjectLogoWidget::init()
+void TestVDRProjectLogoWidget::initTest()
 {
-    m_prompt.reset();
     m_doc = std::make_unique<VDRDocument>();
     QVERIFY(m_doc->createDocument(true));
     m_widget = std::make_unique<VDRProjectLogoWidget>();
@@ -63,22 +54,10 @@ void TestVDRProjectLogoWidget::init()
     m_widget->show();
 }
 
-void TestVDRProjectLogoWidget::cleanup()
+void TestVDRProjectLogoWidget::cleanupTest()
 {
     m_widget.reset();
     m_doc.reset();
-    VDR_VERIFY_PROMPT(m_prompt);
-}
-
-QString TestVDRProjectLogoWidget::row(const QString& sql)
-{
-    QSqlQuery q(m_doc->database());
-    if (!q.exec(sql) || !q.next())
-        return q.lastError().text();
-    QStringList values;
-    for (int i = 0; i < q.record().count(); ++i)
-        values << (q.value(i).isNull() ? QStringLiteral("NULL") : q.value(i).toString());
-    return values.join(QLatin1Char('|'));
 }
 
 void TestVDRProjectLogoWidget::insertAndRemove_data()
@@ -153,7 +132,7 @@ void TestVDRProjectLogoWidget::badFiles()
 {
     QFETCH(QByteArray, content);
     QFETCH(QString, message);
-    const QString path = m_tmp.filePath("bad.png");
+    const QString path = m_dir.filePath("bad.png");
     QFile file(path);
     QVERIFY(file.open(QIODevice::WriteOnly | QIODevice::Truncate));
     file.write(content);

@@ -1,5 +1,4 @@
-#include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
+#include "VDRTestCase.h"
 #include "editing/printdialogs/CVdPrintPreview.h"
 #include "editing/printdialogs/CVdPrintoutSettings.h"
 #include "editing/printdialogs/VDRPrintTextsEditor.h"
@@ -13,30 +12,20 @@
 #include <QPushButton>
 #include <QSettings>
 #include <QSpinBox>
-#include <QTemporaryDir>
 #include <QtTest>
 
-using namespace VDRTestFixtures;
-
-class TestPrintDialogs : public QObject
+class TestPrintDialogs : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initRun() override { QSettings().setValue(QStringLiteral("language"), int(QLocale::German)); }
+    void initTest() override
     {
-        QVERIFY(m_dir.isValid());
-        isolateSettings(m_dir.filePath(QStringLiteral("settings")));
-        QSettings().setValue(QStringLiteral("language"), int(QLocale::German));
-    }
-    void init()
-    {
-        m_prompt.reset();
         QSettings().remove(VDRPrintTextModel::settingsGroup());
         CVdTexts::self()->resetModel();
     }
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
 
+private slots:
     void defaults()
     {
         QCOMPARE(CVdTexts::self()->TextList.size(), 91);
@@ -161,10 +150,6 @@ private slots:
         }
         QVERIFY(!QFile::exists(file));
     }
-
-private:
-    QTemporaryDir m_dir;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_MAIN(TestPrintDialogs)

@@ -1,5 +1,4 @@
-#include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
+#include "VDRTestCase.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
 #include "editing/reportlist/QSpinBoxLetter.h"
@@ -13,22 +12,11 @@
 
 #include <memory>
 
-using namespace VDRTestFixtures;
-
-class TestVDREntryDialogs : public QObject
+class TestVDREntryDialogs : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_tmp.isValid());
-        isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-    }
-
-    void cleanup() { VDR_VERIFY_PROMPT(m_prompt); }
-
     // What the user types into the letter box, keystroke by keystroke, and the index it gives.
     void letterBox_data()
     {
@@ -133,10 +121,6 @@ private slots:
         if (doc && doc->parent())
             doc.release(); // the window owns it now
     }
-
-private:
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
 };
 
 QTEST_MAIN(TestVDREntryDialogs)

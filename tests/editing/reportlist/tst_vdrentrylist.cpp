@@ -1,14 +1,14 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "app/VDRMainWindow.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
-#include "editing/reportlist/VDREntryDateWidget.h"
-#include "editing/reportlist/VDREntryListWidget.h"
-#include "editing/reportlist/VDREntrySelectorWidget.h"
 #include "editing/form/VDREntryWidget.h"
 #include "editing/form/VdEvent.h"
 #include "editing/form/VdEventsController.h"
+#include "editing/reportlist/VDREntryDateWidget.h"
+#include "editing/reportlist/VDREntryListWidget.h"
+#include "editing/reportlist/VDREntrySelectorWidget.h"
 
 #include <QDockWidget>
 #include <QHeaderView>
@@ -47,21 +47,12 @@ protected:
 
 // The report list, the calendar and the selection dialog on a diary of four reports:
 // 001 (2026-03-02), 002 locked (2026-03-03, author AB), 003 (2026-03-05), 004 (2026-04-20).
-class TestVDREntryList : public QObject
+class TestVDREntryList : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_tmp.isValid());
-        isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
         VDRAllEntryTableModel* model = m_doc->modelEntryAll();
@@ -76,12 +67,9 @@ private slots:
         QVERIFY(m_doc->lockEntry(1, true));
     }
 
-    void cleanup()
-    {
-        m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
-    }
+    void cleanupTest() override { m_doc.reset(); }
 
+private slots:
     // A click asks the form to show the row, with the table metrics around it; a row chosen by
     // the form (event 1003) or moved by a removal asks nothing.
     void listNavigates()
@@ -370,8 +358,6 @@ private slots:
     }
 
 private:
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
 };
 

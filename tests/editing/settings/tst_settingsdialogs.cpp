@@ -1,28 +1,21 @@
-#include "VDRTestFixtures.h"
+#include "VDRTestCase.h"
+#include "editing/VDRWidgetPrompt.h"
 #include "editing/settings/VDRBackupConfigDialog.h"
 #include "editing/settings/VDRFileSizeConfigDialog.h"
-#include "editing/VDRWidgetPrompt.h"
 
 #include <QProgressDialog>
 #include <QPushButton>
 #include <QSettings>
 #include <QSpinBox>
-#include <QTemporaryDir>
 #include <QtTest>
 
 #include <memory>
 
-class TestSettingsDialogs : public QObject
+class TestSettingsDialogs : public VDRTestCase
 {
     Q_OBJECT
 
 private slots:
-    void initTestCase()
-    {
-        QVERIFY(m_dir.isValid());
-        VDRTestFixtures::isolateSettings(m_dir.path());
-    }
-
     void storesOnlyOnOk_data()
     {
         QTest::addColumn<QString>("dialog");
@@ -100,9 +93,6 @@ private slots:
         prompt.endNotice();
         QVERIFY(visibleBoxes().isEmpty());
     }
-
-private:
-    QTemporaryDir m_dir;
 };
 
 QTEST_MAIN(TestSettingsDialogs)

@@ -1,9 +1,11 @@
+#include "VDRTestCase.h"
 #include "VDRTestFixtures.h"
-#include "VDRTestPrompt.h"
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDRDocument.h"
-#include "editing/masterdata/VDRCompanyDialog.h"
 #include "editing/completion/VDRCompleter.h"
+#include "editing/form/VdEvent.h"
+#include "editing/form/VdEventsController.h"
+#include "editing/masterdata/VDRCompanyDialog.h"
 #include "editing/tables/VDRIntModel.h"
 #include "editing/tables/VDRItemDelegate.h"
 #include "editing/tables/VDRTableView.h"
@@ -12,8 +14,6 @@
 #include "editing/tables/VDRTextEditComboBoxListView.h"
 #include "editing/time/VDRTimePickerWidget.h"
 #include "editing/time/VDRTimeRecordingWidget.h"
-#include "editing/form/VdEvent.h"
-#include "editing/form/VdEventsController.h"
 
 #include <QAbstractButton>
 #include <QApplication>
@@ -96,21 +96,12 @@ public:
     using VDRTableView::dropEvent;
 };
 
-class TestVDRTableView : public QObject
+class TestVDRTableView : public VDRTestCase
 {
     Q_OBJECT
 
-private slots:
-    void initTestCase()
+    void initTest() override
     {
-        QVERIFY(m_tmp.isValid());
-        isolateSettings(m_tmp.filePath(QStringLiteral("settings")));
-        qputenv("TMPDIR", QFile::encodeName(m_tmp.path()));
-    }
-
-    void init()
-    {
-        m_prompt.reset();
         m_doc = std::make_unique<VDRDocument>();
         QVERIFY(m_doc->createDocument(true));
         QVERIFY(m_doc->appendCompany2());
@@ -122,13 +113,13 @@ private slots:
         QVERIFY(companies->submitAll());
     }
 
-    void cleanup()
+    void cleanupTest() override
     {
         m_view.reset();
         m_doc.reset();
-        VDR_VERIFY_PROMPT(m_prompt);
     }
 
+private slots:
     // Each editor kind writes what the user typed, in the form the column keeps.
     void editCells_data()
     {
@@ -348,14 +339,14 @@ private slots:
     // A file typed into a document cell is attached; removing the row marks the attachment removed.
     void documentOfRemovedRow()
     {
-        const QString diary = m_tmp.filePath(QStringLiteral("documents.vd2"));
+        const QString diary = m_dir.filePath(QStringLiteral("documents.vd2"));
         QVERIFY(createDiary(diary));
         m_doc = std::make_unique<VDRDocument>();
         bool showError = true;
         QVERIFY(m_doc->openDocument(diary, showError));
         QCOMPARE(queryTexts(diary, QStringLiteral("SELECT id FROM entry")),
                  QStringList{QString::number(kEntry)});
-        const QString plan = m_tmp.filePath(QStringLiteral("plan.pdf"));
+        const QString plan = m_dir.filePath(QStringLiteral("plan.pdf"));
         QFile file(plan);
         QVERIFY(file.open(QIODevice::WriteOnly) && file.write("%PDF") == 4);
         file.close();
@@ -804,8 +795,6 @@ private:
         return event.isAccepted();
     }
 
-    QTemporaryDir m_tmp;
-    VDRTestPrompt m_prompt;
     std::unique_ptr<VDRDocument> m_doc;
     std::unique_ptr<VDRTableView> m_view;
     int m_companyId = 0;
