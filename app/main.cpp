@@ -5,10 +5,10 @@
 #include "app/VDRSignalWatcher.h"
 #include "app/VDRStartup.h"
 #include "document/VDRDocument.h"
-#include "editing/completion/VDRCompleter.h"
-#include "editing/printdialogs/VDRPrintWidgets.h"
-#include "editing/completion/VDRSpellChecker.h"
 #include "editing/VDRWidgetPrompt.h"
+#include "editing/completion/VDRCompleter.h"
+#include "editing/completion/VDRSpellChecker.h"
+#include "editing/printdialogs/VDRPrintWidgets.h"
 
 #include <QDir>
 #include <QEvent>

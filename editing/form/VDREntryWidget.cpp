@@ -2,21 +2,21 @@
 
 #include "document/VDRAllEntryTableModel.h"
 #include "document/VDREntryNumber.h"
-#include "editing/form/VDRDataWidgetMapper.h"
 #include "document/VDRPrompt.h"
 #include "editing/completion/VDRCompleter.h"
 #include "editing/completion/VDRCompleterLineEdit.h"
 #include "editing/completion/VDRCompleterTextEdit.h"
-#include "editing/time/VDRDateEdit.h"
-#include "editing/reportlist/VDREntryInsertDialog.h"
-#include "editing/reportlist/VDREntryNumberDialog.h"
+#include "editing/form/VDRDataWidgetMapper.h"
 #include "editing/form/VDRRichTextEdit.h"
 #include "editing/form/VDRRichTextEditDialog.h"
-#include "editing/tables/VDRTableView.h"
-#include "editing/time/VDRTimeEdit.h"
-#include "editing/time/VDRTimeRecordingWidget.h"
 #include "editing/form/VdEvent.h"
 #include "editing/form/VdEventsController.h"
+#include "editing/reportlist/VDREntryInsertDialog.h"
+#include "editing/reportlist/VDREntryNumberDialog.h"
+#include "editing/tables/VDRTableView.h"
+#include "editing/time/VDRDateEdit.h"
+#include "editing/time/VDRTimeEdit.h"
+#include "editing/time/VDRTimeRecordingWidget.h"
 
 #include <QApplication>
 #include <QCheckBox>

@@ -4,10 +4,10 @@
 #include "document/VDRDocumentsDb.h"
 #include "document/VDRPrompt.h"
 #include "document/VDRSqlTableModel.h"
-#include "editing/tables/VDRItemDelegate.h"
-#include "editing/tables/VDRTableViewDialog.h"
 #include "editing/form/VdEvent.h"
 #include "editing/form/VdEventsController.h"
+#include "editing/tables/VDRItemDelegate.h"
+#include "editing/tables/VDRTableViewDialog.h"
 
 #include <QDrag>
 #include <QDragEnterEvent>

@@ -1,10 +1,11 @@
+#include "VDRTestCase.h"
 #include "document/VDREntryNumber.h"
 
 #include <QtTest>
 
 #include <climits>
 
-class TestVDREntryNumber : public QObject
+class TestVDREntryNumber : public VDRTestCase
 {
     Q_OBJECT
 
@@ -97,5 +98,5 @@ private slots:
     }
 };
 
-QTEST_APPLESS_MAIN(TestVDREntryNumber)
+QTEST_GUILESS_MAIN(TestVDREntryNumber)
 #include "tst_vdrentrynumber.moc"
